@@ -1,0 +1,165 @@
+// Output targets by name, and the three frame sinks.
+#include "refhost/frame_output.h"
+
+#include <algorithm>
+#include <cctype>
+#include <stdexcept>
+
+#include "refhost/staged_file.h"
+
+namespace refhost {
+namespace {
+
+std::string lowerExtension(const std::string& path) {
+  std::string::size_type dot = path.rfind('.');
+  if (dot == std::string::npos || path.find('/', dot) != std::string::npos) return "";
+  std::string extension = path.substr(dot + 1);
+  std::transform(extension.begin(), extension.end(), extension.begin(),
+                 [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
+  return extension;
+}
+
+// The frame-number conversion of a sequence pattern: where it starts and ends, and its width.
+struct NumberField {
+  std::string::size_type begin = 0, end = 0;
+  int width = 0;
+};
+
+NumberField numberField(const std::string& pattern) {
+  std::string::size_type percent = pattern.find('%');
+  if (percent == std::string::npos || pattern.find('%', percent + 1) != std::string::npos)
+    throw std::invalid_argument("a sequence pattern holds exactly one %0Nd or %d, got '" + pattern +
+                                "'");
+  std::string::size_type at = percent + 1;
+  while (at < pattern.size() && std::isdigit(static_cast<unsigned char>(pattern[at]))) ++at;
+  if (at >= pattern.size() || pattern[at] != 'd' || at - percent > 3)
+    throw std::invalid_argument("a sequence pattern holds %0Nd or %d (N up to 2 digits), got '" +
+                                pattern + "'");
+  NumberField field;
+  field.begin = percent;
+  field.end = at + 1;
+  field.width = at > percent + 1 ? std::stoi(pattern.substr(percent + 1, at - percent - 1)) : 0;
+  return field;
+}
+
+ImageFormat imageFormatOf(const std::string& extension) {
+  return extension == "exr" ? ImageFormat::Exr : ImageFormat::Png;
+}
+
+class StillSink : public FrameSink {
+ public:
+  explicit StillSink(const OutputTarget& target) : target_(target), file_(target.path) {}
+  void write(int32_t, const RgbaImage& picture) override {
+    if (written_) throw std::runtime_error(target_.path + ": a still image holds one frame");
+    writeImageFile(picture, file_.temporaryPath(), target_.imageFormat);
+    written_ = true;
+  }
+  std::vector<std::string> commit() override {
+    if (!written_) throw std::runtime_error(target_.path + ": no frame was rendered");
+    file_.commit();
+    return {target_.path};
+  }
+
+ private:
+  OutputTarget target_;
+  StagedFile file_;
+  bool written_ = false;
+};
+
+class SequenceSink : public FrameSink {
+ public:
+  explicit SequenceSink(const OutputTarget& target) : target_(target) {}
+  void write(int32_t frame, const RgbaImage& picture) override {
+    files_.emplace_back(target_.frameName(frame));
+    writeImageFile(picture, files_.back().temporaryPath(), target_.imageFormat);
+  }
+  std::vector<std::string> commit() override {
+    std::vector<std::string> names;
+    for (StagedFile& file : files_) {
+      file.commit();
+      names.push_back(file.finalPath());
+    }
+    return names;
+  }
+
+ private:
+  OutputTarget target_;
+  std::vector<StagedFile> files_;
+};
+
+class VideoSink : public FrameSink {
+ public:
+  VideoSink(const OutputTarget& target, int32_t width, int32_t height, double frameRate)
+      : target_(target),
+        file_(target.path),
+        writer_(std::make_unique<VideoWriter>(file_.temporaryPath(), target.container, width,
+                                              height, frameRate)) {}
+  ~VideoSink() override { writer_.reset(); }  // closes the file before the temporary goes
+  void write(int32_t, const RgbaImage& picture) override { writer_->write(picture); }
+  std::vector<std::string> commit() override {
+    writer_->finish();
+    writer_.reset();
+    file_.commit();
+    return {target_.path};
+  }
+  std::string note() const override { return writer_ ? writer_->note() : ""; }
+
+ private:
+  OutputTarget target_;
+  StagedFile file_;
+  std::unique_ptr<VideoWriter> writer_;
+};
+
+}  // namespace
+
+std::string OutputTarget::frameName(int32_t frame) const {
+  NumberField field = numberField(path);
+  std::string number = std::to_string(frame < 0 ? -static_cast<int64_t>(frame) : frame);
+  if (static_cast<int>(number.size()) < field.width)
+    number.insert(0, static_cast<std::size_t>(field.width) - number.size(), '0');
+  if (frame < 0) number.insert(0, "-");
+  return path.substr(0, field.begin) + number + path.substr(field.end);
+}
+
+OutputTarget parseOutputTarget(const std::string& path) {
+  OutputTarget target;
+  target.path = path;
+  std::string extension = lowerExtension(path);
+  if (path.find('%') != std::string::npos) {
+    numberField(path);
+    if (extension != "png" && extension != "exr")
+      throw std::invalid_argument("an image sequence pattern ends in .png or .exr, got '" + path +
+                                  "'");
+    target.kind = OutputKind::Sequence;
+    target.imageFormat = imageFormatOf(extension);
+  } else if (extension == "png" || extension == "exr") {
+    target.kind = OutputKind::Still;
+    target.imageFormat = imageFormatOf(extension);
+  } else if (extension == "mp4" || extension == "mov" || extension == "mkv") {
+    target.kind = OutputKind::Video;
+    target.container = extension == "mp4"   ? VideoContainer::Mp4
+                       : extension == "mov" ? VideoContainer::Mov
+                                            : VideoContainer::Mkv;
+  } else {
+    throw std::invalid_argument(
+        "the output name ends in .png, .exr, .mp4, .mov or .mkv, or is a "
+        "pattern with %04d ending in .png or .exr; got '" +
+        path + "'");
+  }
+  return target;
+}
+
+std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
+                                         double frameRate) {
+  switch (target.kind) {
+    case OutputKind::Still:
+      return std::make_unique<StillSink>(target);
+    case OutputKind::Sequence:
+      return std::make_unique<SequenceSink>(target);
+    case OutputKind::Video:
+      return std::make_unique<VideoSink>(target, width, height, frameRate);
+  }
+  return nullptr;
+}
+
+}  // namespace refhost

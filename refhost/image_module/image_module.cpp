@@ -1,0 +1,78 @@
+// The image module: OpenImageIO reading and writing behind a C interface.
+#include "image_module.h"
+
+#include <OpenImageIO/imageio.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+#include <vector>
+
+namespace {
+
+int fail(char* error, std::size_t size, const std::string& reason) {
+  if (error && size > 0) {
+    std::size_t length = std::min(reason.size(), size - 1);
+    std::memcpy(error, reason.data(), length);
+    error[length] = '\0';
+  }
+  return 1;
+}
+
+std::string orDefault(const std::string& reason, const char* fallback) {
+  return reason.empty() ? fallback : reason;
+}
+
+}  // namespace
+
+extern "C" __attribute__((visibility("default"))) int refhostReadImage(
+    const char* path, int32_t* width, int32_t* height, uint8_t** pixels, char* error,
+    std::size_t errorSize) {
+  // The stored values are wanted as they are: no premultiplying of files with alpha.
+  OIIO::ImageSpec config;
+  config.attribute("oiio:UnassociatedAlpha", 1);
+  auto input = OIIO::ImageInput::open(path, &config);
+  if (!input) return fail(error, errorSize, orDefault(OIIO::geterror(), "unknown format"));
+  const OIIO::ImageSpec& spec = input->spec();
+  if (spec.width <= 0 || spec.height <= 0 || spec.nchannels <= 0)
+    return fail(error, errorSize, "it holds no pixels");
+  int channels = std::min(spec.nchannels, 4);
+  std::size_t count = static_cast<std::size_t>(spec.width) * static_cast<std::size_t>(spec.height);
+  std::vector<uint8_t> data(count * static_cast<std::size_t>(channels));
+  if (!input->read_image(0, 0, 0, channels, OIIO::TypeDesc::UINT8, data.data()))
+    return fail(error, errorSize, orDefault(input->geterror(), "read failed"));
+  input->close();
+  auto* rgba = static_cast<uint8_t*>(std::malloc(count * 4));
+  if (!rgba) return fail(error, errorSize, "out of memory");
+  for (std::size_t i = 0; i < count; ++i) {
+    const uint8_t* from = &data[i * static_cast<std::size_t>(channels)];
+    uint8_t* to = &rgba[i * 4];
+    bool colour = channels >= 3;
+    to[0] = from[0];
+    to[1] = colour ? from[1] : from[0];
+    to[2] = colour ? from[2] : from[0];
+    // Grey + alpha keeps alpha in its second channel, RGBA in its fourth.
+    to[3] = channels == 2 ? from[1] : channels == 4 ? from[3] : 255;
+  }
+  *width = spec.width;
+  *height = spec.height;
+  *pixels = rgba;
+  return 0;
+}
+
+extern "C" __attribute__((visibility("default"))) int refhostWriteImage(
+    const char* path, int format, int32_t width, int32_t height, const uint8_t* pixels, char* error,
+    std::size_t errorSize) {
+  auto output = OIIO::ImageOutput::create(format == 0 ? "png" : "openexr");
+  if (!output) return fail(error, errorSize, orDefault(OIIO::geterror(), "no writer"));
+  OIIO::ImageSpec spec(width, height, 4,
+                       format == 0 ? OIIO::TypeDesc::UINT8 : OIIO::TypeDesc::HALF);
+  spec.alpha_channel = 3;
+  // The bytes go out as they are held; the writer must not divide colour by alpha.
+  spec.attribute("oiio:UnassociatedAlpha", 1);
+  if (!output->open(path, spec) || !output->write_image(OIIO::TypeDesc::UINT8, pixels) ||
+      !output->close())
+    return fail(error, errorSize, orDefault(output->geterror(), "write failed"));
+  return 0;
+}

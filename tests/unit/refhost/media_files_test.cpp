@@ -1,0 +1,190 @@
+// Media on disk: stills written and read back exactly, a small video encoded and decoded frame
+// by frame by index, and output files that appear only when complete.
+#include <gtest/gtest.h>
+#include <stdlib.h>
+
+#include <filesystem>
+#include <fstream>
+
+#include "refhost/frame_output.h"
+#include "refhost/image_files.h"
+#include "refhost/media_source.h"
+#include "refhost/video_reader.h"
+
+namespace refhost {
+namespace {
+
+class ScratchFolder {
+ public:
+  ScratchFolder() {
+    char pattern[] = "/tmp/refhost_media_XXXXXX";
+    path_ = mkdtemp(pattern);
+  }
+  ~ScratchFolder() { std::filesystem::remove_all(path_); }
+  std::string file(const std::string& name) const { return path_ + "/" + name; }
+  std::vector<std::string> entries() const {
+    std::vector<std::string> names;
+    for (const auto& entry : std::filesystem::directory_iterator(path_))
+      names.push_back(entry.path().filename().string());
+    std::sort(names.begin(), names.end());
+    return names;
+  }
+
+ private:
+  std::string path_;
+};
+
+// Every byte value in some channel, and alpha that is neither 0 nor 255.
+RgbaImage everyValue() {
+  RgbaImage image(32, 8);
+  for (std::size_t i = 0; i < image.pixels.size(); ++i)
+    image.pixels[i] = static_cast<uint8_t>((i * 7 + i / 4) & 0xFF);
+  return image;
+}
+
+TEST(ImageFiles, StillsRoundTripExactly) {
+  ScratchFolder folder;
+  RgbaImage image = everyValue();
+  for (ImageFormat format : {ImageFormat::Png, ImageFormat::Exr}) {
+    // The writer goes by the format, not the name: a temporary name has no useful ending.
+    std::string path = folder.file(format == ImageFormat::Png ? "still.tmp1" : "still.tmp2");
+    writeImageFile(image, path, format);
+    RgbaImage back = readImageFile(path);
+    EXPECT_EQ(back.width, 32);
+    EXPECT_EQ(back.height, 8);
+    EXPECT_EQ(back.pixels, image.pixels) << (format == ImageFormat::Png ? "png" : "exr");
+  }
+}
+
+TEST(ImageFiles, StillSourcesStretchToTheAskedSizeAndNameBadFiles) {
+  ScratchFolder folder;
+  RgbaImage image(2, 2, {10, 20, 30, 255});
+  writeImageFile(image, folder.file("flat.png"), ImageFormat::Png);
+  auto source = openMediaSource(MediaSpec::ofFile(folder.file("flat.png")));
+  RgbaImage frame = source->frame(12, 6, 4);
+  EXPECT_EQ(frame.width, 6);
+  EXPECT_EQ(frame.pixel(5, 3), (Rgba8{10, 20, 30, 255}));
+  EXPECT_EQ(source->frameCount(), 0);
+
+  std::ofstream(folder.file("junk.png")) << "not an image";
+  try {
+    openMediaSource(MediaSpec::ofFile(folder.file("junk.png")));
+    FAIL() << "a broken file opened";
+  } catch (const std::runtime_error& error) {
+    EXPECT_NE(std::string(error.what()).find("junk.png"), std::string::npos) << error.what();
+  }
+  EXPECT_THROW(openMediaSource(MediaSpec::ofFile(folder.file("missing.mp4"))), std::runtime_error);
+}
+
+// Twelve counter frames in each container, then frames asked in order and out of order.
+TEST(VideoFiles, DecodedFrameNShowsCounterN) {
+  ScratchFolder folder;
+  const int32_t width = 64, height = 36, frames = 12;
+  for (VideoContainer container : {VideoContainer::Mp4, VideoContainer::Mov, VideoContainer::Mkv}) {
+    const char* name = container == VideoContainer::Mp4   ? "clip.mp4"
+                       : container == VideoContainer::Mov ? "clip.mov"
+                                                          : "clip.mkv";
+    {
+      VideoWriter writer(folder.file(name), container, width, height, 25.0);
+      EXPECT_EQ(writer.codecName(), "libx264") << writer.note();
+      for (int32_t i = 0; i < frames; ++i)
+        writer.write(generatePattern(Pattern::Counter, i, width, height));
+      writer.finish();
+    }
+    VideoReader reader(folder.file(name));
+    EXPECT_EQ(reader.width(), width);
+    EXPECT_EQ(reader.height(), height);
+    EXPECT_DOUBLE_EQ(reader.frameRate(), 25.0);
+    EXPECT_EQ(reader.frameCount(), frames) << name;
+    for (int32_t index : {0, 1, 2, 3, 9, 4, 11, 5, 5, 0, 10}) {
+      EXPECT_EQ(readCounterCode(reader.frame(index, width, height)), index) << name;
+    }
+    // Beyond either end the nearest frame holds.
+    EXPECT_EQ(readCounterCode(reader.frame(40, width, height)), frames - 1) << name;
+    EXPECT_EQ(readCounterCode(reader.frame(-3, width, height)), 0) << name;
+    // Scaled on the way out.
+    EXPECT_EQ(readCounterCode(reader.frame(6, 2 * width, 2 * height)), 6) << name;
+  }
+}
+
+TEST(VideoFiles, OddSizesArePaddedToEvenOnes) {
+  ScratchFolder folder;
+  {
+    VideoWriter writer(folder.file("odd.mp4"), VideoContainer::Mp4, 65, 37, 30.0);
+    writer.write(generatePattern(Pattern::Counter, 3, 65, 37));
+    writer.finish();
+  }
+  VideoReader reader(folder.file("odd.mp4"));
+  EXPECT_EQ(reader.width(), 66);
+  EXPECT_EQ(reader.height(), 38);
+  EXPECT_EQ(readCounterCode(reader.frame(0, 66, 38)), 3);
+}
+
+TEST(OutputTarget, NamesChooseTheKindOfOutput) {
+  struct Case {
+    const char* path;
+    OutputKind kind;
+    ImageFormat format;
+  };
+  const Case cases[] = {
+      {"out.png", OutputKind::Still, ImageFormat::Png},
+      {"dir/OUT.EXR", OutputKind::Still, ImageFormat::Exr},
+      {"frames/f_%04d.png", OutputKind::Sequence, ImageFormat::Png},
+      {"f%d.exr", OutputKind::Sequence, ImageFormat::Exr},
+      {"clip.mp4", OutputKind::Video, ImageFormat::Png},
+      {"clip.MKV", OutputKind::Video, ImageFormat::Png},
+      {"clip.mov", OutputKind::Video, ImageFormat::Png},
+  };
+  for (const Case& c : cases) {
+    OutputTarget target = parseOutputTarget(c.path);
+    EXPECT_EQ(target.kind, c.kind) << c.path;
+    if (c.kind != OutputKind::Video) {
+      EXPECT_EQ(target.imageFormat, c.format) << c.path;
+    }
+  }
+  for (const char* bad : {"out.jpg", "out", "f_%04d.mp4", "f_%s.png", "f_%04d_%04d.png",
+                          "f_%123d.png", "dir.png/out"}) {
+    EXPECT_THROW(parseOutputTarget(bad), std::invalid_argument) << bad;
+  }
+  EXPECT_EQ(parseOutputTarget("a/f_%04d.png").frameName(7), "a/f_0007.png");
+  EXPECT_EQ(parseOutputTarget("f%d.exr").frameName(12345), "f12345.exr");
+  EXPECT_EQ(parseOutputTarget("f%03d.exr").frameName(-2), "f-002.exr");
+}
+
+TEST(FrameSink, NothingAppearsUnderTheNameUntilCommitted) {
+  const RgbaImage picture = generatePattern(Pattern::Counter, 1, 64, 36);
+  for (const char* name : {"still.png", "seq_%02d.exr", "clip.mkv"}) {
+    ScratchFolder folder;
+    OutputTarget target = parseOutputTarget(folder.file(name));
+    {
+      // Dropped half-way, as on an error: everything written so far goes.
+      auto sink = openFrameSink(target, 64, 36, 25.0);
+      sink->write(0, picture);
+      EXPECT_EQ(folder.entries().size(), 1u) << name;  // the temporary, hidden
+      EXPECT_EQ(folder.entries().front()[0], '.') << name;
+    }
+    EXPECT_TRUE(folder.entries().empty()) << name;
+
+    auto sink = openFrameSink(target, 64, 36, 25.0);
+    sink->write(0, picture);
+    if (target.kind != OutputKind::Still) sink->write(1, picture);
+    std::vector<std::string> written = sink->commit();
+    std::vector<std::string> expected =
+        target.kind == OutputKind::Sequence
+            ? std::vector<std::string>{folder.file("seq_00.exr"), folder.file("seq_01.exr")}
+            : std::vector<std::string>{folder.file(name)};
+    EXPECT_EQ(written, expected) << name;
+    EXPECT_EQ(folder.entries().size(), expected.size()) << name;  // no temporaries left
+  }
+}
+
+TEST(FrameSink, AStillTakesOneFrame) {
+  ScratchFolder folder;
+  auto sink = openFrameSink(parseOutputTarget(folder.file("one.png")), 4, 4, 25.0);
+  EXPECT_THROW(sink->commit(), std::runtime_error);
+  sink->write(0, RgbaImage(4, 4));
+  EXPECT_THROW(sink->write(1, RgbaImage(4, 4)), std::runtime_error);
+}
+
+}  // namespace
+}  // namespace refhost

@@ -1,0 +1,225 @@
+// Host resources with a real GL context: textures, buffers and the vertex array handed to the
+// plug-in and their accounting; frame fetches, layer states and timing, with refusals.
+#include <GL/glew.h>
+#include <gtest/gtest.h>
+
+#include <cstring>
+
+#include "refhost/host.h"
+
+namespace refhost {
+namespace {
+
+Layer makeLayer(const std::string& guid, const std::string& name, int32_t kind,
+                int32_t firstFrame = 0, int32_t frameCount = 1, int32_t width = 1920,
+                int32_t height = 1080) {
+  Layer layer;
+  layer.guid = guid;
+  layer.name = name;
+  layer.kind = kind;
+  layer.firstFrame = firstFrame;
+  layer.frameCount = frameCount;
+  layer.width = width;
+  layer.height = height;
+  return layer;
+}
+
+class HostResources : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    // A GL test never skips: without a context it fails and says why.
+    try {
+      host.attachGl();
+    } catch (const std::exception& error) {
+      FAIL() << "no GL context: " << error.what();
+    }
+  }
+  void TearDown() override {
+    if (host.gl()) {
+      EXPECT_TRUE(host.gl()->errors().empty()) << host.gl()->errors()[0].text;
+    }
+  }
+
+  Host host;
+  tagWispAPI& api = host.api();
+  WispHost* h = host.handle();
+};
+
+TEST_F(HostResources, TexturesAreAllocatedAtTheirSizeAndCounted) {
+  struct Size {
+    int32_t width, height;
+    uint32_t format;
+  };
+  const Size sizes[] = {
+      {64, 36, GL_RGBA}, {1, 1, GL_RGBA16F}, {0, 0, GL_RGBA}, {320, 180, GL_RGBA}};
+  std::vector<uint32_t> ids;
+  for (const Size& size : sizes) {
+    int32_t width = -1, height = -1;
+    uint32_t id = api.AllocateTexture(h, nullptr, size.width, size.height, size.format, GL_RGBA,
+                                      GL_UNSIGNED_BYTE, nullptr, &width, &height);
+    EXPECT_NE(id, 0u);
+    EXPECT_EQ(width, size.width);
+    EXPECT_EQ(height, size.height);
+    GLint stored = 0;
+    glBindTexture(GL_TEXTURE_2D, id);
+    glGetTexLevelParameteriv(GL_TEXTURE_2D, 0, GL_TEXTURE_WIDTH, &stored);
+    EXPECT_EQ(stored, size.width);
+    ids.push_back(id);
+  }
+  EXPECT_EQ(host.callLog()[0], "AllocateTexture 64 36 0x1908 0x1908 0x1401 null");
+  EXPECT_EQ(host.outstandingTextures(), 4);
+  api.ReleaseTexture(h, nullptr, ids[1]);
+  api.ReleaseTexture(h, nullptr, ids[3]);
+  EXPECT_EQ(host.outstandingTextures(), 2);
+  EXPECT_TRUE(host.problems().empty());
+  api.ReleaseTexture(h, nullptr, ids[1]);  // twice
+  api.ReleaseTexture(h, nullptr, 0);
+  EXPECT_EQ(host.outstandingTextures(), 2);
+  EXPECT_EQ(host.problems().size(), 2u);
+
+  // An impossible size is refused with id 0 and nothing to give back.
+  int32_t width = -1, height = -1;
+  EXPECT_EQ(api.AllocateTexture(h, nullptr, -4, 10, GL_RGBA, GL_RGBA, GL_UNSIGNED_BYTE, nullptr,
+                                &width, &height),
+            0u);
+  EXPECT_EQ(width, 0);
+  EXPECT_EQ(host.outstandingTextures(), 2);
+}
+
+TEST_F(HostResources, AllocationKeepsThePluginsTextureBinding) {
+  TextureRecord mine = host.createTexture(4, 4);
+  glActiveTexture(GL_TEXTURE0);
+  glBindTexture(GL_TEXTURE_2D, mine.id);
+  int32_t width = 0, height = 0;
+  uint32_t id = api.AllocateTexture(h, nullptr, 8, 8, GL_RGBA, GL_RGBA, GL_UNSIGNED_BYTE, nullptr,
+                                    &width, &height);
+  GLint bound = 0;
+  glGetIntegerv(GL_TEXTURE_BINDING_2D, &bound);
+  EXPECT_EQ(static_cast<uint32_t>(bound), mine.id);
+  api.ReleaseTexture(h, nullptr, id);
+  host.deleteTexture(mine.id);
+}
+
+TEST_F(HostResources, BuffersHoldTheirDataAndAreCounted) {
+  const float vertices[] = {0, 0, 0.5f, 0.25f, 1, 1, 0.75f, 1};
+  uint32_t hostOutput = 0;
+  uint32_t vertexArray = api.CreateVertexArray(h);
+  EXPECT_NE(vertexArray, 0u);
+  EXPECT_EQ(api.CreateVertexArray(h), vertexArray);  // one per host, reused
+  glBindVertexArray(vertexArray);
+  uint32_t buffer = api.AcquireBuffer(h, GL_ARRAY_BUFFER, sizeof vertices, vertices,
+                                      GL_DYNAMIC_DRAW, &hostOutput);
+  uint32_t indices =
+      api.AcquireBuffer(h, GL_ELEMENT_ARRAY_BUFFER, 12, nullptr, GL_DYNAMIC_DRAW, nullptr);
+  ASSERT_NE(buffer, 0u);
+  GLint bound = 0;
+  glGetIntegerv(GL_ARRAY_BUFFER_BINDING, &bound);
+  EXPECT_EQ(static_cast<uint32_t>(bound), buffer);
+  float readBack[8] = {};
+  glGetBufferSubData(GL_ARRAY_BUFFER, 0, sizeof readBack, readBack);
+  EXPECT_EQ(std::memcmp(readBack, vertices, sizeof vertices), 0);
+  EXPECT_EQ(host.outstandingBuffers(), 2);
+  EXPECT_EQ(host.callsTo("AcquireBuffer")[0], "AcquireBuffer 0x8892 32 data 0x88E8");
+
+  api.ReleaseBuffer(h, buffer);
+  api.ReleaseBuffer(h, indices);
+  api.ReleaseBuffer(h, indices);
+  glBindVertexArray(0);
+  EXPECT_EQ(host.outstandingBuffers(), 0);
+  EXPECT_EQ(host.problems().size(), 1u);
+}
+
+TEST_F(HostResources, FramesCarryTheirIndexAndAreTheHosts) {
+  host.addLayer(makeLayer("11111111-2222-3333-4444-555555555555", "Clip", 0, 100, 50, 16, 8));
+  WispRenderContext context{};
+  context.width = 32;
+  context.height = 18;
+
+  TextureRecord source{};
+  ASSERT_EQ(api.GetSourceFrame(h, &context, 300, &source), 0);
+  EXPECT_EQ(source.imageWidth, 32);
+  EXPECT_EQ(source.s1, 1.0f);
+  std::vector<uint8_t> pixels = host.readTexture(source.id, 32, 18);
+  EXPECT_EQ(pixels[0], 300 % 256);
+  EXPECT_EQ(pixels[1], 300 / 256);
+  EXPECT_EQ(pixels[2], 0);
+
+  TextureRecord layer{};
+  ASSERT_EQ(api.RenderLayerFrame(h, &context, "11111111-2222-3333-4444-555555555555", 7, &layer),
+            0);
+  EXPECT_EQ(layer.imageWidth, 16);
+  EXPECT_EQ(host.readTexture(layer.id, 16, 8)[2], 1);  // the first layer's tag
+  EXPECT_EQ(host.outstandingTextures(), 0);
+  EXPECT_EQ(host.outstandingFrames(), 2);
+  api.ReleaseTexture(h, nullptr, layer.id);
+  EXPECT_EQ(host.outstandingFrames(), 1);
+  EXPECT_TRUE(host.problems().empty());
+
+  TextureRecord refused{};
+  EXPECT_NE(api.RenderLayerFrame(h, &context, "00000000-0000-0000-0000-000000000000", 7, &refused),
+            0);
+  host.setRefuseSourceFrames(true);
+  host.setRefuseLayerFrames(true);
+  EXPECT_NE(api.GetSourceFrame(h, &context, 1, &refused), 0);
+  EXPECT_NE(api.RenderLayerFrame(h, &context, "11111111-2222-3333-4444-555555555555", 7, &refused),
+            0);
+  EXPECT_EQ(host.outstandingFrames(), 1);
+}
+
+TEST_F(HostResources, LayerStatesAndTimingFollowTheComposition) {
+  Layer layer = makeLayer("11111111-2222-3333-4444-555555555555", "Clip", 4, 100, 50, 640, 360);
+  layer.is3D = true;
+  layer.placement[12] = -320;
+  host.addLayer(layer);
+  host.addLayer(makeLayer("aaaaaaaa-bbbb-cccc-dddd-eeeeeeeeeeee", "Camera", 2));
+
+  EXPECT_EQ(api.GetLayerCount(h), 2);
+  char guid[40] = {}, name[5] = {};
+  int32_t kind = -1;
+  api.GetLayerInfo(h, 1, guid, name, sizeof name, &kind);
+  EXPECT_STREQ(guid, "aaaaaaaa-bbbb-cccc-dddd-eeeeeeeeeeee");
+  EXPECT_STREQ(name, "Came");  // bounded by the buffer size, terminated
+  EXPECT_EQ(kind, 2);
+
+  LayerState state;
+  std::memset(&state, 0xAB, sizeof state);
+  ASSERT_EQ(api.QueryLayerState(h, layer.guid.c_str(), 4000, &state), 0);
+  EXPECT_EQ(state.type, 4u);
+  EXPECT_EQ(state.firstFrame, 100);
+  EXPECT_EQ(state.frameCount, 50);
+  EXPECT_EQ(state.is3D, 1);
+  EXPECT_EQ(state.width, 640);
+  EXPECT_EQ(state.height, 360);
+  EXPECT_EQ(state.placement[12], -320.0f);
+  EXPECT_EQ(state.secondMatrix[15], 1.0f);
+  EXPECT_EQ(api.QueryLayerState(h, "ffffffff-ffff-ffff-ffff-ffffffffffff", 0, &state), 1);
+
+  WispTimeInfo time{};
+  host.setTimeInfo(320, 180, 30.0);
+  ASSERT_EQ(api.GetTimeInfo(h, &time), 0);
+  EXPECT_EQ(time.width, 320);
+  EXPECT_EQ(time.frameRate, 30.0);
+
+  host.setFailLayerQueries(true);
+  host.setFailTimeInfo(true);
+  EXPECT_NE(api.QueryLayerState(h, layer.guid.c_str(), 4000, &state), 0);
+  EXPECT_NE(api.GetTimeInfo(h, &time), 0);
+}
+
+TEST(HostWithoutGl, RefusesGlResourcesAndSaysWhy) {
+  Host host;
+  int32_t width = -1, height = -1;
+  EXPECT_EQ(host.api().AllocateTexture(host.handle(), nullptr, 8, 8, GL_RGBA, GL_RGBA,
+                                       GL_UNSIGNED_BYTE, nullptr, &width, &height),
+            0u);
+  EXPECT_EQ(host.api().AcquireBuffer(host.handle(), GL_ARRAY_BUFFER, 8, nullptr, GL_DYNAMIC_DRAW,
+                                     nullptr),
+            0u);
+  TextureRecord frame{};
+  EXPECT_NE(host.api().GetSourceFrame(host.handle(), nullptr, 0, &frame), 0);
+  EXPECT_EQ(host.outstandingTextures() + host.outstandingBuffers() + host.outstandingFrames(), 0);
+  EXPECT_EQ(host.problems().size(), 3u);
+}
+
+}  // namespace
+}  // namespace refhost
