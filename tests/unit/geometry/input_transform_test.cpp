@@ -1,0 +1,85 @@
+// Input placement: the sampling transform from the input parameters and the control rectangle.
+#include "geometry/input_transform.h"
+
+#include <gtest/gtest.h>
+
+#include "effect/param_ids.h"
+#include "geometry/angles.h"
+#include "support/param_host.h"
+
+namespace veltrane {
+namespace {
+
+class InputTransform : public ::testing::Test {
+ protected:
+  void place(int input, float tx, float ty, float scale, float degrees) {
+    host.setPoint(inputParamId(param::kInputFrameTranslationPrefix, input), tx, ty);
+    host.setFloat(inputParamId(param::kInputFrameScalePrefix, input), scale);
+    host.setAngle(inputParamId(param::kInputFrameRotationPrefix, input), degrees);
+  }
+  testsupport::ParamHost host;
+};
+
+TEST_F(InputTransform, SamplingFromParameters) {
+  const float wide = 1920.0f / 1080.0f;
+  const struct {
+    const char* what;
+    float tx, ty, scale, degrees;
+    int32_t width, height;
+    bool aspectPresent;
+    float aspect, offsetX, offsetY, inverseScale, rotation, aspectRatio;
+  } cases[] = {
+      {"identity", 0, 0, 100, 0, 1920, 1080, false, 1, 0, 0, 1, 0, wide},
+      {"double size", 0, 0, 200, 0, 1920, 1080, false, 1, 0, 0, 0.5f, 0, wide},
+      {"scale 0 samples unscaled", 0, 0, 0, 0, 100, 100, false, 1, 0, 0, 1, 0, 1},
+      {"moved, pixel aspect 2", 100, -54, 100, 0, 1920, 1080, true, 2, -100.0f / 3840, 0.05f, 1, 0,
+       wide},
+      {"pixel aspect needs its flag", 100, 0, 100, 0, 1920, 1080, false, 2, -100.0f / 1920, 0, 1, 0,
+       wide},
+      {"turned", 0, 0, 100, 90, 64, 64, false, 1, 0, 0, 1, -kHalfPi, 1},
+  };
+  for (const auto& c : cases) {
+    place(3, c.tx, c.ty, c.scale, c.degrees);
+    const InputSampling s = readInputSampling(host.handle(), host.api(), 0, c.width, c.height,
+                                              c.aspectPresent, c.aspect, 3);
+    EXPECT_FLOAT_EQ(s.sampleOffset.x, c.offsetX) << c.what;
+    EXPECT_FLOAT_EQ(s.sampleOffset.y, c.offsetY) << c.what;
+    EXPECT_FLOAT_EQ(s.inverseScale, c.inverseScale) << c.what;
+    EXPECT_FLOAT_EQ(s.sampleRotation, c.rotation) << c.what;
+    EXPECT_FLOAT_EQ(s.aspectRatio, c.aspectRatio) << c.what;
+  }
+  EXPECT_EQ(makeInputSampling({0, 0}, 100, 0, 64, 0, 1).aspectRatio, 1.0f);  // height 0
+}
+
+TEST_F(InputTransform, QuarterTurnPointsThePictureUpAlongPlusX) {
+  // In a 2:1 frame the turn is true on screen: the middle of the picture's top edge lands half
+  // a picture height, a quarter of the frame width, right of the centre.
+  place(0, 0, 0, 100, 90);
+  const InputSampling s = readInputSampling(host.handle(), host.api(), 0, 200, 100, false, 1, 0);
+  const auto picture = inputTextureCoordinate(s, {0.75f, 0.5f});
+  EXPECT_NEAR(picture.x, 0.5f, 1e-6f);
+  EXPECT_NEAR(picture.y, 1.0f, 1e-6f);
+}
+
+TEST_F(InputTransform, ControlRectangleAndRotation) {
+  const struct {
+    float tx, ty, scale, x0, y0, x1, y1;
+  } cases[] = {
+      {0, 0, 50, 480, 270, 1440, 810},
+      {0, 0, 200, -960, -540, 2880, 1620},
+      {100, -40, 0, 1060, 500, 1060, 500},
+  };
+  for (const auto& c : cases) {
+    place(8, c.tx, c.ty, c.scale, 0);
+    const auto rect = inputControlRect(host.handle(), host.api(), 0, {1920, 1080}, 8);
+    EXPECT_FLOAT_EQ(rect.x, c.x0);
+    EXPECT_FLOAT_EQ(rect.y, c.y0);
+    EXPECT_FLOAT_EQ(rect.z, c.x1);
+    EXPECT_FLOAT_EQ(rect.w, c.y1);
+  }
+  place(8, 0, 0, 100, 450);
+  EXPECT_FLOAT_EQ(inputRotationRadians(host.handle(), host.api(), 0, 8), 2.5f * kPi);
+}
+
+}  // namespace
+}  // namespace veltrane
