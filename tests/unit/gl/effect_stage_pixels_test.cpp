@@ -1,0 +1,178 @@
+// The split-screen sample and border combine stages rendered on Mesa and compared, pixel by
+// pixel, with a CPU model of their formulas.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <vector>
+
+#include "gl/draws.h"
+#include "gl/render_target.h"
+#include "gl/texture_units.h"
+#include "gl/textured_quad.h"
+#include "gl_layer_test.h"
+#include "shaders/shader_identifiers.h"
+
+namespace {
+
+using namespace veltrane;
+namespace ids = veltrane::shader_ids;
+
+constexpr int kWidth = 64;
+constexpr int kHeight = 36;
+
+class EffectStagePixels : public gltest::GlLayerTest {
+ protected:
+  void SetUp() override {
+    GlLayerTest::SetUp();
+    buildPrograms();
+  }
+
+  void select(const char* program) {
+    const float identity[16] = {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1};
+    registry_->useProgram(program);
+    registry_->setUniformMatrix(uniform(ids::kProjectionMatrix), 4, 1, false, context_.projection);
+    registry_->setUniformMatrix(uniform(ids::kModelViewMatrix), 4, 1, true, identity);
+  }
+  GLint uniform(const char* name) { return registry_->uniformLocation(name); }
+
+  // Draws the frame with texture coordinates 0..1, as a region covering it would, into a new
+  // target and reads it back.
+  std::vector<float> drawFrame() {
+    RenderTarget target = createRenderTarget(handle(), api(), false);
+    attachRenderTarget(target.texture, 0, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
+    glClearColor(0, 0, 0, 0);
+    glClear(GL_COLOR_BUFFER_BIT);
+    TextureRecord unitSquare{};
+    unitSquare.s1 = unitSquare.t1 = 1.0f;
+    const TexturedQuad quad = makeTextureQuad(unitSquare, kWidth, kHeight);
+    drawTexturedVertices(api(), handle(), quad.data(), 4, GL_TRIANGLE_STRIP);
+    registry_->releaseProgram();
+    return readImage(target.texture);
+  }
+};
+
+// Source texels are linear ramps over the whole allocation, so bilinear sampling reproduces the
+// ramp exactly between texel centres and the model needs no filtering of its own.
+constexpr int kSourceWidth = 128;
+constexpr int kSourceHeight = 64;
+float ramp(float coordinate, int size, float step) {
+  return step * std::fmin(std::fmax(coordinate * size - 0.5f, 0.0f), size - 1.0f) / 255.0f;
+}
+
+TEST_F(EffectStagePixels, SplitScreenSampleMatchesTheModel) {
+  std::vector<float> texels;
+  for (int j = 0; j < kSourceHeight; ++j) {
+    for (int i = 0; i < kSourceWidth; ++i)
+      texels.insert(texels.end(), {2 * i / 255.0f, 4 * j / 255.0f, 0.5f, 1});
+  }
+  const TextureRecord source =
+      makeTexture(kWidth, kHeight, kSourceWidth, kSourceHeight, GL_RGBA8, texels);
+  const float aspect = static_cast<float>(kWidth) / kHeight;
+  const struct {
+    const char* label;
+    float offsetX, offsetY, rotation, inverseScale, aspect, tint[3];
+  } cases[] = {
+      {"identity", 0, 0, 0, 1, 1, {1, 1, 1}},
+      {"half size", 0, 0, 0, 2, 1, {1, 1, 1}},
+      {"moved and tinted", 0.1f, -0.05f, 0, 1, 1, {0.5f, 1, 0.25f}},
+      {"turned and enlarged", 0, 0, 0.7f, 0.8f, aspect, {1, 1, 1}},
+      {"quarter turn", 0.05f, 0, -1.5707964f, 1.25f, aspect, {1, 1, 1}},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(c.label);
+    select("splitScreen");
+    bindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, source.id, true);
+    registry_->setUniform1i(uniform(ids::kSourceTexture), 0);
+    registry_->setUniform2f(uniform(ids::kSourceExtent), source.s1, source.t1);
+    registry_->setUniform3f(uniform(ids::kTint), c.tint[0], c.tint[1], c.tint[2]);
+    registry_->setUniform2f(uniform(ids::kSampleOffset), c.offsetX, c.offsetY);
+    registry_->setUniform1f(uniform(ids::kSampleRotation), c.rotation);
+    registry_->setUniform1f(uniform(ids::kInverseScale), c.inverseScale);
+    registry_->setUniform1f(uniform(ids::kAspectRatio), c.aspect);
+    const std::vector<float> pixels = drawFrame();
+
+    int compared = 0, outside = 0;
+    for (int y = 0; y < kHeight; ++y) {
+      for (int x = 0; x < kWidth; ++x) {
+        const float px = ((x + 0.5f) / kWidth - 0.5f + c.offsetX) * c.inverseScale * c.aspect;
+        const float py = ((y + 0.5f) / kHeight - 0.5f + c.offsetY) * c.inverseScale;
+        const float cr = std::cos(c.rotation), sr = std::sin(c.rotation);
+        const float u = (cr * px + sr * py) / c.aspect + 0.5f;
+        const float v = -sr * px + cr * py + 0.5f;
+        const auto onEdge = [](float w) {
+          return std::fabs(w) < 1e-3f || std::fabs(w - 1) < 1e-3f;
+        };
+        if (onEdge(u) || onEdge(v)) continue;  // either answer is right on the boundary
+        const bool inside = u >= 0 && u <= 1 && v >= 0 && v <= 1;
+        const float expected[4] = {inside ? ramp(u * source.s1, kSourceWidth, 2) * c.tint[0] : 0,
+                                   inside ? ramp(v * source.t1, kSourceHeight, 4) * c.tint[1] : 0,
+                                   inside ? 0.5f * c.tint[2] : 0, inside ? 1.0f : 0};
+        for (int k = 0; k < 4; ++k) {
+          // 8-bit output and the source's own rounding of 0.5
+          ASSERT_NEAR(pixels[static_cast<size_t>((y * kWidth + x) * 4 + k)], expected[k],
+                      1.5f / 255)
+              << "pixel " << x << "," << y << " channel " << k;
+        }
+        ++compared;
+        outside += inside ? 0 : 1;
+      }
+    }
+    EXPECT_GT(compared, kWidth * kHeight * 9 / 10);
+    if (c.inverseScale == 2) {
+      EXPECT_GT(outside, kWidth * kHeight / 2) << "beyond a quarter frame from the centre";
+    }
+  }
+  unbindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, true);
+}
+
+TEST_F(EffectStagePixels, BorderCombineCoverageFollowsTheDistance) {
+  const float composition[4] = {0.2f, 0.4f, 0.6f, 1.0f};  // exact in 8 bits
+  std::vector<float> flat;
+  for (int i = 0; i < kWidth * kHeight; ++i) flat.insert(flat.end(), composition, composition + 4);
+  const TextureRecord picture = makeTexture(kWidth, kHeight, kWidth, kHeight, GL_RGBA8, flat);
+  const float border[4] = {0.8f, 0, 0, 0.8f};  // red at alpha 0.8, premultiplied
+
+  const struct {
+    float halfWidth, distance, coverage;
+  } cases[] = {
+      {3, 2.5f, 1}, {3, 3, 0.5f},    {3, 3.5f, 0}, {3, 0, 1},         {3, 9, 0},
+      {0, 0, 0},    {0.5f, 0, 0.5f}, {0.5f, 1, 0}, {1, 0.75f, 0.75f}, {2, 2.25f, 0.25f},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(testing::Message() << "h " << c.halfWidth << " d " << c.distance);
+    // The distance image fills the left half of a texture twice as wide, so the combine has to
+    // scale its coordinates into it; the right half would read as "no border".
+    std::vector<float> field;
+    for (int i = 0; i < 2 * kWidth * kHeight; ++i) {
+      const float value = i % (2 * kWidth) < kWidth ? c.distance / (c.halfWidth + 1) : 1;
+      field.insert(field.end(), {value, value, value, 1});
+    }
+    const TextureRecord distance =
+        makeTexture(kWidth, kHeight, 2 * kWidth, kHeight, GL_RGBA32F, field);
+    select("combineBorder");
+    bindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, picture.id, true);
+    bindTextureUnit(GL_TEXTURE1, GL_TEXTURE_2D, distance.id, true);
+    registry_->setUniform1i(uniform(ids::kSourceTexture), 0);
+    registry_->setUniform1i(uniform(ids::kDistanceTexture), 1);
+    registry_->setUniform2f(uniform(ids::kDistanceScale), distance.s1 / picture.s1,
+                            distance.t1 / picture.t1);
+    registry_->setUniform1f(uniform(ids::kBorderHalfWidth), c.halfWidth);
+    registry_->setUniform4f(uniform(ids::kBorderColour), border[0], border[1], border[2],
+                            border[3]);
+    const std::vector<float> pixels = drawFrame();
+    unbindTextureUnit(GL_TEXTURE1, GL_TEXTURE_2D, true);
+    unbindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, true);
+
+    for (size_t i = 0; i < pixels.size(); i += 4 * 37) {
+      for (size_t k = 0; k < 4; ++k) {
+        const float expected = composition[k] * (1 - c.coverage) + border[k] * c.coverage;
+        // No coverage must leave the composition exactly as it was.
+        ASSERT_NEAR(pixels[i + k], std::round(expected * 255) / 255,
+                    c.coverage == 0 ? 1e-6f : 1.0f / 255)
+            << "pixel " << i / 4 << " channel " << k;
+      }
+    }
+  }
+}
+
+}  // namespace

@@ -1,0 +1,150 @@
+// Render targets and the textured draw on Mesa through the reference host, and
+// the shared matrix product.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <vector>
+
+#include "gl/draws.h"
+#include "gl/matrix4.h"
+#include "gl/render_target.h"
+#include "gl/texture_units.h"
+#include "gl/textured_quad.h"
+#include "gl_layer_test.h"
+#include "shaders/shader_identifiers.h"
+
+namespace {
+
+using namespace veltrane;
+
+using RenderTargets = gltest::GlLayerTest;
+
+TEST_F(RenderTargets, TemplateFollowsTheTextureFormatMode) {
+  context_.output.scaleX = 2.0f;
+  context_.second.format = GL_RGBA8;
+  context_.second.pixelType = GL_UNSIGNED_SHORT;
+  context_.second.imageWidth = 40;
+  context_.second.imageHeight = 20;
+  const struct {
+    uint32_t mode;
+    bool floatFormat;
+    uint32_t format, pixelType;
+    int width, height;
+    float scaleX;
+    const char* allocation;  // as the host logs it: size, formats, type, data
+  } cases[] = {
+      {0, false, GL_RGBA, GL_UNSIGNED_BYTE, 64, 36, 2, "64 36 0x1908 0x1908 0x1401 null"},
+      {0, true, GL_RGBA16F, GL_UNSIGNED_BYTE, 64, 36, 2, "64 36 0x881A 0x1908 0x1401 null"},
+      {2, true, GL_RGBA8, GL_UNSIGNED_SHORT, 40, 20, 0, "40 20 0x8058 0x1908 0x1401 null"},
+      {1, false, GL_RGBA, GL_FLOAT, 0, 0, 1, "0 0 0x1908 0x1908 0x1401 null"},
+      {7, true, GL_RGBA16F, GL_FLOAT, 0, 0, 1, "0 0 0x881A 0x1908 0x1401 null"},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(testing::Message() << "mode " << c.mode << " float " << c.floatFormat);
+    host_->clearCallLog();
+    api()->textureFormatMode = c.mode;
+    RenderTarget target = createRenderTarget(handle(), api(), c.floatFormat);
+    EXPECT_EQ(host_->callsTo("AllocateTexture"),
+              std::vector<std::string>{std::string("AllocateTexture ") + c.allocation});
+    EXPECT_TRUE(target.owned);
+    EXPECT_EQ(target.texture.format, c.format);
+    EXPECT_EQ(target.texture.pixelType, c.pixelType);
+    EXPECT_EQ(target.texture.imageWidth, c.width);
+    EXPECT_EQ(target.texture.imageHeight, c.height);
+    EXPECT_EQ(target.texture.allocatedWidth, c.width) << "this host allocates exact sizes";
+    EXPECT_FLOAT_EQ(target.texture.s1, c.width ? 1.0f : 0.0f);
+    EXPECT_FLOAT_EQ(target.texture.scaleX, c.scaleX);
+  }  // each target gives its texture back as it goes
+}
+
+TEST_F(RenderTargets, EachTextureIsGivenBackExactlyOnce) {
+  {
+    RenderTarget first = createRenderTarget(handle(), api(), false);
+    releaseRenderTarget(first);
+    releaseRenderTarget(first);
+    EXPECT_EQ(first.texture.id, 0u);
+    RenderTarget second = createRenderTarget(handle(), api(), false);
+    RenderTarget moved = std::move(second);
+    RenderTarget borrowed = RenderTarget::borrowed(context_.output);
+    EXPECT_FALSE(borrowed.owned);
+    EXPECT_EQ(host_->outstandingTextures(), 1);
+  }  // `moved` gives its texture back; the moved-from and the borrowed one give nothing
+  EXPECT_EQ(host_->callsTo("ReleaseTexture").size(), 2u);
+}
+
+TEST_F(RenderTargets, AttachingALevelSetsTheViewportToItsSize) {
+  RenderTarget target = createRenderTarget(handle(), api(), false);
+  TextureRecord large = target.texture;
+  large.imageWidth = 1920;
+  large.imageHeight = 1080;
+  for (const auto& [level, width, height] :
+       {std::tuple{0, 1920, 1080}, std::tuple{1, 960, 540}, std::tuple{3, 240, 135}}) {
+    attachRenderTarget(large, level, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
+    GLint viewport[4] = {};
+    glGetIntegerv(GL_VIEWPORT, viewport);
+    EXPECT_EQ(viewport[2], width) << "level " << level;
+    EXPECT_EQ(viewport[3], height);
+  }
+  GLint attached = 0;
+  glGetFramebufferAttachmentParameteriv(GL_FRAMEBUFFER, GL_COLOR_ATTACHMENT0,
+                                        GL_FRAMEBUFFER_ATTACHMENT_OBJECT_NAME, &attached);
+  EXPECT_EQ(static_cast<GLuint>(attached), target.texture.id);
+}
+
+using TexturedDraw = gltest::GlLayerTest;
+
+// The frame quad over the image part of a larger source texture, drawn through the copy
+// program, reproduces that image texel for texel: positions reach attribute 0, texture
+// coordinates attribute 8, and the corners sit in strip order.
+TEST_F(TexturedDraw, FrameQuadCopiesTheImagePartExactly) {
+  buildPrograms();
+  std::vector<float> texels;
+  for (int y = 0; y < 64; ++y) {
+    for (int x = 0; x < 128; ++x)
+      texels.insert(texels.end(), {x / 255.f, y / 255.f, (x * 7 + y * 3) % 256 / 255.f, 1});
+  }
+  context_.source = makeTexture(64, 36, 128, 64, GL_RGBA8, texels);
+  RenderTarget target = createRenderTarget(handle(), api(), false);
+  attachRenderTarget(target.texture, 0, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
+  registry_->useProgram("glCopy");
+  const float identity[16] = {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1};
+  registry_->setUniformMatrix(registry_->uniformLocation(shader_ids::kProjectionMatrix), 4, 1,
+                              false, context_.projection);
+  registry_->setUniformMatrix(registry_->uniformLocation(shader_ids::kModelViewMatrix), 4, 1, true,
+                              identity);
+  bindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, context_.source.id, true);
+  const TexturedQuad quad = makeFrameQuad(context_);
+  drawTexturedVertices(api(), handle(), quad.data(), 4, GL_TRIANGLE_STRIP);
+  drawTexturedVertices(api(), handle(), quad.data(), 0, GL_TRIANGLE_STRIP);  // draws nothing
+  unbindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, true);
+  registry_->releaseProgram();
+  EXPECT_EQ(host_->callsTo("AcquireBuffer").size(), 1u);
+
+  const std::vector<float> pixels = readImage(target.texture);
+  for (int y = 0; y < 36; ++y) {
+    for (int x = 0; x < 64; ++x) {
+      for (int k = 0; k < 4; ++k) {
+        ASSERT_FLOAT_EQ(pixels[static_cast<size_t>((y * 64 + x) * 4 + k)],
+                        texels[static_cast<size_t>((y * 128 + x) * 4 + k)])
+            << x << "," << y << " channel " << k;
+      }
+    }
+  }
+}
+
+TEST(Matrix4, ProductIsRowByRowAndMayOverwriteAFactor) {
+  const float translate[16] = {1, 0, 0, 5, 0, 1, 0, 7, 0, 0, 1, 0, 0, 0, 0, 1};
+  const float scale[16] = {2, 0, 0, 0, 0, 3, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1};
+  float product[16];
+  multiplyMatrix4(translate, product, scale);  // scale first: the translation stays
+  const float expected[16] = {2, 0, 0, 5, 0, 3, 0, 7, 0, 0, 1, 0, 0, 0, 0, 1};
+  EXPECT_TRUE(std::equal(product, product + 16, expected));
+
+  float inPlace[16];
+  std::copy(scale, scale + 16, inPlace);
+  multiplyMatrix4(inPlace, inPlace, translate);  // translate first: the translation is scaled
+  const float scaled[16] = {2, 0, 0, 10, 0, 3, 0, 21, 0, 0, 1, 0, 0, 0, 0, 1};
+  EXPECT_TRUE(std::equal(inPlace, inPlace + 16, scaled));
+}
+
+}  // namespace
