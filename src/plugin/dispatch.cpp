@@ -1,0 +1,117 @@
+// One switch over the message table. Handlers run synchronously; only the plug-in's two
+// exception types are turned into a result here, and nothing they changed is rolled back.
+#include "plugin/dispatch.h"
+
+#include "controls/key_handling.h"
+#include "controls/overlay_drawing.h"
+#include "controls/pointer_handling.h"
+#include "effect/frame_requests.h"
+#include "effect/instance_record.h"
+#include "effect/layer_picker.h"
+#include "effect/param_change.h"
+#include "effect/param_declaration.h"
+#include "gl/effect_data.h"
+#include "plugin/plugin_exception.h"
+#include "render/frame_render.h"
+#include "render/gl_startup.h"
+
+namespace veltrane {
+namespace {
+
+int32_t unloadPlugin(tagWispAPI* api) {
+  int32_t result = 1;
+  if (api->pluginData) {
+    try {
+      delete static_cast<EffectData*>(api->pluginData);
+    } catch (...) {
+      result = kResultNotHandled;
+    }
+  }
+  api->pluginData = nullptr;
+  return result;
+}
+
+const char* eventParameterId(const tagWispAPI* api) {
+  const auto* event = static_cast<const WispParamEvent*>(api->event);
+  return event ? event->id : nullptr;
+}
+
+uint32_t eventKeyCode(const tagWispAPI* api) {
+  const auto* event = static_cast<const WispKeyEvent*>(api->event);
+  return event ? event->keyCode : 0;
+}
+
+int32_t handle(WispHost* host, tagWispAPI* api, int32_t message) {
+  switch (message) {
+    case kMessageLoad:
+      api->pluginData = static_cast<EffectData*>(new EffectData());
+      return 1;
+    case kMessageUnload:
+      return unloadPlugin(api);
+    case kMessageDeclareParameters:
+      return declareParameters(host, api);
+    case kMessageCreateInstance:
+      createInstance(api);
+      return 1;
+    case kMessageDestroyInstance:
+      destroyInstance(api);
+      return 1;
+    case kMessageParameterChanged:
+      return onParameterChanged(host, api, eventParameterId(api));
+    case kMessagePrepareGl:
+      return prepareGl(host, api);
+    case kMessageRender:
+      return renderFrame(host, api);
+    case kMessageRequestFrames:
+      return requestFrames(host, api);
+    case kMessageParameterReport13:
+    case kMessageParameterReport14:
+    case kMessageAcknowledged1001:
+    case kMessageAcknowledged1002:
+      return 1;
+    case kMessageDrawOverlay:
+      return drawOverlay(host, api);
+    case kMessagePointerMove: {
+      const int32_t pressedPass = onPointerMove(host, api, true);
+      return pressedPass != 0 ? pressedPass : onPointerMove(host, api, false);
+    }
+    case kMessagePointerPress:
+      return onPointerPress(host, api);
+    case kMessagePointerRelease:
+      return onPointerRelease(host, api);
+    case kMessageKeyDown:
+      return onKeyDown(host, api, eventKeyCode(api));
+    case kMessageKeyUp:
+      return onKeyUp(host, api, eventKeyCode(api));
+    case kMessageAcknowledged1009:
+    case kMessageAcknowledged1010:
+    case kMessageAcknowledged1011:
+      return 0;
+    case kMessagePointerOverSelection: {
+      const EffectInstance* instance = instanceOf(api);
+      return instance ? pointerOverSelectedInput(*instance) : 0;
+    }
+    case kMessagePickLayer:
+      return pickLayerForSelectedInput(host, api);
+    case kMessageCopyInstance:
+      copyInstance(api, static_cast<const EffectInstance*>(api->renderContext));
+      return 0;
+    default:
+      return kResultNotHandled;
+  }
+}
+
+}  // namespace
+
+int32_t dispatchMessage(WispHost* host, tagWispAPI* api, int32_t message) {
+  if (!api) return kResultNotHandled;
+  try {
+    return handle(host, api, message);
+  } catch (const PluginException&) {
+    return kResultException;
+  } catch (const Plugin::gl::FXGLSLexception&) {
+    return kResultException;
+  }
+}
+
+}  // namespace veltrane

@@ -1,0 +1,41 @@
+// Fixture: the real module loaded by the reference host, with the plug-in loaded, its
+// parameters declared and one instance created.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <string>
+
+#include "refhost/host.h"
+#include "refhost/module.h"
+
+class LoadedPlugin : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    host_ = std::make_unique<refhost::Host>(module_);
+    ASSERT_EQ(host_->send(0), 1);
+    ASSERT_EQ(host_->send(2), 1);
+    ASSERT_EQ(host_->send(3), 1);
+    host_->clearCallLog();
+  }
+  void TearDown() override {
+    if (host_->api().instanceData) host_->send(4);
+    host_->send(1);
+    host_.reset();
+  }
+
+  refhost::Host& host() { return *host_; }
+
+  // Sends a message whose event names a parameter.
+  int32_t sendParamEvent(int32_t message, const char* id) {
+    WispParamEvent event{id};
+    host_->setEvent(&event);
+    const int32_t result = host_->send(message);
+    host_->setEvent(nullptr);
+    return result;
+  }
+
+  refhost::Module module_{VELTRANE_MODULE_PATH};
+  std::unique_ptr<refhost::Host> host_;
+};
