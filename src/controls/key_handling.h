@@ -1,0 +1,20 @@
+// Keys in the viewer (left Shift arms cut insertion, Escape deselects) and the query whether
+// the pointer is over the selected input's region.
+#pragma once
+
+#include <cstdint>
+
+#include "effect/instance_record.h"
+#include "host/wisp_api.h"
+
+namespace veltrane {
+
+constexpr uint32_t kKeyLeftShift = 65505;
+constexpr uint32_t kKeyEscape = 65307;
+
+int onKeyDown(WispHost* host, tagWispAPI* api, uint32_t keyCode);
+int onKeyUp(WispHost* host, tagWispAPI* api, uint32_t keyCode);
+// 1 when an input is selected, the pointer is over a region and that region shows it.
+int pointerOverSelectedInput(const EffectInstance& instance);
+
+}  // namespace veltrane

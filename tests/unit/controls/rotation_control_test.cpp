@@ -1,0 +1,155 @@
+// Angle handle: where it is hit, which rotate cursor it shows, and continuous dragging.
+#include "controls/rotation_control.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <vector>
+
+#include "support/param_host.h"
+
+namespace {
+
+using plugin_glsl_types::genVec2;
+using veltrane::HandleMode;
+using veltrane::RotationControl;
+
+constexpr float kDegree = 3.1415927f / 180.0f;
+
+// An angle parameter held by the test, in radians.
+struct AngleParam {
+  float radians = 0.0f;
+  std::vector<float> written;
+};
+
+RotationControl controlFor(AngleParam& param, HandleMode mode = HandleMode::OnCircle,
+                           float sizeFactor = 6.0f) {
+  return RotationControl(
+      [&param](WispHost*, tagWispAPI*, float value, int) {
+        param.written.push_back(value);
+        param.radians = value;
+      },
+      [&param](WispHost*, tagWispAPI*, int) { return param.radians; }, 0, mode, sizeFactor);
+}
+
+const genVec2 kCentre{500.0f, 400.0f};
+const genVec2 kUnitScale{1.0f, 1.0f};
+
+// Point at `distance` from the centre in direction `degrees`, nudged `along` the circle.
+genVec2 around(float degrees, float distance, float along = 0.0f) {
+  const float a = degrees * kDegree;
+  return {kCentre.x + distance * std::sin(a) + along * std::cos(a),
+          kCentre.y + distance * std::cos(a) - along * std::sin(a)};
+}
+
+int lastCursor(const testsupport::ParamHost& host) {
+  for (auto call = host.calls().rbegin(); call != host.calls().rend(); ++call) {
+    if (call->rfind("SetCursor(", 0) == 0) return std::stoi(call->substr(10));
+  }
+  return -1;
+}
+
+TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
+  const struct {
+    float degrees;
+    int cursor;
+  } cases[] = {{0, 10},   {20, 10},  {25, 11},  {90, 12},  {135, 13}, {180, 14},  {225, 15},
+               {270, 16}, {315, 17}, {340, 10}, {-90, 16}, {450, 12}, {-675, 11}, {3600 + 240, 15}};
+  for (const auto& c : cases) {
+    testsupport::ParamHost host;
+    host.recordCalls(true);
+    AngleParam param{c.degrees * kDegree, {}};
+    RotationControl control = controlFor(param);
+    EXPECT_TRUE(control.test(host.handle(), host.api(), kCentre, 100.0f, around(c.degrees, 100.0f),
+                             kUnitScale, 1.0f, 0.0f, 0))
+        << c.degrees;
+    EXPECT_EQ(control.hot, 1);
+    EXPECT_EQ(lastCursor(host), c.cursor) << c.degrees;
+  }
+}
+
+TEST(RotationControl, HitAreaFollowsTheHandleModeAndSize) {
+  // At radius 100 and view scale 1 the handle is 12 wide: it reaches 3 across the circle and
+  // 7.2 along it. A handle wider than its circle (radius 4) is never hit and sets no cursor.
+  const struct {
+    HandleMode mode;
+    float radius, uiScale, distance, along;
+    int cursor;  // -1: no cursor call
+  } cases[] = {
+      {HandleMode::OnCircle, 100, 1, 100.0f, 0.0f, 11},
+      {HandleMode::OnCircle, 100, 1, 102.9f, 0, 11},
+      {HandleMode::OnCircle, 100, 1, 103.2f, 0, 0},
+      {HandleMode::OnCircle, 100, 1, 100, 7.0f, 11},
+      {HandleMode::OnCircle, 100, 1, 100, 7.5f, 0},
+      {HandleMode::OnCircle, 100, 1, -100, 0, 0},
+      {HandleMode::Outside, 100, 1, 106, 0, 11},
+      {HandleMode::Outside, 100, 1, 100, 0, 0},
+      {HandleMode::Inside, 100, 1, 94, 0, 11},
+      {HandleMode::Inside, 100, 1, 100, 0, 0},
+      {HandleMode::Inside, 4, 1, 4, 0, -1},
+      {HandleMode::OnCircle, 4, 2.5f, 4, 0, -1},
+  };
+  for (const auto& c : cases) {
+    testsupport::ParamHost host;
+    host.recordCalls(true);
+    AngleParam param{30.0f * kDegree, {}};
+    RotationControl control = controlFor(param, c.mode);
+    const bool hot =
+        control.test(host.handle(), host.api(), kCentre, c.radius,
+                     around(30.0f, c.distance, c.along), kUnitScale, c.uiScale, 0.0f, 0);
+    EXPECT_EQ(hot, c.cursor > 0) << static_cast<int>(c.mode) << " " << c.distance << " " << c.along;
+    EXPECT_EQ(lastCursor(host), c.cursor) << static_cast<int>(c.mode) << " " << c.distance;
+  }
+}
+
+TEST(RotationControl, DragFollowsThePointerThroughSeveralTurns) {
+  // Steps above a quarter turn renew the anchor every time; small ones every few steps.
+  for (const float stepDegrees : {7.0f, -13.0f, 100.0f, -170.0f}) {
+    testsupport::ParamHost host;
+    AngleParam param{0.0f, {}};
+    RotationControl control = controlFor(param);
+    ASSERT_TRUE(control.test(host.handle(), host.api(), kCentre, 100.0f, around(0.0f, 100.0f),
+                             kUnitScale, 1.0f, 1.0f, 0));
+    control.pressed = control.hot;
+
+    const int steps = static_cast<int>(std::ceil(760.0f / std::fabs(stepDegrees)));
+    for (int k = 1; k <= steps; ++k) {
+      control.test(host.handle(), host.api(), kCentre, 100.0f,
+                   around(stepDegrees * static_cast<float>(k), 100.0f), kUnitScale, 1.0f, 1.0f, 0);
+    }
+    ASSERT_EQ(param.written.size(), static_cast<size_t>(steps));
+    float previous = 0.0f;
+    for (const float value : param.written) {
+      EXPECT_NEAR(value - previous, stepDegrees * kDegree, 1e-3f) << stepDegrees;
+      previous = value;
+    }
+    EXPECT_NEAR(param.radians, stepDegrees * static_cast<float>(steps) * kDegree, 1e-2f);
+    EXPECT_EQ(control.hot, 1);
+  }
+}
+
+TEST(RotationControl, PressedHoverSurvivesButtonUpMovesOnlyOnTheStickyHost) {
+  for (const int hostId : {0, 3000}) {
+    testsupport::ParamHost host;
+    host.setHostId(hostId);
+    AngleParam param;
+    RotationControl control = controlFor(param);
+    control.test(host.handle(), host.api(), kCentre, 100.0f, around(0.0f, 100.0f), kUnitScale, 1.0f,
+                 1.0f, 0);
+    control.pressed = control.hot;
+    const float anchor = control.grabPointerAngle;
+
+    host.recordCalls(true);
+    EXPECT_FALSE(control.test(host.handle(), host.api(), kCentre, 100.0f, around(90.0f, 300.0f),
+                              kUnitScale, 1.0f, 0.0f, 0));
+    const bool sticky = hostId == 3000;
+    EXPECT_EQ(control.hot, sticky ? 1 : 0) << hostId;
+    EXPECT_EQ(control.grabPointerAngle == anchor, sticky) << hostId;
+    const auto& calls = host.calls();
+    EXPECT_EQ(std::count(calls.begin(), calls.end(), "Redraw()"), sticky ? 0 : 1) << hostId;
+    EXPECT_TRUE(param.written.empty()) << "a button-up move never drags";
+  }
+}
+
+}  // namespace
