@@ -1,0 +1,153 @@
+// The frame render through the real module: regions show the right inputs, the border has the
+// promised coverage, and every host resource is given back.
+#include <cmath>
+
+#include "render_fixture.h"
+
+namespace {
+
+using refhost::ParamValue;
+
+const Rgba kRed{255, 0, 0, 255};
+const Rgba kGreen{0, 255, 0, 255};
+const Rgba kBlue{0, 0, 255, 255};
+const Rgba kClear{0, 0, 0, 0};
+const std::string kLayerGreen = "22222222-0000-4000-8000-000000000002";
+const std::string kLayerBlue = "33333333-0000-4000-8000-000000000003";
+
+void setLocalCut(refhost::Host& host, int index, float x, float y, float degrees) {
+  host.setValue("cutPosition_" + std::to_string(index), ParamValue::ofPoint(x, y));
+  host.setValue("cutDirection_" + std::to_string(index), ParamValue::ofFloat(degrees));
+}
+
+TEST(FrameRender, OneLocalCutShowsInputOneLeftAndInputZeroRight) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  fixture.addSolidLayer(kLayerGreen, kGreen);
+  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);  // a vertical line through the centre
+  host.setValue("inputLayer1", ParamValue::ofLayer(kLayerGreen));
+  const std::vector<uint8_t> pixels = fixture.render(kRed);
+  for (int y : {2, 18, 33}) {
+    EXPECT_EQ(fixture.pixel(pixels, 5, y), kGreen) << y;
+    EXPECT_EQ(fixture.pixel(pixels, 58, y), kRed) << y;
+  }
+}
+
+TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  fixture.addSolidLayer(kLayerGreen, kGreen);
+  fixture.addSolidLayer(kLayerBlue, kBlue);
+  host.setValue("inputLayer1", ParamValue::ofLayer(kLayerGreen));
+  host.setValue("inputLayer2", ParamValue::ofLayer(kLayerBlue));
+  host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
+
+  // Cut 1 vertical at x = 0 (left half becomes input 1), cut 2 horizontal at y = 0 splitting
+  // the left half (direction +x: its left side, y > 0, becomes input 2).
+  host.setValue("numberOfCuts", ParamValue::ofInt(2));
+  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);
+  setLocalCut(host, 1, -16.0f, 0.0f, 90.0f);
+  std::vector<uint8_t> pixels = fixture.render(kRed);
+  EXPECT_EQ(fixture.pixel(pixels, 8, 30), kBlue);  // left, top
+  EXPECT_EQ(fixture.pixel(pixels, 8, 4), kGreen);  // left, bottom
+  EXPECT_EQ(fixture.pixel(pixels, 50, 30), kRed);  // right half untouched by cut 2
+  EXPECT_EQ(fixture.pixel(pixels, 50, 4), kRed);
+
+  // Radial, four cuts from the centre at 0, 90, 180, 270 degrees: each quadrant is numbered
+  // by the cut at its end in the direction of increasing angle.
+  host.setValue("cutType", ParamValue::ofInt(1));
+  host.setValue("numberOfCuts", ParamValue::ofInt(4));
+  for (int i = 0; i < 4; ++i) setLocalCut(host, i, 0.0f, 0.0f, 90.0f * static_cast<float>(i));
+  fixture.addSolidLayer("44444444-0000-4000-8000-000000000004", {255, 255, 0, 255});
+  host.setValue("inputLayer3", ParamValue::ofLayer("44444444-0000-4000-8000-000000000004"));
+  host.setValue("inputLayer4", ParamValue::ofLayer(kLayerGreen));
+  host.setValue("inputLayer1", ParamValue::ofLayer(kLayerBlue));
+  host.setValue("inputLayer2", ParamValue::ofLayer(refhost::kNoLayer));
+  pixels = fixture.render(kRed);
+  EXPECT_EQ(fixture.pixel(pixels, 50, 30), kRed);                     // +x +y: input 2, own source
+  EXPECT_EQ(fixture.pixel(pixels, 50, 4), (Rgba{255, 255, 0, 255}));  // +x -y: input 3
+  EXPECT_EQ(fixture.pixel(pixels, 8, 4), kGreen);                     // -x -y: input 4
+  EXPECT_EQ(fixture.pixel(pixels, 8, 30), kBlue);                     // -x +y: input 1
+}
+
+// Coverage a = clamp(h - d + 0.5, 0, 1) x clamp(h, 0, 1) of the border colour over the
+// picture, d the distance of the pixel centre to the cut.
+TEST(FrameRender, BorderCoverageFollowsTheDistanceToTheCut) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  setLocalCut(host, 0, 0.5f, 0.0f, 0.0f);  // x = 0.5: pixel centres at integer distances + 0.5
+  host.setValue("borderWidth", ParamValue::ofFloat(6.0f));  // h = 3
+  host.setValue("borderColor", ParamValue::ofColor(1.0f, 1.0f, 1.0f));
+  const std::vector<uint8_t> pixels = fixture.render({0, 0, 0, 255});
+  for (int column = 26; column < 40; ++column) {
+    const float centre = static_cast<float>(column) + 0.5f - 32.0f;
+    const float distance = std::fabs(centre - 0.5f);
+    const float coverage = std::fmin(std::fmax(3.0f - distance + 0.5f, 0.0f), 1.0f);
+    const int red = fixture.pixel(pixels, column, 18)[0];
+    EXPECT_NEAR(red, coverage * 255.0f, 2.0f) << "column " << column << " distance " << distance;
+  }
+}
+
+TEST(FrameRender, ViewCutRegionsTintsARampOfGreys) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  host.setValue("viewCutRegions", ParamValue::ofInt(1));
+  host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
+  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);
+  const std::vector<uint8_t> pixels = fixture.render({255, 255, 255, 255});
+  // Region 0 (right) is drawn first at 1/2, region 1 (left) at 2/2.
+  EXPECT_NEAR(fixture.pixel(pixels, 50, 18)[0], 128, 1);
+  EXPECT_EQ(fixture.pixel(pixels, 8, 18)[0], 255);
+}
+
+TEST(FrameRender, ShiftedInputsShowTheirFrameOrTransparentBlack) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
+  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);
+  const refhost::FrameSource counter = [](int32_t frame, int32_t width, int32_t height) {
+    return solidSource({static_cast<uint8_t>(frame), 0, 0, 255})(frame, width, height);
+  };
+  host.setValue("inputFrameShift1", ParamValue::ofInt(-3));
+  std::vector<uint8_t> pixels = fixture.render(kRed, 10, counter);
+  EXPECT_EQ(fixture.pixel(pixels, 8, 18), (Rgba{7, 0, 0, 255}));    // frame 10 - 3
+  EXPECT_EQ(fixture.pixel(pixels, 50, 18), (Rgba{10, 0, 0, 255}));  // the source itself
+
+  host.setValue("inputFrameShift1", ParamValue::ofInt(-12));  // frame -2: out of range
+  pixels = fixture.render(kRed, 10, counter);
+  EXPECT_EQ(fixture.pixel(pixels, 8, 18), kClear);
+  EXPECT_EQ(fixture.pixel(pixels, 50, 18), (Rgba{10, 0, 0, 255}));
+}
+
+TEST(FrameRender, InputPlacementMovesAndScalesThePicture) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
+  setLocalCut(host, 0, -31.0f, 0.0f, 0.0f);  // nearly the whole frame is input 0
+  host.setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
+  host.setValue("inputFrameTranslation0", ParamValue::ofPoint(16.0f, 0.0f));
+  const std::vector<uint8_t> pixels = fixture.render(kRed);
+  // Half size (32 x 18), centred 16 px right of the frame centre: x from 32 to 64, y from 9
+  // to 27 in corner pixels.
+  for (const auto& [x, y] : {std::pair{33, 10}, {62, 26}, {48, 18}})
+    EXPECT_EQ(fixture.pixel(pixels, x, y), kRed) << x << "," << y;
+  for (const auto& [x, y] : {std::pair{30, 18}, {12, 18}, {48, 7}, {48, 29}})
+    EXPECT_EQ(fixture.pixel(pixels, x, y), kClear) << x << "," << y;
+}
+
+TEST(FrameRender, CoreAndCompatibilityProfilesDrawTheSameImage) {
+  auto renderWith = [](refhost::GlProfile profile) {
+    RenderFixture fixture(profile);
+    refhost::Host& host = fixture.host();
+    host.setValue("numberOfCuts", ParamValue::ofInt(3));
+    setLocalCut(host, 0, 3.0f, -2.0f, 20.0f);
+    setLocalCut(host, 1, -10.0f, 5.0f, 100.0f);
+    setLocalCut(host, 2, 12.0f, 8.0f, -60.0f);
+    host.setValue("borderWidth", ParamValue::ofFloat(5.0f));
+    host.setValue("borderColor", ParamValue::ofColor(0.2f, 0.9f, 0.4f));
+    return fixture.render({200, 30, 90, 255});
+  };
+  EXPECT_EQ(renderWith(refhost::GlProfile::Core), renderWith(refhost::GlProfile::Compatibility));
+}
+
+}  // namespace

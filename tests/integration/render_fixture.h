@@ -1,0 +1,143 @@
+// Fixture for render tests: the real module with a GL context, a small frame, solid-colour
+// inputs and a render context filled the way the host fills it for message 10.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <array>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "refhost/host.h"
+#include "refhost/module.h"
+
+using Rgba = std::array<uint8_t, 4>;
+
+inline refhost::FrameSource solidSource(Rgba colour) {
+  return [colour](int32_t, int32_t width, int32_t height) {
+    std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+    for (size_t i = 0; i < pixels.size(); i += 4)
+      for (size_t c = 0; c < 4; ++c) pixels[i + c] = colour[c];
+    return pixels;
+  };
+}
+
+class RenderFixture {
+ public:
+  static constexpr int32_t kWidth = 64;
+  static constexpr int32_t kHeight = 36;
+  static constexpr const char* kOwnLayer = "0000000a-0000-4000-8000-00000000000a";
+
+  explicit RenderFixture(refhost::GlProfile profile = refhost::GlProfile::Core,
+                         int32_t width = kWidth, int32_t height = kHeight)
+      : width_(width), height_(height) {
+    host_ = std::make_unique<refhost::Host>(module_);
+    host_->attachGl(profile);
+    host_->setTimeInfo(width, height, 25.0);
+    refhost::Layer own;
+    own.guid = kOwnLayer;
+    own.name = "Effect layer";
+    own.width = width;
+    own.height = height;
+    own.frameCount = 100;
+    host_->addLayer(own);
+    EXPECT_EQ(host_->send(0), 1);
+    EXPECT_EQ(host_->send(2), 1);
+    EXPECT_EQ(host_->send(3), 1);
+    EXPECT_EQ(host_->send(8), 1);
+  }
+
+  ~RenderFixture() {
+    host_->send(4);
+    host_->send(1);
+    host_.reset();
+  }
+
+  refhost::Host& host() { return *host_; }
+
+  // Adds a layer the size of the frame, placed like the effect's own layer.
+  void addSolidLayer(const std::string& guid, Rgba colour, int32_t firstFrame = 0,
+                     int32_t frameCount = 100) {
+    refhost::Layer layer;
+    layer.guid = guid;
+    layer.name = guid.substr(0, 8);
+    layer.width = width_;
+    layer.height = height_;
+    layer.firstFrame = firstFrame;
+    layer.frameCount = frameCount;
+    layer.source = solidSource(colour);
+    host_->addLayer(layer);
+  }
+
+  // Renders frame `frame` with a source of the given colour (or the source callback) and
+  // returns the output's RGBA8 pixels, rows from the bottom. Checks resource balance and GL
+  // errors after the message.
+  std::vector<uint8_t> render(Rgba sourceColour, int32_t frame = 10,
+                              const refhost::FrameSource& sourceFrames = {}) {
+    const refhost::FrameSource source = sourceFrames ? sourceFrames : solidSource(sourceColour);
+    host_->setSourceFrames(source);
+    const std::vector<uint8_t> sourcePixels = source(frame, width_, height_);
+    WispRenderContext context{};
+    context.source = host_->createTexture(width_, height_, sourcePixels.data());
+    context.output = host_->createTexture(width_, height_);
+    context.second = context.output;
+    context.width = width_;
+    context.height = height_;
+    context.time = frame;
+    context.frameNumber = static_cast<uint32_t>(frame);
+    context.sourceFrameIndex = frame;
+    context.sourceFrameCount = 100;
+    context.pixelAspect = 1.0f;
+    const float projection[16] = {2.0f / static_cast<float>(width_),
+                                  0,
+                                  0,
+                                  0,
+                                  0,
+                                  2.0f / static_cast<float>(height_),
+                                  0,
+                                  0,
+                                  0,
+                                  0,
+                                  -1,
+                                  0,
+                                  -1,
+                                  -1,
+                                  0,
+                                  1};
+    std::copy(std::begin(projection), std::end(projection), context.projection);
+    for (int i = 0; i < 4; ++i) context.modelView[i * 5] = 1.0f;
+    context.ownLayerGuid = kOwnLayer;
+    for (int i = 0; i < 4; ++i) context.view.lens[i * 5] = context.view.view[i * 5] = 1.0f;
+    context.currentTimeMs = frame * 40;
+    context.layerTimeMs = frame * 40;
+    host_->setRenderContext(&context);
+    EXPECT_EQ(host_->send(12), 1);
+    EXPECT_EQ(host_->send(10), 1);
+    host_->setRenderContext(nullptr);
+    std::vector<uint8_t> pixels = host_->readTexture(context.output.id, width_, height_);
+    host_->deleteTexture(context.source.id);
+    host_->deleteTexture(context.output.id);
+    EXPECT_EQ(host_->outstandingTextures(), 0);
+    EXPECT_EQ(host_->outstandingBuffers(), 0);
+    EXPECT_TRUE(host_->gl()->errors().empty())
+        << host_->gl()->errors().size() << " GL errors, first: " << host_->gl()->errors()[0].text;
+    return pixels;
+  }
+
+  // Pixel at corner-space pixel column x, row y (row 0 at the bottom).
+  Rgba pixel(const std::vector<uint8_t>& pixels, int x, int y) const {
+    const size_t at =
+        (static_cast<size_t>(y) * static_cast<size_t>(width_) + static_cast<size_t>(x)) * 4;
+    return {pixels[at], pixels[at + 1], pixels[at + 2], pixels[at + 3]};
+  }
+
+  int32_t width() const { return width_; }
+  int32_t height() const { return height_; }
+
+ private:
+  refhost::Module module_{VELTRANE_MODULE_PATH};
+  int32_t width_;
+  int32_t height_;
+  std::unique_ptr<refhost::Host> host_;
+};
