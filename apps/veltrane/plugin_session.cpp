@@ -1,0 +1,87 @@
+// Message sending with the checks every subcommand relies on.
+#include "plugin_session.h"
+
+#include <cstdio>
+#include <stdexcept>
+
+namespace veltrane_cli {
+namespace {
+
+std::string expectedText(std::initializer_list<int32_t> expected) {
+  std::string text;
+  for (int32_t value : expected) text += (text.empty() ? "" : " or ") + std::to_string(value);
+  return text;
+}
+
+}  // namespace
+
+PluginSession::PluginSession(const std::string& modulePath, refhost::GlProfile profile)
+    : module_(modulePath), host_(std::make_unique<refhost::Host>(module_)) {
+  host_->attachGl(profile);
+}
+
+PluginSession::~PluginSession() {
+  try {
+    if (instance_) host_->send(4);
+    if (loaded_) host_->send(1);
+  } catch (...) {
+    // Already on a failure path; the first error is the one worth reporting.
+  }
+  host_.reset();
+}
+
+int32_t PluginSession::send(int32_t message, std::initializer_list<int32_t> expected) {
+  refhost::GlContext* gl = host_->gl();
+  if (gl) gl->clearErrors();
+  int32_t result = host_->send(message);
+  reportHostProblems();
+  // Nothing here reads the call log; a long render would only pile it up.
+  host_->clearCallLog();
+  std::string what = "message " + std::to_string(message);
+  bool accepted = expected.size() == 0;
+  for (int32_t value : expected) accepted = accepted || value == result;
+  if (!accepted)
+    throw std::runtime_error(what + " answered " + std::to_string(result) + ", expected " +
+                             expectedText(expected));
+  if (host_->outstandingTextures() > 0 || host_->outstandingBuffers() > 0)
+    throw std::runtime_error(what + " left " + std::to_string(host_->outstandingTextures()) +
+                             " texture(s) and " + std::to_string(host_->outstandingBuffers()) +
+                             " buffer(s) with the plug-in that it did not give back");
+  if (gl && !gl->errors().empty())
+    throw std::runtime_error(what + " caused " + std::to_string(gl->errors().size()) +
+                             " GL error(s), the first: " + gl->errors().front().text);
+  return result;
+}
+
+void PluginSession::reportHostProblems() {
+  for (const std::string& problem : host_->problems()) {
+    if (reportedProblems_.insert(problem).second)
+      std::fprintf(stderr, "veltrane: host: %s\n", problem.c_str());
+  }
+  host_->clearProblems();
+}
+
+void PluginSession::load() {
+  send(0);
+  loaded_ = true;
+  send(2);
+}
+
+void PluginSession::createInstance() {
+  send(3);
+  instance_ = true;
+  send(8);
+}
+
+void PluginSession::finish() {
+  if (instance_) {
+    instance_ = false;
+    send(4);
+  }
+  if (loaded_) {
+    loaded_ = false;
+    send(1);
+  }
+}
+
+}  // namespace veltrane_cli

@@ -1,0 +1,52 @@
+// The module driven through one reference host with a GL context: every message is checked
+// for its expected answer, for textures and buffers the plug-in kept, and for GL errors.
+#pragma once
+
+#include <cstdint>
+#include <initializer_list>
+#include <memory>
+#include <set>
+#include <string>
+
+#include "refhost/host.h"
+#include "refhost/module.h"
+
+namespace veltrane_cli {
+
+class PluginSession {
+ public:
+  // Loads the module and creates the host's GL context. Throws std::runtime_error naming the
+  // module or the GL step that failed.
+  PluginSession(const std::string& modulePath, refhost::GlProfile profile);
+  // Destroys a live instance and unloads the plug-in (unchecked) when finish() was not reached.
+  ~PluginSession();
+  PluginSession(const PluginSession&) = delete;
+  PluginSession& operator=(const PluginSession&) = delete;
+
+  refhost::Host& host() { return *host_; }
+  const std::string& modulePath() const { return module_.path(); }
+
+  // Sends the message and checks afterwards that it answered one of `expected` (any answer
+  // when empty), that no texture or buffer handed to the plug-in is outstanding and that GL
+  // recorded no error. Throws std::runtime_error saying which message broke which rule. The
+  // host's own complaints about the plug-in's calls are printed to stderr once each.
+  int32_t send(int32_t message, std::initializer_list<int32_t> expected = {1});
+
+  // 0 (load) and 2 (declare the parameters).
+  void load();
+  // 3 (create an instance) and 8 (GL start-up).
+  void createInstance();
+  // 4 (destroy the instance) and 1 (unload).
+  void finish();
+
+ private:
+  void reportHostProblems();
+
+  refhost::Module module_;
+  std::unique_ptr<refhost::Host> host_;
+  bool loaded_ = false;
+  bool instance_ = false;
+  std::set<std::string> reportedProblems_;
+};
+
+}  // namespace veltrane_cli
