@@ -1,0 +1,84 @@
+// Spawning the command line with redirected output, and scratch directories.
+#include "cli_runner.h"
+
+#include <fcntl.h>
+#include <spawn.h>
+#include <stdlib.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+extern char** environ;
+
+std::string slurp(const std::string& path) {
+  std::ifstream file(path);
+  std::stringstream text;
+  text << file.rdbuf();
+  return text.str();
+}
+
+void writeText(const std::string& path, const std::string& text) {
+  std::ofstream file(path);
+  file << text;
+}
+
+CliRun runCli(const std::vector<std::string>& args, const char* plugin) {
+  char outPath[] = "/tmp/veltrane_cli_out_XXXXXX";
+  char errPath[] = "/tmp/veltrane_cli_err_XXXXXX";
+  close(mkstemp(outPath));
+  close(mkstemp(errPath));
+  posix_spawn_file_actions_t actions;
+  posix_spawn_file_actions_init(&actions);
+  posix_spawn_file_actions_addopen(&actions, 1, outPath, O_WRONLY | O_TRUNC, 0);
+  posix_spawn_file_actions_addopen(&actions, 2, errPath, O_WRONLY | O_TRUNC, 0);
+
+  std::vector<std::string> environment;
+  for (char** entry = environ; *entry; ++entry) {
+    if (std::string(*entry).rfind("VELTRANE_PLUGIN=", 0) != 0) environment.push_back(*entry);
+  }
+  if (plugin) environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
+  std::vector<char*> envp;
+  for (std::string& entry : environment) envp.push_back(entry.data());
+  envp.push_back(nullptr);
+  std::vector<std::string> argStorage{VELTRANE_CLI_PATH};
+  argStorage.insert(argStorage.end(), args.begin(), args.end());
+  std::vector<char*> argv;
+  for (std::string& arg : argStorage) argv.push_back(arg.data());
+  argv.push_back(nullptr);
+
+  CliRun run;
+  pid_t pid = 0;
+  if (posix_spawn(&pid, VELTRANE_CLI_PATH, &actions, nullptr, argv.data(), envp.data()) == 0) {
+    int status = 0;
+    waitpid(pid, &status, 0);
+    run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  }
+  posix_spawn_file_actions_destroy(&actions);
+  run.out = slurp(outPath);
+  run.err = slurp(errPath);
+  unlink(outPath);
+  unlink(errPath);
+  return run;
+}
+
+ScratchDirectory::ScratchDirectory() {
+  char pattern[] = "/tmp/veltrane_test_XXXXXX";
+  path_ = mkdtemp(pattern);
+}
+
+ScratchDirectory::~ScratchDirectory() {
+  std::error_code ignored;
+  std::filesystem::remove_all(path_, ignored);
+}
+
+std::vector<std::string> ScratchDirectory::entries() const {
+  std::vector<std::string> names;
+  for (const auto& entry : std::filesystem::directory_iterator(path_))
+    names.push_back(entry.path().filename().string());
+  std::sort(names.begin(), names.end());
+  return names;
+}

@@ -1,0 +1,154 @@
+// `veltrane interact` end to end through the real module: a scripted drag moves a cut in one
+// undo step, the layer menu assigns the picked layer, and bad scripts name the field.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <nlohmann/json.hpp>
+
+#include "cli_runner.h"
+#include "refhost/image_files.h"
+
+namespace {
+
+using nlohmann::json;
+
+const char kLayerA[] = "aaaaaaaa-0000-4000-8000-000000000001";
+
+// 320x180; the default single Local cut runs through the centre at 225 degrees, i.e. along the
+// diagonal through corner-space points (160, 90) and (190, 120).
+const char kScene[] = R"({
+  "width": 320, "height": 180, "fps": 25, "duration": 10,
+  "source": {"pattern": "checker"},
+  "layers": [{"guid": "aaaaaaaa-0000-4000-8000-000000000001", "name": "A",
+              "source": {"pattern": "bars"}}],
+  "params": {"borderWidth": 4, "borderColor": [1, 0.5, 0]}
+})";
+
+struct Interaction {
+  CliRun run;
+  json result;
+};
+
+Interaction interact(const ScratchDirectory& folder, const json& events,
+                     const std::vector<std::string>& more = {}) {
+  writeText(folder.file("scene.json"), kScene);
+  writeText(folder.file("events.json"), events.dump());
+  std::vector<std::string> args{
+      "interact", folder.file("scene.json"),  "--events", folder.file("events.json"),
+      "-o",       folder.file("result.json"), "--plugin", VELTRANE_MODULE_PATH};
+  args.insert(args.end(), more.begin(), more.end());
+  Interaction interaction{runCli(args), json()};
+  if (interaction.run.status == 0)
+    interaction.result = json::parse(slurp(folder.file("result.json")));
+  return interaction;
+}
+
+json message(int number, int result) { return {{"message", number}, {"result", result}}; }
+
+TEST(InteractCommand, DraggingACutLineMovesItInOneUndoStep) {
+  const json drag = json::array({{{"move", {190, 120}}},
+                                 {{"press", {190, 120}}},
+                                 {{"move", {200, 110}}},
+                                 {{"move", {210, 100}}},
+                                 {{"release", {210, 100}}}});
+  ScratchDirectory folder;
+  Interaction done = interact(folder, {{"events", drag}}, {"--overlay", folder.file("overlay")});
+  ASSERT_EQ(done.run.status, 0) << done.run.err;
+  const json& result = done.result;
+  // Pressed on the line, the position jumps to the pressed point and follows the pointer:
+  // it ends under the release point, (210, 100) - (160, 90) in frame space.
+  EXPECT_NEAR(result["params"]["cutPosition_0"][0].get<double>(), 50.0, 0.5);
+  EXPECT_NEAR(result["params"]["cutPosition_0"][1].get<double>(), 10.0, 0.5);
+  EXPECT_EQ(result["params"]["cutDirection_0"], 225);
+  EXPECT_EQ(result["undoSteps"], json::array({"Split Screen Cut 1 Position"}));
+  EXPECT_EQ(result["cursors"].size(), 5u);
+  EXPECT_EQ(result["results"][1][0], message(1005, 1));
+  EXPECT_EQ(result["results"][2], json::array({message(1004, 1), message(7, 1)}));
+  EXPECT_EQ(result["results"][4][0], message(1006, 1));
+
+  // One picture per event, the last showing the cut where it was dragged.
+  std::vector<std::string> pictures;
+  for (int i = 0; i < 5; ++i) pictures.push_back("event_000" + std::to_string(i) + ".png");
+  EXPECT_EQ(folder.entries(),
+            (std::vector<std::string>{"events.json", "overlay", "result.json", "scene.json"}));
+  std::vector<std::string> written;
+  for (const auto& entry : std::filesystem::directory_iterator(folder.file("overlay")))
+    written.push_back(entry.path().filename().string());
+  std::sort(written.begin(), written.end());
+  EXPECT_EQ(written, pictures);
+  refhost::RgbaImage first = refhost::readImageFile(folder.file("overlay/" + pictures.front()));
+  refhost::RgbaImage last = refhost::readImageFile(folder.file("overlay/" + pictures.back()));
+  EXPECT_EQ(first.width, 320);
+  EXPECT_NE(first.pixels, last.pixels);
+
+  // Undone, the cut is back and the host reports the change; redo is offered.
+  json undone = drag;
+  undone.push_back({{"undo", 1}});
+  ScratchDirectory again;
+  Interaction back = interact(again, {{"events", undone}});
+  ASSERT_EQ(back.run.status, 0) << back.run.err;
+  EXPECT_EQ(back.result["params"]["cutPosition_0"], json::array({0, 0}));
+  EXPECT_EQ(back.result["undoSteps"], json::array());
+  EXPECT_EQ(back.result["redoSteps"], json::array({"Split Screen Cut 1 Position"}));
+  EXPECT_EQ(back.result["results"][5], json::array({message(7, 1)}));
+}
+
+TEST(InteractCommand, LayerMenuAssignsThePickedLayerToTheSelectedInput) {
+  const json events = json::array({{{"press", {40, 150}}},
+                                   {{"release", {40, 150}}},
+                                   {{"pick", 1}},
+                                   {{"layerMenu", true}},
+                                   {{"keyDown", "Escape"}},
+                                   {{"keyUp", "Escape"}},
+                                   {{"layerMenu", true}}});
+  ScratchDirectory folder;
+  Interaction done = interact(folder, {{"events", events}});
+  ASSERT_EQ(done.run.status, 0) << done.run.err;
+  const json& result = done.result;
+  // The own layer comes first, so item 1 is layer A; it lands on the pressed region's input.
+  EXPECT_EQ(result["popupMenus"], json::array({"Split Screen|A"}));
+  const std::string moved = result["undoSteps"].at(0).get<std::string>();
+  ASSERT_EQ(moved.rfind("Moved Split Screen Input ", 0), 0u) << moved;
+  const std::string input = moved.substr(moved.size() - 1);
+  for (int j = 0; j < 9; ++j) {
+    std::string id = "inputLayer" + std::to_string(j);
+    EXPECT_EQ(result["params"][id],
+              std::to_string(j) == input ? kLayerA : "00000000-0000-0000-0000-000000000000")
+        << id;
+  }
+  EXPECT_EQ(result["results"][2], json::array());  // a pick sends nothing
+  EXPECT_EQ(result["results"][3][0], message(1012, 1));
+  EXPECT_EQ(result["results"][3][1], message(1013, 1));
+  EXPECT_EQ(result["results"][4], json::array({message(1007, 1)}));
+  EXPECT_EQ(result["results"][5], json::array({message(1008, 1)}));
+  // Escape deselected the input: the host no longer offers the menu.
+  EXPECT_EQ(result["results"][6], json::array({message(1012, 0)}));
+}
+
+TEST(InteractCommand, BadScriptsNameTheField) {
+  struct Case {
+    json script;
+    std::string expected;
+  };
+  const Case cases[] = {
+      {{{"events", {{{"poke", {1, 2}}}}}}, "events[0]: expected one event"},
+      {{{"events", {{{"press", {1.5, 3}}}}}}, "events[0].press[0]: expected a whole number"},
+      {{{"events", {{{"keyDown", "Ctrl"}}}}},
+       "events[0].keyDown: expected \"Shift\", \"Escape\" or a key number"},
+      {{{"viewScale", {1}}, {"events", json::array()}}, "viewScale: expected [sx, sy]"},
+      {{{"view", 1}, {"events", json::array()}}, "view: expected no such field"},
+  };
+  for (const Case& c : cases) {
+    ScratchDirectory folder;
+    Interaction done = interact(folder, c.script);
+    EXPECT_EQ(done.run.status, 1) << c.expected;
+    EXPECT_EQ(done.run.err.rfind(
+                  "veltrane interact: " + folder.file("events.json") + ": " + c.expected, 0),
+              0u)
+        << done.run.err;
+    EXPECT_EQ(folder.entries(), (std::vector<std::string>{"events.json", "scene.json"}));
+  }
+}
+
+}  // namespace
