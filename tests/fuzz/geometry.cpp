@@ -8,15 +8,11 @@
 #include <vector>
 
 #include "effect/param_ids.h"
+#include "geometry/cut_model.h"
+#include "geometry/cut_segments.h"
+#include "geometry/input_transform.h"
+#include "geometry/region_partition.h"
 #include "support/param_host.h"
-
-// The geometry is compiled into this target rather than taken from the plug-in library, so that
-// the fuzzer's coverage instrumentation sees its branches.
-#include "geometry/angles.cpp"
-#include "geometry/cut_model.cpp"
-#include "geometry/cut_segments.cpp"
-#include "geometry/input_transform.cpp"
-#include "geometry/region_partition.cpp"
 
 namespace {
 
