@@ -1,0 +1,113 @@
+// Which picture each input shows and who gives its texture back: the own source borrowed,
+// shifted source frames and layer frames owned, transparent black where nothing can be had.
+#include "render_fixture.h"
+
+namespace {
+
+using refhost::ParamValue;
+
+const Rgba kRed{255, 0, 0, 255};
+const Rgba kGreen{0, 255, 0, 255};
+const Rgba kClear{0, 0, 0, 0};
+const std::string kLayer = "22222222-0000-4000-8000-000000000002";
+
+// One vertical cut through the centre: input 1 on the left, input 0 on the right.
+void splitDownTheMiddle(refhost::Host& host) {
+  host.setValue("cutPosition_0", ParamValue::ofPoint(0.0f, 0.0f));
+  host.setValue("cutDirection_0", ParamValue::ofFloat(0.0f));
+  host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
+}
+
+size_t calls(refhost::Host& host, const char* operation) { return host.callsTo(operation).size(); }
+
+TEST(InputCapture, OwnSourceIsBorrowedAndFetchedFramesAreGivenBack) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  splitDownTheMiddle(host);
+  host.clearCallLog();
+  fixture.render(kRed);
+  // Only the two render targets are allocated and released; the source is never fetched.
+  EXPECT_EQ(calls(host, "AllocateTexture"), 2u);
+  EXPECT_EQ(calls(host, "ReleaseTexture"), 2u);
+  EXPECT_EQ(calls(host, "GetSourceFrame"), 0u);
+
+  host.setValue("inputFrameShift1", ParamValue::ofInt(2));
+  host.clearCallLog();
+  fixture.render(kRed);
+  EXPECT_EQ(calls(host, "GetSourceFrame"), 1u);
+  EXPECT_EQ(calls(host, "ReleaseTexture"), 3u);  // the shifted frame went back too
+  EXPECT_EQ(host.outstandingFrames(), 0);
+}
+
+TEST(InputCapture, UndeliverableLayersFallBackAsTheHostAllows) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  splitDownTheMiddle(host);
+  fixture.addSolidLayer(kLayer, kGreen);
+
+  const struct {
+    const char* name;
+    std::string guid;
+    bool refuseFrames;
+    Rgba left;
+  } table[] = {
+      {"delivered", kLayer, false, kGreen},
+      {"unknown layer: the own source", "99999999-0000-4000-8000-000000000009", false, kRed},
+      {"refused frame: transparent", kLayer, true, kClear},
+  };
+  for (const auto& row : table) {
+    SCOPED_TRACE(row.name);
+    host.setValue("inputLayer1", ParamValue::ofLayer(row.guid));
+    host.setRefuseLayerFrames(row.refuseFrames);
+    const std::vector<uint8_t> pixels = fixture.render(kRed);
+    EXPECT_EQ(fixture.pixel(pixels, 8, 18), row.left);
+    EXPECT_EQ(fixture.pixel(pixels, 56, 18), kRed);
+  }
+}
+
+TEST(InputCapture, LayerFramesOutsideTheLayerAreTransparent) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  splitDownTheMiddle(host);
+  fixture.addSolidLayer(kLayer, kGreen, /*firstFrame=*/12, /*frameCount=*/5);
+  host.setValue("inputLayer1", ParamValue::ofLayer(kLayer));
+  const struct {
+    int32_t frame;
+    int32_t shift;
+    Rgba left;
+  } table[] = {{10, 0, kClear}, {12, 0, kGreen}, {10, 2, kGreen},
+               {16, 0, kGreen}, {17, 0, kClear}, {16, 1, kClear}};
+  for (const auto& row : table) {
+    SCOPED_TRACE(std::to_string(row.frame) + " shift " + std::to_string(row.shift));
+    host.setValue("inputFrameShift1", ParamValue::ofInt(row.shift));
+    const std::vector<uint8_t> pixels = fixture.render(kRed, row.frame);
+    EXPECT_EQ(fixture.pixel(pixels, 8, 18), row.left);
+  }
+}
+
+TEST(InputCapture, LayersAreAlignedOnlyWhenTheirPlacementDiffers) {
+  RenderFixture fixture;
+  refhost::Host& host = fixture.host();
+  splitDownTheMiddle(host);
+  fixture.addSolidLayer(kLayer, kGreen);
+  host.setValue("inputLayer1", ParamValue::ofLayer(kLayer));
+
+  host.clearCallLog();
+  fixture.render(kRed);
+  EXPECT_EQ(calls(host, "AllocateTexture"), 2u);  // same size and placement: used as it is
+
+  // Half the size of the frame, both placed at the composition's origin: the layer is
+  // re-rendered into a texture of the output's size, covering its lower-left quarter.
+  host.layers().back().width = RenderFixture::kWidth / 2;
+  host.layers().back().height = RenderFixture::kHeight / 2;
+  host.clearCallLog();
+  const std::vector<uint8_t> pixels = fixture.render(kRed);
+  EXPECT_EQ(calls(host, "AllocateTexture"), 3u);
+  EXPECT_EQ(calls(host, "ReleaseTexture"), 4u);  // both targets, the aligned copy, the frame
+  EXPECT_EQ(fixture.pixel(pixels, 8, 4), kGreen);
+  EXPECT_EQ(fixture.pixel(pixels, 28, 15), kGreen);
+  EXPECT_EQ(fixture.pixel(pixels, 8, 30), kClear);  // above it, still in input 1's region
+  EXPECT_EQ(fixture.pixel(pixels, 56, 30), kRed);
+}
+
+}  // namespace
