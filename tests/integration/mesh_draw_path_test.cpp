@@ -1,0 +1,59 @@
+// Whether the border meshes are drawn with primitive restart (one indexed draw per mesh) or run
+// by run depends on the extension list and on the graphics chip; both give the same image.
+#include "refhost/gl_overrides.h"
+#include "render_fixture.h"
+
+namespace {
+
+using refhost::ParamValue;
+
+// Element buffers acquired during one render: one per mesh with restart, one per strip or fan
+// without. One cut has one strip and two cap fans.
+size_t elementBuffers(refhost::Host& host) {
+  size_t count = 0;
+  for (const std::string& line : host.callsTo("AcquireBuffer"))
+    if (line.find(" 0x8893 ") != std::string::npos) ++count;
+  return count;
+}
+
+TEST(MeshDrawPath, RestartFollowsTheExtensionListAndTheChip) {
+  const struct {
+    const char* name;
+    refhost::GlProfile profile;
+    refhost::GlOverrides overrides;
+    size_t expectedElementBuffers;
+  } table[] = {
+      {"compatibility profile lists the extension", refhost::GlProfile::Compatibility, {}, 2},
+      {"Intel HD 4000",
+       refhost::GlProfile::Compatibility,
+       {std::string("Intel"), std::string("Intel(R) HD Graphics 4000"), {}},
+       3},
+      {"Intel HD 4600",
+       refhost::GlProfile::Compatibility,
+       {std::string("Intel"), std::string("Intel(R) HD Graphics 4600"), {}},
+       2},
+      {"extension hidden",
+       refhost::GlProfile::Compatibility,
+       {std::nullopt, std::nullopt, {"GL_NV_primitive_restart"}},
+       3},
+      {"core profile lacks the extension", refhost::GlProfile::Core, {}, 3},
+  };
+  std::vector<uint8_t> reference;
+  for (const auto& row : table) {
+    SCOPED_TRACE(row.name);
+    refhost::ScopedGlOverrides overrides(row.overrides);
+    RenderFixture fixture(row.profile);
+    refhost::Host& host = fixture.host();
+    host.setValue("cutPosition_0", ParamValue::ofPoint(3.0f, -4.0f));
+    host.setValue("cutDirection_0", ParamValue::ofFloat(30.0f));
+    host.setValue("borderWidth", ParamValue::ofFloat(5.0f));
+    host.setValue("borderColor", ParamValue::ofColor(1.0f, 1.0f, 1.0f));
+    host.clearCallLog();
+    const std::vector<uint8_t> pixels = fixture.render({20, 40, 60, 255});
+    EXPECT_EQ(elementBuffers(host), row.expectedElementBuffers);
+    if (reference.empty()) reference = pixels;
+    EXPECT_EQ(pixels, reference);
+  }
+}
+
+}  // namespace
