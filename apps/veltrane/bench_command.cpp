@@ -24,6 +24,8 @@ const char kBenchHelp[] =
     "  fetch    the host producing and uploading the frames the plug-in fetched during it\n"
     "  upload   the host preparing the frame's source texture\n"
     "  readback reading the output texture back\n"
+    "(GL may finish earlier drawing inside a fetch's upload, so on a software renderer the\n"
+    "split between render and fetch is approximate; their sum is not.)\n"
     "Input kinds: 'own' shows the effect's own source in every region; 'layers' gives every\n"
     "input a different layer of the composition.\n"
     "\n"
