@@ -1,6 +1,7 @@
 // The overlay through the real module: handles appear where the controls are, nothing is
 // drawn for a named viewer, and resources come back after every message.
 #include "render_fixture.h"
+#include "viewer_events.h"
 
 namespace {
 
@@ -9,39 +10,29 @@ using refhost::ParamValue;
 constexpr int kW = 160;
 constexpr int kH = 90;
 
-class Viewer {
+class Viewer : public ViewerEvents {
  public:
-  explicit Viewer(RenderFixture& fixture) : host_(fixture.host()) {
-    context_.width = kW;
-    context_.height = kH;
-    context_.viewScaleX = context_.viewScaleY = context_.uiScale = 1.0;
-    const float projection[16] = {2.0f / kW, 0, 0,  0, 0,  2.0f / kH, 0, 0,
-                                  0,         0, -1, 0, -1, -1,        0, 1};
-    std::copy(std::begin(projection), std::end(projection), context_.projection);
-    target_ = host_.createTexture(kW, kH);
+  explicit Viewer(RenderFixture& fixture)
+      : ViewerEvents(fixture.host(), kW, kH), host_(fixture.host()) {}
+  ~Viewer() {
+    if (target_.id) host_.deleteTexture(target_.id);
   }
-  ~Viewer() { host_.deleteTexture(target_.id); }
 
   int32_t pointer(int32_t message, int x, int y, double button) {
     WispPointerEvent event{x, y, button};
-    host_.setEvent(&event);
-    host_.setRenderContext(&context_);
-    const int32_t result = host_.send(message);
-    host_.setEvent(nullptr);
-    return result;
+    return send(message, &event);
   }
 
   // Draws the overlay into a cleared viewer image and reads it back (rows from the bottom).
   std::vector<uint8_t> draw(const char* name = nullptr) {
-    context_.name = name;
+    context().name = name;
     // A fresh transparent viewer picture, which the host attaches before the overlay draws.
-    host_.deleteTexture(target_.id);
+    if (target_.id) host_.deleteTexture(target_.id);
     const std::vector<uint8_t> transparent(static_cast<size_t>(kW) * kH * 4, 0);
     target_ = host_.createTexture(kW, kH, transparent.data());
     host_.setDrawTarget(target_.id, kW, kH);
-    host_.setRenderContext(&context_);
-    EXPECT_EQ(host_.send(1003), 1);
-    context_.name = nullptr;
+    EXPECT_EQ(send(1003, nullptr), 1);
+    context().name = nullptr;
     EXPECT_EQ(host_.outstandingTextures(), 0);
     EXPECT_EQ(host_.outstandingBuffers(), 0);
     for (const auto& error : host_.gl()->errors()) ADD_FAILURE() << "GL error: " << error.text;
@@ -63,7 +54,6 @@ class Viewer {
 
  private:
   refhost::Host& host_;
-  WispViewerContext context_{};
   TextureRecord target_{};
 };
 
@@ -113,6 +103,28 @@ TEST(OverlayDrawing, SelectedInputShowsItsRectangleAndMarkers) {
   EXPECT_EQ(Viewer::maxAlpha(image, 60, 35, 70, 40), 0);    // inside, away from every line
   // The pointer rests over a region: the move marker sits just beside it.
   EXPECT_GT(Viewer::maxAlpha(image, 120, 20, 132, 32), 0);
+}
+
+// The first hot handle in draw order takes the one highlight: here the cut's move arrow, drawn
+// before its direction handle, which keeps a stale hot flag from the previous event.
+TEST(OverlayDrawing, AtMostOneHandleIsHighlighted) {
+  RenderFixture fixture(refhost::GlProfile::Core, kW, kH);
+  refhost::Host& host = fixture.host();
+  host.setValue("cutPosition_0", ParamValue::ofPoint(0.0f, 0.0f));
+  host.setValue("cutDirection_0", ParamValue::ofFloat(0.0f));
+  Viewer viewer(fixture);
+  viewer.context().viewScaleX = viewer.context().viewScaleY = 2.0;  // handle circle of 20 px
+  // Full line coverage over its halo: a + (a / 2) x (1 - a) for the colour's alpha a.
+  const int normal = 159, highlight = 215;  // a = 0.5 and a = 0.75
+
+  EXPECT_EQ(viewer.pointer(1004, 100, 45, 0.0), 1);  // on the direction handle only
+  std::vector<uint8_t> image = viewer.draw();
+  EXPECT_NEAR(Viewer::maxAlpha(image, 90, 35, 110, 55), highlight, 2);
+
+  EXPECT_EQ(viewer.pointer(1004, 81, 75, 0.0), 1);  // onto the line, away from the handle
+  image = viewer.draw();
+  EXPECT_NEAR(Viewer::maxAlpha(image, 66, 70, 96, 80), highlight, 2);  // the move arrow
+  EXPECT_NEAR(Viewer::maxAlpha(image, 95, 35, 110, 55), normal, 2);    // no longer highlighted
 }
 
 }  // namespace
