@@ -3,6 +3,7 @@
 // effect's own source. The choice is stored without an undo step of its own.
 #include "effect/layer_picker.h"
 
+#include <algorithm>
 #include <cstring>
 #include <string>
 #include <vector>
@@ -31,9 +32,12 @@ int pickLayerForSelectedInput(WispHost* host, tagWispAPI* api) {
   const int32_t count = api->GetLayerCount(host);
   std::vector<std::string> guids;
   std::vector<std::string> names;
+  // Room for the host's count up front, within reason: a nonsense count must not turn into
+  // one huge allocation before a single layer has been read.
+  constexpr int32_t kReservedLayers = 256;
   if (count > 0) {
-    guids.reserve(static_cast<size_t>(count));
-    names.reserve(static_cast<size_t>(count));
+    guids.reserve(static_cast<size_t>(std::min(count, kReservedLayers)));
+    names.reserve(static_cast<size_t>(std::min(count, kReservedLayers)));
   }
   bool ownLayerSeen = false;
   for (int32_t k = 0; k < count; ++k) {

@@ -130,7 +130,7 @@ int EffectData::addDualTexCoordProgram(const std::string& vertex, const std::str
   return 1;
 }
 
-EffectData::~EffectData() {
+EffectData::~EffectData() noexcept(false) {
   programNames_.clear();
   for (auto it = programs_.rbegin(); it != programs_.rend(); ++it) {
     const GLuint id = (*it)->id;

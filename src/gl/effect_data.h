@@ -56,7 +56,8 @@ class EffectData {
                          const std::string& name, bool useSourceNames, bool withTexCoord);
   virtual int addDualTexCoordProgram(const std::string& vertex, const std::string& fragment,
                                      bool verbose, const std::string& name, bool useSourceNames);
-  virtual ~EffectData();
+  // May throw: the unload message turns a failed destruction into its own result.
+  virtual ~EffectData() noexcept(false);
 
   void bindAttribute(const std::string& name, GLuint location, const std::string& attributeName);
   // GL id of the named program, or -1.

@@ -3,7 +3,11 @@
 #include "plugin/dispatch.h"
 #include "plugin/registration.h"
 
+#ifdef _WIN32
+#define VELTRANE_EXPORT extern "C" __declspec(dllexport)
+#else
 #define VELTRANE_EXPORT extern "C" __attribute__((visibility("default")))
+#endif
 
 VELTRANE_EXPORT void PluginInfo(void*, void*, PluginRegistration* record) {
   veltrane::fillRegistration(record);

@@ -198,9 +198,8 @@ int renderFrame(WispHost* host, tagWispAPI* api) {
   registry.releaseProgram();
 
   releaseRenderTarget(distance);
-  // The clear colour is restored before the composition goes back, as the guard's scope ends
-  // just after this; both orders leave the host the same state.
-  releaseRenderTarget(composition);
+  // Leaving the scope restores the clear colour and then gives the composition back, in that
+  // order, here and on every exit by exception.
   return 1;
 }
 

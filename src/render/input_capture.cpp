@@ -5,6 +5,7 @@
 
 #include <GL/glew.h>
 
+#include <cstdint>
 #include <cstring>
 #include <cwchar>
 #include <string>
@@ -132,16 +133,21 @@ bool captureLayerFrame(WispHost* host, tagWispAPI* api, const WispRenderContext&
     chooseOwnLayer();
   } else {
     const double rate = compositionFrameRate(host, api);
-    const int32_t frame = frameOfTime(currentTimeMs, rate) + frameShift;
-    const int32_t stateTime = frameShift == 0 ? currentTimeMs : timeOfFrame(frame, rate);
+    // In 64 bits: a shift near the i32 limits must not wrap into a frame inside the layer.
+    const int64_t frame = static_cast<int64_t>(frameOfTime(currentTimeMs, rate)) + frameShift;
+    const bool frameRepresentable = frame >= INT32_MIN && frame <= INT32_MAX;
+    const int32_t stateTime = frameShift == 0 || !frameRepresentable
+                                  ? currentTimeMs
+                                  : timeOfFrame(static_cast<int32_t>(frame), rate);
     const int32_t status = getLayerState(host, api, context, guid, stateTime, chosen, true);
     if (status != 0 || !layerTypeIn(chosen.type, kImageLayerTypes)) {
       chooseOwnLayer();
     } else {
-      const int64_t frameInLayer = static_cast<int64_t>(frame) - chosen.firstFrame;
-      const bool inRange = frameInLayer >= 0 && frameInLayer < chosen.frameCount;
+      const int64_t frameInLayer = frame - chosen.firstFrame;
+      const bool inRange =
+          frameRepresentable && frameInLayer >= 0 && frameInLayer < chosen.frameCount;
       TextureRecord fetched{};
-      if ((isDesignatedHost(host, api) || inRange) &&
+      if (frameRepresentable && (isDesignatedHost(host, api) || inRange) &&
           api->RenderLayerFrame(host, api->renderContext, guid, static_cast<int32_t>(frameInLayer),
                                 &fetched) == 0) {
         result = ownedTarget(host, api, fetched);

@@ -11,7 +11,9 @@ namespace veltrane {
 
 // The fixed application identifier of the one host that serves frames outside the source's
 // or layer's range itself (16 UTF-16 code units).
-constexpr const wchar_t* kDesignatedHostIdentifier = L"com.wisp.director";
+constexpr wchar_t kDesignatedHostIdentifier[] = L"com.wisp.directr";
+static_assert(sizeof kDesignatedHostIdentifier / sizeof(wchar_t) == 16 + 1,
+              "the designated host identifier is 16 code units");
 
 // Fills `holder` with input k's picture for the render time, releasing what it owned before.
 // A picture that is the render context's own source texture is borrowed; everything the host

@@ -1,5 +1,7 @@
 // Which picture each input shows and who gives its texture back: the own source borrowed,
 // shifted source frames and layer frames owned, transparent black where nothing can be had.
+#include <climits>
+
 #include "render_fixture.h"
 
 namespace {
@@ -75,8 +77,8 @@ TEST(InputCapture, LayerFramesOutsideTheLayerAreTransparent) {
     int32_t frame;
     int32_t shift;
     Rgba left;
-  } table[] = {{10, 0, kClear}, {12, 0, kGreen}, {10, 2, kGreen},
-               {16, 0, kGreen}, {17, 0, kClear}, {16, 1, kClear}};
+  } table[] = {{10, 0, kClear}, {12, 0, kGreen}, {10, 2, kGreen},         {16, 0, kGreen},
+               {17, 0, kClear}, {16, 1, kClear}, {10, INT32_MAX, kClear}, {10, INT32_MIN, kClear}};
   for (const auto& row : table) {
     SCOPED_TRACE(std::to_string(row.frame) + " shift " + std::to_string(row.shift));
     host.setValue("inputFrameShift1", ParamValue::ofInt(row.shift));
