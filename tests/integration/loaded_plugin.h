@@ -20,6 +20,8 @@ class LoadedPlugin : public ::testing::Test {
     host_->clearCallLog();
   }
   void TearDown() override {
+    // Unknown ids, kind mismatches and stray releases are the plug-in misusing the host.
+    for (const std::string& problem : host_->problems()) ADD_FAILURE() << "host: " << problem;
     if (host_->api().instanceData) host_->send(4);
     host_->send(1);
     host_.reset();

@@ -120,6 +120,8 @@ class RenderFixture {
     host_->deleteTexture(context.output.id);
     EXPECT_EQ(host_->outstandingTextures(), 0);
     EXPECT_EQ(host_->outstandingBuffers(), 0);
+    for (const std::string& problem : host_->problems()) ADD_FAILURE() << "host: " << problem;
+    host_->clearProblems();
     EXPECT_TRUE(host_->gl()->errors().empty())
         << host_->gl()->errors().size() << " GL errors, first: " << host_->gl()->errors()[0].text;
     return pixels;
