@@ -12,6 +12,8 @@
 #include <fstream>
 #include <sstream>
 
+#include "support/temp_paths.h"
+
 extern char** environ;
 
 std::string slurp(const std::string& path) {
@@ -27,10 +29,10 @@ void writeText(const std::string& path, const std::string& text) {
 }
 
 CliRun runCli(const std::vector<std::string>& args, const char* plugin) {
-  char outPath[] = "/tmp/veltrane_cli_out_XXXXXX";
-  char errPath[] = "/tmp/veltrane_cli_err_XXXXXX";
-  close(mkstemp(outPath));
-  close(mkstemp(errPath));
+  const std::string outFile = testsupport::makeTempFile("veltrane_cli_out_");
+  const std::string errFile = testsupport::makeTempFile("veltrane_cli_err_");
+  const char* outPath = outFile.c_str();
+  const char* errPath = errFile.c_str();
   posix_spawn_file_actions_t actions;
   posix_spawn_file_actions_init(&actions);
   posix_spawn_file_actions_addopen(&actions, 1, outPath, O_WRONLY | O_TRUNC, 0);
@@ -65,10 +67,7 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin) {
   return run;
 }
 
-ScratchDirectory::ScratchDirectory() {
-  char pattern[] = "/tmp/veltrane_test_XXXXXX";
-  path_ = mkdtemp(pattern);
-}
+ScratchDirectory::ScratchDirectory() { path_ = testsupport::makeTempDirectory("veltrane_test_"); }
 
 ScratchDirectory::~ScratchDirectory() {
   std::error_code ignored;

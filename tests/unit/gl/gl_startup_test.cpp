@@ -13,6 +13,7 @@
 #include "gl_layer_test.h"
 #include "shaders/control_shaders.h"
 #include "shaders/effect_shaders.h"
+#include "support/temp_paths.h"
 
 namespace {
 
@@ -89,8 +90,7 @@ TEST(ShaderSources, EveryStageIsValidGlsl410ForTheReferenceCompiler) {
       {"cutMarkerFragment", "frag", s::kCutMarkerFragment},
       {"moveMarkerFragment", "frag", s::kMoveMarkerFragment},
   };
-  char directory[] = "/tmp/veltrane_glsl_XXXXXX";
-  ASSERT_NE(mkdtemp(directory), nullptr);
+  const std::string directory = testsupport::makeTempDirectory("veltrane_glsl_");
   for (const auto& source : sources) {
     EXPECT_EQ(source.text.rfind("#version 410\n", 0), 0u) << source.name;
     const std::string path = std::string(directory) + "/" + source.name + "." + source.stage;
@@ -99,7 +99,7 @@ TEST(ShaderSources, EveryStageIsValidGlsl410ForTheReferenceCompiler) {
     EXPECT_EQ(validate(path, &output), 0) << source.name << ":\n" << output << source.text;
     std::remove(path.c_str());
   }
-  rmdir(directory);
+  rmdir(directory.c_str());
 }
 
 }  // namespace

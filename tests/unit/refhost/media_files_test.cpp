@@ -10,16 +10,14 @@
 #include "refhost/image_files.h"
 #include "refhost/media_source.h"
 #include "refhost/video_reader.h"
+#include "support/temp_paths.h"
 
 namespace refhost {
 namespace {
 
 class ScratchFolder {
  public:
-  ScratchFolder() {
-    char pattern[] = "/tmp/refhost_media_XXXXXX";
-    path_ = mkdtemp(pattern);
-  }
+  ScratchFolder() { path_ = testsupport::makeTempDirectory("refhost_media_"); }
   ~ScratchFolder() { std::filesystem::remove_all(path_); }
   std::string file(const std::string& name) const { return path_ + "/" + name; }
   std::vector<std::string> entries() const {
