@@ -58,6 +58,20 @@ int32_t Host::endParamGroup() {
   return 0;
 }
 
+namespace {
+
+// The fields every declaration call carries.
+Param declaredParam(ParamKind kind, const wchar_t* displayName, const char* id, int32_t flags) {
+  Param param;
+  param.kind = kind;
+  param.id = id ? id : "";
+  param.displayName = toUtf8(displayName);
+  param.flags = flags;
+  return param;
+}
+
+}  // namespace
+
 int32_t Host::addFloatParam(const wchar_t* displayName, const wchar_t* unit, const char* id,
                             int32_t flags, float minimum, float maximum, float defaultValue,
                             int32_t precision) {
@@ -65,12 +79,8 @@ int32_t Host::addFloatParam(const wchar_t* displayName, const wchar_t* unit, con
       std::to_string(flags) + " " + formatFloat(minimum) + " " + formatFloat(maximum) + " " +
       formatFloat(defaultValue) + " " + std::to_string(precision));
   if (declarationRefused()) return 1;
-  Param param;
-  param.kind = ParamKind::Float;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
+  Param param = declaredParam(ParamKind::Float, displayName, id, flags);
   param.unit = toUtf8(unit);
-  param.flags = flags;
   param.minimum = minimum;
   param.maximum = maximum;
   param.defaultValue = ParamValue::ofFloat(defaultValue);
@@ -84,12 +94,8 @@ int32_t Host::addIntParam(const wchar_t* displayName, const wchar_t* unit, const
       std::to_string(flags) + " " + std::to_string(minimum) + " " + std::to_string(maximum) + " " +
       std::to_string(defaultValue));
   if (declarationRefused()) return 1;
-  Param param;
-  param.kind = ParamKind::Int;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
+  Param param = declaredParam(ParamKind::Int, displayName, id, flags);
   param.unit = toUtf8(unit);
-  param.flags = flags;
   param.minimum = minimum;
   param.maximum = maximum;
   param.defaultValue = ParamValue::ofInt(defaultValue);
@@ -101,11 +107,7 @@ int32_t Host::addBoolParam(const wchar_t* displayName, const char* id, int32_t f
   log("AddBoolParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) + " " +
       std::to_string(defaultValue));
   if (declarationRefused()) return 1;
-  Param param;
-  param.kind = ParamKind::Bool;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
-  param.flags = flags;
+  Param param = declaredParam(ParamKind::Bool, displayName, id, flags);
   param.minimum = 0;
   param.maximum = 1;
   param.defaultValue = ParamValue::ofInt(defaultValue);
@@ -120,11 +122,7 @@ int32_t Host::addChoiceParam(const wchar_t* displayName, const char* id, int32_t
       std::to_string(reserved));
   if (declarationRefused()) return 1;
   if (!defaultIndex) problem("AddChoiceParam " + logId(id) + ": null default index, 0 used");
-  Param param;
-  param.kind = ParamKind::Choice;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
-  param.flags = flags;
+  Param param = declaredParam(ParamKind::Choice, displayName, id, flags);
   param.choices = splitChoices(toUtf8(choices));
   param.minimum = 0;
   param.maximum = static_cast<double>(param.choices.size()) - 1;
@@ -137,11 +135,7 @@ int32_t Host::addPointParam(const wchar_t* displayName, const char* id, int32_t 
   log("AddPointParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) +
       " " + formatFloat(x) + " " + formatFloat(y));
   if (declarationRefused()) return 1;
-  Param param;
-  param.kind = ParamKind::Point;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
-  param.flags = flags;
+  Param param = declaredParam(ParamKind::Point, displayName, id, flags);
   param.defaultValue = ParamValue::ofPoint(x, y);
   return declare(std::move(param));
 }
@@ -151,11 +145,7 @@ int32_t Host::addAngleParam(const wchar_t* displayName, const char* id, int32_t 
   log("AddAngleParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) +
       " " + std::to_string(extra) + " " + formatFloat(degrees));
   if (declarationRefused()) return 1;
-  Param param;
-  param.kind = ParamKind::Angle;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
-  param.flags = flags;
+  Param param = declaredParam(ParamKind::Angle, displayName, id, flags);
   param.extra = extra;
   param.defaultValue = ParamValue::ofFloat(degrees);
   return declare(std::move(param));
@@ -166,11 +156,7 @@ int32_t Host::addColorParam(const wchar_t* displayName, const char* id, int32_t 
   log("AddColorParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) +
       " " + formatFloat(red) + " " + formatFloat(green) + " " + formatFloat(blue));
   if (declarationRefused()) return 1;
-  Param param;
-  param.kind = ParamKind::Color;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
-  param.flags = flags;
+  Param param = declaredParam(ParamKind::Color, displayName, id, flags);
   param.defaultValue = ParamValue::ofColor(red, green, blue);
   return declare(std::move(param));
 }
@@ -178,11 +164,7 @@ int32_t Host::addColorParam(const wchar_t* displayName, const char* id, int32_t 
 int32_t Host::addLayerParam(const wchar_t* displayName, const char* id, int32_t flags) {
   log("AddLayerParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags));
   if (declarationRefused()) return 1;
-  Param param;
-  param.kind = ParamKind::Layer;
-  param.id = id ? id : "";
-  param.displayName = toUtf8(displayName);
-  param.flags = flags;
+  Param param = declaredParam(ParamKind::Layer, displayName, id, flags);
   param.defaultValue = ParamValue::ofLayer(kNoLayer);
   return declare(std::move(param));
 }
