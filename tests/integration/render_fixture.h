@@ -11,6 +11,7 @@
 
 #include "refhost/host.h"
 #include "refhost/module.h"
+#include "refhost/render_frame.h"
 
 using Rgba = std::array<uint8_t, 4>;
 
@@ -89,23 +90,8 @@ class RenderFixture {
     context.sourceFrameIndex = frame;
     context.sourceFrameCount = 100;
     context.pixelAspect = 1.0f;
-    const float projection[16] = {2.0f / static_cast<float>(width_),
-                                  0,
-                                  0,
-                                  0,
-                                  0,
-                                  2.0f / static_cast<float>(height_),
-                                  0,
-                                  0,
-                                  0,
-                                  0,
-                                  -1,
-                                  0,
-                                  -1,
-                                  -1,
-                                  0,
-                                  1};
-    std::copy(std::begin(projection), std::end(projection), context.projection);
+    const refhost::Matrix4 projection = refhost::pixelProjection(width_, height_);
+    std::copy(projection.begin(), projection.end(), context.projection);
     for (int i = 0; i < 4; ++i) context.modelView[i * 5] = 1.0f;
     context.ownLayerGuid = kOwnLayer;
     for (int i = 0; i < 4; ++i) context.view.lens[i * 5] = context.view.view[i * 5] = 1.0f;

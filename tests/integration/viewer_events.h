@@ -9,6 +9,7 @@
 #include <iterator>
 
 #include "refhost/host.h"
+#include "refhost/render_frame.h"
 
 class ViewerEvents {
  public:
@@ -16,10 +17,8 @@ class ViewerEvents {
     context_.width = width;
     context_.height = height;
     context_.viewScaleX = context_.viewScaleY = context_.uiScale = 1.0;
-    const float w = static_cast<float>(width);
-    const float h = static_cast<float>(height);
-    const float projection[16] = {2.0f / w, 0, 0, 0, 0, 2.0f / h, 0, 0, 0, 0, -1, 0, -1, -1, 0, 1};
-    std::copy(std::begin(projection), std::end(projection), context_.projection);
+    const refhost::Matrix4 projection = refhost::pixelProjection(width, height);
+    std::copy(projection.begin(), projection.end(), context_.projection);
   }
 
   WispViewerContext& context() { return context_; }

@@ -5,6 +5,7 @@
 #include <GL/glew.h>
 #include <gtest/gtest.h>
 
+#include "gl_host_test.h"
 #include "refhost/composition.h"
 
 namespace refhost {
@@ -45,22 +46,7 @@ TEST(RenderFrame, MillisecondsFollowTheFrameRate) {
   }
 }
 
-class RenderFrameWithGl : public ::testing::Test {
- protected:
-  void SetUp() override {
-    try {
-      host.attachGl();
-    } catch (const std::exception& error) {
-      FAIL() << "no GL context: " << error.what();
-    }
-  }
-  void TearDown() override {
-    if (host.gl()) {
-      EXPECT_TRUE(host.gl()->errors().empty()) << host.gl()->errors()[0].text;
-    }
-  }
-  Host host;
-};
+using RenderFrameWithGl = GlHostTest;
 
 TEST_F(RenderFrameWithGl, ContextDescribesTheFrameAndItsTextures) {
   Composition composition;

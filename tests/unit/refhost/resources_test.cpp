@@ -5,6 +5,7 @@
 
 #include <cstring>
 
+#include "gl_host_test.h"
 #include "refhost/host.h"
 
 namespace refhost {
@@ -24,23 +25,8 @@ Layer makeLayer(const std::string& guid, const std::string& name, int32_t kind,
   return layer;
 }
 
-class HostResources : public ::testing::Test {
+class HostResources : public GlHostTest {
  protected:
-  void SetUp() override {
-    // A GL test never skips: without a context it fails and says why.
-    try {
-      host.attachGl();
-    } catch (const std::exception& error) {
-      FAIL() << "no GL context: " << error.what();
-    }
-  }
-  void TearDown() override {
-    if (host.gl()) {
-      EXPECT_TRUE(host.gl()->errors().empty()) << host.gl()->errors()[0].text;
-    }
-  }
-
-  Host host;
   tagWispAPI& api = host.api();
   WispHost* h = host.handle();
 };
