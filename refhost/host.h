@@ -152,6 +152,8 @@ class Host {
   // The lines of one operation (the text before the first space equals `operation`).
   std::vector<std::string> callsTo(const std::string& operation) const;
   void clearCallLog() { callLog_.clear(); }
+  // Long renders and benchmarks keep no log: it grows by every call the plug-in makes.
+  void setCallLogging(bool on) { callLogging_ = on; }
   // What the host refused or found wrong in a call: unknown ids, kind mismatches, null
   // pointers, releases of names it never handed out, an EndUndo without BeginUndo.
   const std::vector<std::string>& problems() const { return problems_; }
@@ -195,7 +197,9 @@ class Host {
     Host* host;
   };
 
-  void log(std::string line) { callLog_.push_back(std::move(line)); }
+  void log(std::string line) {
+    if (callLogging_) callLog_.push_back(std::move(line));
+  }
   void problem(std::string text) { problems_.push_back(std::move(text)); }
   Param& mutableParam(const std::string& id);
   bool requireGl(const char* operation);
@@ -298,6 +302,7 @@ class Host {
   FrameSource sourceFrames_;
 
   std::vector<std::string> callLog_;
+  bool callLogging_ = true;
   std::vector<std::string> problems_;
   std::vector<MessageRecord> messages_;
 

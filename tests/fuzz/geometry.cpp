@@ -12,7 +12,7 @@
 #include "geometry/cut_segments.h"
 #include "geometry/input_transform.h"
 #include "geometry/region_partition.h"
-#include "support/param_host.h"
+#include "support/in_memory_host.h"
 
 namespace {
 
@@ -33,29 +33,29 @@ void require(bool holds) {
   if (!holds) __builtin_trap();
 }
 
-void fillParameters(FuzzedDataProvider& data, testsupport::ParamHost& host) {
+void fillParameters(FuzzedDataProvider& data, testsupport::InMemoryHost& host) {
   host.setInt(param::kNumberOfCuts, data.ConsumeBool() ? data.ConsumeIntegralInRange(-2, 10)
                                                        : data.ConsumeIntegral<int32_t>());
-  host.setChoice(param::kCutType, data.ConsumeBool() ? data.ConsumeIntegralInRange(0, 1)
-                                                     : data.ConsumeIntegral<int32_t>());
+  host.setInt(param::kCutType, data.ConsumeBool() ? data.ConsumeIntegralInRange(0, 1)
+                                                  : data.ConsumeIntegral<int32_t>());
   host.setPoint(param::kCutPositionGlobal, consumeFloat(data, 5000), consumeFloat(data, 5000));
   for (int i = 0; i < kMaxCuts; ++i) {
     if (data.ConsumeBool()) {
       host.setPoint(cutParamId(param::kCutPositionPrefix, i), consumeFloat(data, 5000),
                     consumeFloat(data, 5000));
     }
-    host.setAngle(cutParamId(param::kCutDirectionPrefix, i), consumeFloat(data, 1000));
+    host.set(cutParamId(param::kCutDirectionPrefix, i), consumeFloat(data, 1000));
   }
   for (int k = 0; k < kInputCount; ++k) {
     host.setPoint(inputParamId(param::kInputFrameTranslationPrefix, k), consumeFloat(data, 5000),
                   consumeFloat(data, 5000));
-    host.setFloat(inputParamId(param::kInputFrameScalePrefix, k), consumeFloat(data, 500));
-    host.setAngle(inputParamId(param::kInputFrameRotationPrefix, k), consumeFloat(data, 1000));
+    host.set(inputParamId(param::kInputFrameScalePrefix, k), consumeFloat(data, 500));
+    host.set(inputParamId(param::kInputFrameRotationPrefix, k), consumeFloat(data, 1000));
   }
 }
 
 // One event's geometry, as the render and the pointer handlers run it.
-void runEvent(FuzzedDataProvider& data, testsupport::ParamHost& host) {
+void runEvent(FuzzedDataProvider& data, testsupport::InMemoryHost& host) {
   const int32_t width =
       data.ConsumeBool() ? data.ConsumeIntegralInRange(0, 8192) : data.ConsumeIntegral<int32_t>();
   const int32_t height =
@@ -64,7 +64,7 @@ void runEvent(FuzzedDataProvider& data, testsupport::ParamHost& host) {
   const bool aspectPresent = data.ConsumeBool();
   const float aspect = consumeFloat(data, 4);
   WispHost* handle = host.handle();
-  const tagWispAPI* api = host.api();
+  tagWispAPI* api = host.record();
 
   const CutList cuts = readCutList(handle, api, 0, frame, aspectPresent, aspect);
   require(cuts.size() <= static_cast<std::size_t>(kMaxCuts));
@@ -113,7 +113,7 @@ void runSplit(FuzzedDataProvider& data) {
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, std::size_t size) {
   FuzzedDataProvider data(bytes, size);
-  testsupport::ParamHost host;
+  testsupport::InMemoryHost host;
   fillParameters(data, host);
   runEvent(data, host);
   runSplit(data);

@@ -1,6 +1,9 @@
-// Viewer gestures through the real module: every drag writes what the handle promises and is
-// exactly one named undo step, and undo restores every value bit for bit.
+// Viewer gestures through the real module: what every drag writes, the one named undo step it
+// makes, the cursor it asks for, and that undo restores every value bit for bit.
 #include <cmath>
+#include <functional>
+#include <limits>
+#include <random>
 
 #include "loaded_plugin.h"
 #include "viewer_events.h"
@@ -9,16 +12,18 @@ namespace {
 
 using refhost::ParamValue;
 
-constexpr int kW = 160;
-constexpr int kH = 90;
 constexpr uint32_t kShift = 65505;
 constexpr uint32_t kEscape = 65307;
 
 class ViewerGestures : public LoadedPlugin {
- protected:
+ public:
   void SetUp() override {
     LoadedPlugin::SetUp();
-    viewer_ = std::make_unique<ViewerEvents>(host(), kW, kH);
+    resize(160, 90);
+  }
+  // A fresh viewer of a frame of this size at view scale 1.
+  void resize(int32_t width, int32_t height) {
+    viewer_ = std::make_unique<ViewerEvents>(host(), width, height);
   }
   ViewerEvents& viewer() { return *viewer_; }
 
@@ -27,11 +32,16 @@ class ViewerGestures : public LoadedPlugin {
     host().setValue("cutPosition_" + std::to_string(i), ParamValue::ofPoint(x, y));
     host().setValue("cutDirection_" + std::to_string(i), ParamValue::ofFloat(degrees));
   }
+  void setRadial(int cuts) {
+    host().setValue("cutType", ParamValue::ofInt(1));
+    host().setValue("numberOfCuts", ParamValue::ofInt(cuts));
+  }
   std::vector<refhost::ParamState> snapshot() {
     std::vector<refhost::ParamState> states;
     for (const refhost::Param& param : host().panel().params()) states.push_back(param.state);
     return states;
   }
+  int32_t lastCursor() { return host().cursorShapes().empty() ? -1 : host().cursorShapes().back(); }
 
   std::unique_ptr<ViewerEvents> viewer_;
 };
@@ -39,13 +49,65 @@ class ViewerGestures : public LoadedPlugin {
 TEST_F(ViewerGestures, DraggingACutLineMovesItParallelToItself) {
   setCut(0, 0.0f, 0.0f, 0.0f);  // vertical line through the centre, corner x = 80
   const auto before = snapshot();
-  viewer().drag(80, 70, 110, 60);
+  ASSERT_EQ(viewer().press(80, 70), 1);
+  EXPECT_EQ(number("cutPosition_0")[1], 25.0f) << "the position jumps onto the pressed point";
+  viewer().move(95, 65, true);
+  viewer().move(110, 60, true);
+  viewer().release(110, 60);
   EXPECT_EQ(number("cutPosition_0")[0], 30.0f);
   EXPECT_EQ(number("cutPosition_0")[1], 15.0f);
-  EXPECT_EQ(number("cutDirection_0")[0], 0.0f);
+  EXPECT_TRUE(host().callsTo("SetAngleParam").empty()) << "the direction is left alone";
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Split Screen Cut 1 Position"}));
   ASSERT_TRUE(host().undo());
   EXPECT_EQ(snapshot(), before);
+}
+
+TEST_F(ViewerGestures, EveryGestureIsOneNamedUndoStep) {
+  // 1920 x 1080, one vertical Local cut through the centre: input 1 left, input 0 right.
+  struct Gesture {
+    const char* undoName;
+    std::function<void(ViewerGestures&)> prepare;
+    int pressX, pressY, moveX, moveY;
+  };
+  const auto selectInputZero = [](ViewerGestures& test) {
+    test.viewer().press(1400, 540);
+    test.viewer().release(1400, 540);
+  };
+  const Gesture gestures[] = {
+      {"Split Screen Cut 1 Position", {}, 960, 300, 1000, 300},
+      // Zoomed out, the direction handle sits 20 frame pixels off the line, out of its reach.
+      {"Split Screen Cut 1 Direction",
+       [](ViewerGestures& test) {
+         test.viewer().context().viewScaleX = test.viewer().context().viewScaleY = 2.0;
+       },
+       980, 540, 975, 530},
+      {"Split Screen Cut 1 Direction", [](ViewerGestures& test) { test.setRadial(1); }, 960, 740,
+       1100, 700},
+      {"Split Screen Input 0 Rotation", selectInputZero, 960, 1090, 1200, 1000},
+      {"Split Screen Input 0 Scale", selectInputZero, 1920, 300, 2020, 300},
+      {"Moved Split Screen Input 0", {}, 1400, 540, 1500, 500},
+      {"Moved Split Screen Input 1", {}, 400, 540, 500, 500},
+      {"Inserting Cut", [](ViewerGestures& test) { test.viewer().key(1007, kShift); }, 1400, 540,
+       1500, 500},
+  };
+  for (const Gesture& gesture : gestures) {
+    SCOPED_TRACE(gesture.undoName);
+    host().send(4);
+    host().send(3);
+    host().setValue("cutType", ParamValue::ofInt(0));
+    host().setValue("numberOfCuts", ParamValue::ofInt(1));
+    setCut(0, 0.0f, 0.0f, 0.0f);
+    resize(1920, 1080);
+    if (gesture.prepare) gesture.prepare(*this);
+    host().clearCallLog();
+    EXPECT_EQ(viewer().press(gesture.pressX, gesture.pressY), 1);
+    EXPECT_EQ(viewer().move(gesture.moveX, gesture.moveY, true), 1);
+    EXPECT_EQ(viewer().move(gesture.moveX + 3, gesture.moveY + 3, true), 1);
+    EXPECT_EQ(viewer().release(gesture.moveX, gesture.moveY), 1);
+    EXPECT_EQ(host().callsTo("BeginUndo"),
+              std::vector<std::string>{std::string("BeginUndo \"") + gesture.undoName + "\""});
+    EXPECT_EQ(host().callsTo("EndUndo").size(), 1u);
+  }
 }
 
 TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
@@ -64,26 +126,63 @@ TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Split Screen Cut 1 Direction"}));
 }
 
+TEST_F(ViewerGestures, PressedDirectionHandleKeepsTheDragOverAnotherHandle) {
+  resize(1920, 1080);
+  setRadial(2);  // rays at 0 and 90 degrees from the frame centre
+  setCut(0, 0.0f, 0.0f, 0.0f);
+  setCut(1, 0.0f, 0.0f, 90.0f);
+  ASSERT_EQ(viewer().press(960, 740), 1);
+  host().clearCallLog();
+  EXPECT_EQ(viewer().move(1160, 540, true), 1);  // onto cut 2's handle
+  EXPECT_NEAR(number("cutDirection_0")[0], 90.0f, 1e-3f);
+  EXPECT_EQ(number("cutDirection_1")[0], 90.0f);
+  for (const std::string& call : host().callsTo("SetAngleParam"))
+    EXPECT_EQ(call.find("cutDirection_1"), std::string::npos) << call;
+}
+
 TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
+  // Seven vertical cuts, the rightmost at x = 450; the pointer stays well clear of them.
+  resize(1920, 1080);
   host().setValue("numberOfCuts", ParamValue::ofInt(7));
-  for (int i = 0; i < 7; ++i) setCut(i, -70.0f + 2.0f * static_cast<float>(i), 0.0f, 0.0f);
+  for (int i = 0; i < 7; ++i) setCut(i, -750.0f + 200.0f * static_cast<float>(i), 0.0f, 0.0f);
   EXPECT_EQ(viewer().key(1007, kShift), 0);
-  ASSERT_EQ(viewer().press(140, 45), 1);
+  EXPECT_EQ(viewer().move(1810, 100, false), 0);
+  EXPECT_EQ(lastCursor(), 19);
+
+  ASSERT_EQ(viewer().press(1810, 100), 1);
   EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 8);
-  EXPECT_EQ(number("cutPosition_7")[0], 60.0f);
-  EXPECT_EQ(number("cutPosition_7")[1], 0.0f);
-  viewer().move(140, 80, true);
-  viewer().release(140, 80);
+  EXPECT_EQ(number("cutPosition_7")[0], 850.0f);
+  EXPECT_EQ(number("cutPosition_7")[1], -440.0f);
+  // The new line turns toward the pointer: straight down +y, then along +x.
+  viewer().move(1810, 300, true);
+  EXPECT_NEAR(number("cutDirection_7")[0], 0.0f, 1e-4f);
+  viewer().release(1910, 100);
+  EXPECT_NEAR(number("cutDirection_7")[0], 90.0f, 1e-4f);
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Inserting Cut"}));
 
-  // With eight cuts Shift no longer inserts: the press falls through to the region under it.
-  ASSERT_EQ(viewer().press(110, 10), 1);
-  viewer().release(110, 10);
-  EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 8);
-  ASSERT_EQ(host().undoStepNames().size(), 2u);
-  EXPECT_EQ(host().undoStepNames()[1].rfind("Moved Split Screen Input ", 0), 0u)
-      << host().undoStepNames()[1];
+  // Eight cuts: Shift no longer inserts; the press takes the region under the pointer, the
+  // part of the rightmost strip above the new horizontal cut.
+  EXPECT_EQ(viewer().move(1810, 800, false), 1);
+  EXPECT_EQ(lastCursor(), 3);
+  host().clearCallLog();
+  ASSERT_EQ(viewer().press(1810, 800), 1);
+  viewer().release(1810, 800);
+  EXPECT_TRUE(host().callsTo("SetIntParam").empty());
+  EXPECT_EQ(host().undoStepNames().back(), "Moved Split Screen Input 8");
   EXPECT_EQ(viewer().key(1008, kShift), 0);
+}
+
+TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
+  resize(1920, 1080);
+  setRadial(2);
+  setCut(0, 0.0f, 0.0f, 0.0f);
+  setCut(1, 0.0f, 0.0f, 90.0f);
+  viewer().key(1007, kShift);
+  ASSERT_EQ(viewer().press(960 - 300, 540 - 300), 1);  // down and left of the centre
+  EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 3);
+  EXPECT_NEAR(number("cutDirection_2")[0], -135.0f, 1e-3f);
+  viewer().release(960 - 300, 540 - 300);
+  EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Inserting Cut"}));
 }
 
 TEST_F(ViewerGestures, DraggingARegionMovesItsInput) {
@@ -154,19 +253,43 @@ TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
   EXPECT_EQ(viewer().key(1008, kEscape), 1);
   EXPECT_EQ(host().send(1012), 0);
   EXPECT_EQ(viewer().key(1008, kEscape), 0);
+
+  // A host that keeps a pressed control's hover drops the selection after every release.
+  host().setHostId(3000);
+  viewer().press(120, 20);
+  viewer().release(120, 20);
+  EXPECT_EQ(host().send(1012), 0);
 }
 
 TEST_F(ViewerGestures, ReleaseWithoutPressClosesNoStep) {
   setCut(0, 0.0f, 0.0f, 0.0f);
   EXPECT_EQ(viewer().release(120, 20), 1);   // over a region
   EXPECT_EQ(viewer().release(-50, -50), 0);  // outside the frame
+  viewer().key(1007, kShift);
+  EXPECT_EQ(viewer().release(120, 20), 0) << "Shift with room for a cut: no region";
   EXPECT_TRUE(host().callsTo("EndUndo").empty());
   EXPECT_TRUE(host().undoStepNames().empty());
 }
 
-}  // namespace
-
-namespace {
+TEST_F(ViewerGestures, PointerMessagesWithoutTheirRecordsAreDeclined) {
+  setCut(0, 0.0f, 0.0f, 0.0f);
+  WispPointerEvent event{120, 20, 1.0};
+  WispViewerContext& context = viewer().context();
+  const struct {
+    void* renderContext;
+    void* event;
+    bool instance;
+  } cases[] = {{&context, nullptr, true}, {nullptr, &event, true}, {&context, &event, false}};
+  void* const instance = host().api().instanceData;
+  for (const auto& c : cases) {
+    host().setRenderContext(c.renderContext);
+    host().setEvent(c.event);
+    if (!c.instance) host().api().instanceData = nullptr;
+    for (int32_t message : {1004, 1005, 1006}) EXPECT_EQ(host().send(message), 0) << message;
+    host().api().instanceData = instance;
+  }
+  EXPECT_TRUE(host().callLog().empty());
+}
 
 // Message 1014 copies another instance's interaction state into this one.
 TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
@@ -190,11 +313,58 @@ TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   EXPECT_EQ(viewer().key(1007, kEscape), 1);  // input 3 is selected here now
   host().clearViewerRecords();
   viewer().move(150, 80, false);  // Shift is down here too: the insert cursor
-  ASSERT_FALSE(host().cursorShapes().empty());
-  EXPECT_EQ(host().cursorShapes().back(), 19);
+  EXPECT_EQ(lastCursor(), 19);
 
   EXPECT_EQ(host().send(4), 1);
   host().api().instanceData = source;
+}
+
+// Parameters and viewer measures a host may hand over unchecked: every message returns, and
+// every undo step a press opens is closed by its release.
+TEST_F(ViewerGestures, HostileValuesKeepEveryUndoStepBalanced) {
+  const float inf = std::numeric_limits<float>::infinity();
+  const float nan = std::numeric_limits<float>::quiet_NaN();
+  const float floats[] = {0, 1, -1, 0.5f, 100, 540, -960, 1e30f, -1e30f, inf, -inf, nan};
+  const int counts[] = {-3, 0, 1, 2, 7, 8, 99};
+  const int sizes[] = {0, 1, 2, 1920};
+  const double scales[] = {0.0, 1.0, 1e-30, 1e300, std::nan("")};
+  std::mt19937 random(2024);
+  const auto pick = [&random](const auto& table) {
+    return table[std::uniform_int_distribution<size_t>(0, std::size(table) - 1)(random)];
+  };
+  const auto point = [&] { return ParamValue::ofPoint(pick(floats), pick(floats)); };
+  std::uniform_int_distribution<int> coordinate(-100, 2000);
+  for (int trial = 0; trial < 300; ++trial) {
+    WispViewerContext& context = viewer().context();
+    context.width = pick(sizes);
+    context.height = pick(sizes);
+    context.viewScaleX = pick(scales);
+    context.viewScaleY = pick(scales);
+    context.uiScale = pick(scales);
+    host().setValue("numberOfCuts", ParamValue::ofInt(pick(counts)));
+    host().setValue("cutType", ParamValue::ofInt(pick(counts)));
+    host().setValue("cutPosition_global", point());
+    for (int i = 0; i < 8; ++i) {
+      host().setValue("cutPosition_" + std::to_string(i), point());
+      host().setValue("cutDirection_" + std::to_string(i), ParamValue::ofFloat(pick(floats)));
+    }
+    for (int j = 0; j < 9; ++j) {
+      const std::string n = std::to_string(j);
+      host().setValue("inputFrameTranslation" + n, point());
+      host().setValue("inputFrameScale" + n, ParamValue::ofFloat(pick(floats)));
+      host().setValue("inputFrameRotation" + n, ParamValue::ofFloat(pick(floats)));
+    }
+    viewer().key(trial % 3 == 0 ? 1007 : 1008, kShift);
+    host().clearCallLog();
+    for (int gesture = 0; gesture < 3; ++gesture) {
+      viewer().move(coordinate(random), coordinate(random), false);
+      viewer().press(coordinate(random), coordinate(random));
+      viewer().move(coordinate(random), coordinate(random), true);
+      viewer().release(coordinate(random), coordinate(random));
+      ASSERT_EQ(host().callsTo("BeginUndo").size(), host().callsTo("EndUndo").size())
+          << "trial " << trial;
+    }
+  }
 }
 
 }  // namespace

@@ -8,7 +8,7 @@
 #include <cmath>
 #include <vector>
 
-#include "support/param_host.h"
+#include "refhost/host.h"
 
 namespace {
 
@@ -31,13 +31,6 @@ SplitScreenCutPositionControl controlFor(PointParam& param, int index = 0) {
 
 const genVec2 kFrame{1920.0f, 1080.0f};
 
-std::vector<std::string> cursorCalls(const testsupport::ParamHost& host) {
-  std::vector<std::string> found;
-  for (const auto& call : host.calls())
-    if (call.rfind("SetCursor(", 0) == 0) found.push_back(call);
-  return found;
-}
-
 TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
   const genVec2 a{100.0f, 100.0f};
   const genVec2 b{100.0f, 300.0f};
@@ -45,44 +38,34 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
     genVec2 pointer;
     float viewScale;
     bool hot;
-    const char* cursor;  // nullptr: no cursor call at all
+    int cursor;  // -1: no cursor call at all
   } cases[] = {
-      {{100.0f, 200.0f}, 1.0f, true, "SetCursor(8)"},
-      {{114.9f, 200.0f}, 1.0f, true, "SetCursor(8)"},
-      {{115.0f, 200.0f}, 1.0f, false, "SetCursor(0)"},
-      {{85.5f, 150.0f}, 1.0f, true, "SetCursor(8)"},
-      {{107.0f, 200.0f}, 2.0f, true, "SetCursor(8)"},
-      {{108.0f, 200.0f}, 2.0f, false, "SetCursor(0)"},
-      {{105.0f, 100.5f}, 1.0f, true, "SetCursor(8)"},
-      {{105.0f, 100.0f}, 1.0f, false, nullptr},  // t = 0
-      {{100.0f, 300.0f}, 1.0f, false, nullptr},  // t = 1
-      {{100.0f, 50.0f}, 1.0f, false, nullptr},
-      {{100.0f, 301.0f}, 1.0f, false, nullptr},
+      {{100.0f, 200.0f}, 1.0f, true, 8},   {{114.9f, 200.0f}, 1.0f, true, 8},
+      {{115.0f, 200.0f}, 1.0f, false, 0},  {{85.5f, 150.0f}, 1.0f, true, 8},
+      {{107.0f, 200.0f}, 2.0f, true, 8},   {{108.0f, 200.0f}, 2.0f, false, 0},
+      {{105.0f, 100.5f}, 1.0f, true, 8},   {{105.0f, 100.0f}, 1.0f, false, -1},  // t = 0
+      {{100.0f, 300.0f}, 1.0f, false, -1},                                       // t = 1
+      {{100.0f, 50.0f}, 1.0f, false, -1},  {{100.0f, 301.0f}, 1.0f, false, -1},
   };
   for (const auto& c : cases) {
-    testsupport::ParamHost host;
-    host.recordCalls(true);
+    refhost::Host host;
     PointParam param;
     SplitScreenCutPositionControl control = controlFor(param);
-    EXPECT_EQ(control.test(host.handle(), host.api(), kFrame, a, b, c.pointer,
+    EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, b, c.pointer,
                            {c.viewScale, c.viewScale}, 0.0f, 0),
               c.hot)
         << c.pointer.x << "," << c.pointer.y;
     EXPECT_EQ(control.hot, c.hot ? 1 : 0);
-    const auto cursors = cursorCalls(host);
-    if (c.cursor) {
-      EXPECT_EQ(cursors, std::vector<std::string>{c.cursor}) << c.pointer.x << "," << c.pointer.y;
-    } else {
-      EXPECT_TRUE(cursors.empty()) << c.pointer.x << "," << c.pointer.y;
-    }
+    const std::vector<int32_t> cursors =
+        c.cursor < 0 ? std::vector<int32_t>{} : std::vector{c.cursor};
+    EXPECT_EQ(host.cursorShapes(), cursors) << c.pointer.x << "," << c.pointer.y;
   }
   // A zero-length segment has no inside at all.
-  testsupport::ParamHost host;
-  host.recordCalls(true);
+  refhost::Host host;
   PointParam param;
   SplitScreenCutPositionControl control = controlFor(param);
-  EXPECT_FALSE(control.test(host.handle(), host.api(), kFrame, a, a, a, {1, 1}, 0.0f, 0));
-  EXPECT_TRUE(cursorCalls(host).empty());
+  EXPECT_FALSE(control.test(host.handle(), &host.api(), kFrame, a, a, a, {1, 1}, 0.0f, 0));
+  EXPECT_TRUE(host.cursorShapes().empty());
 }
 
 TEST(CutPositionControl, CursorMovesAcrossTheSegment) {
@@ -92,18 +75,17 @@ TEST(CutPositionControl, CursorMovesAcrossTheSegment) {
     int cursor;
   } cases[] = {{0, 8}, {45, 9}, {90, 6}, {135, 7}, {180, 8}, {225, 9}, {-90, 6}, {-45, 7}};
   for (const auto& c : cases) {
-    testsupport::ParamHost host;
-    host.recordCalls(true);
+    refhost::Host host;
     PointParam param;
     SplitScreenCutPositionControl control = controlFor(param);
     const float r = c.degrees * 3.1415927f / 180.0f;
     const genVec2 a{500.0f - 100.0f * std::sin(r), 500.0f - 100.0f * std::cos(r)};
     const genVec2 b{500.0f + 100.0f * std::sin(r), 500.0f + 100.0f * std::cos(r)};
     ASSERT_TRUE(
-        control.test(host.handle(), host.api(), kFrame, a, b, {500.0f, 500.0f}, {1, 1}, 0.0f, 0));
+        control.test(host.handle(), &host.api(), kFrame, a, b, {500.0f, 500.0f}, {1, 1}, 0.0f, 0));
     EXPECT_NEAR(std::sin(control.segmentAngle), std::sin(r), 1e-5f);
     EXPECT_NEAR(std::cos(control.segmentAngle), std::cos(r), 1e-5f);
-    EXPECT_EQ(cursorCalls(host).back(), "SetCursor(" + std::to_string(c.cursor) + ")") << c.degrees;
+    EXPECT_EQ(host.cursorShapes().back(), c.cursor) << c.degrees;
   }
 }
 

@@ -8,7 +8,7 @@
 
 #include "effect/instance_record.h"
 #include "effect/param_ids.h"
-#include "support/param_host.h"
+#include "support/in_memory_host.h"
 
 namespace {
 
@@ -21,28 +21,28 @@ constexpr float kPi = 3.1415927f;
 const genVec2 kFrame{1920.0f, 1080.0f};
 
 TEST(ParameterAccessors, SettersConvertToFrameSpaceDegreesAndPercent) {
-  testsupport::ParamHost host;
-  veltrane::cutPositionSetter()(host.handle(), host.api(), {1000.0f, 600.0f}, 0, kFrame, 3);
-  EXPECT_EQ(host.pointValue("cutPosition_3"), (std::array<float, 2>{40.0f, 60.0f}));
+  testsupport::InMemoryHost host;
+  veltrane::cutPositionSetter()(host.handle(), host.record(), {1000.0f, 600.0f}, 0, kFrame, 3);
+  EXPECT_EQ(host.number("cutPosition_3", 0), 40.0f);
+  EXPECT_EQ(host.number("cutPosition_3", 1), 60.0f);
 
-  veltrane::cutDirectionSetter(6)(host.handle(), host.api(), kPi / 2.0f, 0);
-  EXPECT_NEAR(host.floatValue("cutDirection_6"), 0.0f, 1e-4f) << "Local: handle on the normal";
-  host.setChoice(param::kCutType, veltrane::kCutTypeRadial);
-  veltrane::cutDirectionSetter(6)(host.handle(), host.api(), kPi / 2.0f, 0);
-  EXPECT_NEAR(host.floatValue("cutDirection_6"), 90.0f, 1e-4f);
+  veltrane::cutDirectionSetter(6)(host.handle(), host.record(), kPi / 2.0f, 0);
+  EXPECT_NEAR(host.number("cutDirection_6"), 0.0f, 1e-4f) << "Local: handle on the normal";
+  host.setInt(param::kCutType, veltrane::kCutTypeRadial);
+  veltrane::cutDirectionSetter(6)(host.handle(), host.record(), kPi / 2.0f, 0);
+  EXPECT_NEAR(host.number("cutDirection_6"), 90.0f, 1e-4f);
 
-  veltrane::inputRotationSetter(8)(host.handle(), host.api(), -kPi / 4.0f, 0);
-  EXPECT_NEAR(host.floatValue("inputFrameRotation8"), -45.0f, 1e-4f);
+  veltrane::inputRotationSetter(8)(host.handle(), host.record(), -kPi / 4.0f, 0);
+  EXPECT_NEAR(host.number("inputFrameRotation8"), -45.0f, 1e-4f);
 
   // A quarter-turned input widened by its x1 edge to 150 percent: the centre moves along the
   // input's own x axis, which points down the screen.
-  host.setAngle("inputFrameRotation2", 90.0f);
-  veltrane::inputRectSetter(2)(host.handle(), host.api(), {0, 0, 1920, 1080}, {0, 0, 2880, 1080},
+  host.set("inputFrameRotation2", 90.0f);
+  veltrane::inputRectSetter(2)(host.handle(), host.record(), {0, 0, 1920, 1080}, {0, 0, 2880, 1080},
                                veltrane::kEdgeBitX1, 0, kFrame);
-  const auto translation = host.pointValue("inputFrameTranslation2");
-  EXPECT_NEAR(translation[0], 0.0f, 1e-3f);
-  EXPECT_NEAR(translation[1], -480.0f, 1e-3f);
-  EXPECT_FLOAT_EQ(host.floatValue("inputFrameScale2"), 150.0f);
+  EXPECT_NEAR(host.number("inputFrameTranslation2", 0), 0.0f, 1e-3f);
+  EXPECT_NEAR(host.number("inputFrameTranslation2", 1), -480.0f, 1e-3f);
+  EXPECT_FLOAT_EQ(host.number("inputFrameScale2"), 150.0f);
 
   EXPECT_THROW(veltrane::cutDirectionGetter(8), std::out_of_range);
   EXPECT_THROW(veltrane::inputRectSetter(-1), std::out_of_range);
@@ -55,9 +55,9 @@ TEST(ParameterAccessors, PressingADirectionHandleWithoutMovingWritesTheSameValue
     float handleDegrees;  // where the handle shows
   } cases[] = {{0, 0.0f, 90.0f}, {0, -30.0f, 60.0f}, {1, 30.0f, 30.0f}, {1, 170.0f, 170.0f}};
   for (const auto& c : cases) {
-    testsupport::ParamHost host;
-    host.setChoice(param::kCutType, c.cutType);
-    host.setAngle("cutDirection_0", c.degrees);
+    testsupport::InMemoryHost host;
+    host.setInt(param::kCutType, c.cutType);
+    host.set("cutDirection_0", c.degrees);
     veltrane::RotationControl control(veltrane::cutDirectionSetter(0),
                                       veltrane::cutDirectionGetter(0), 0,
                                       veltrane::HandleMode::OnCircle, 6.0f);
@@ -65,11 +65,11 @@ TEST(ParameterAccessors, PressingADirectionHandleWithoutMovingWritesTheSameValue
     const genVec2 centre{500.0f, 500.0f};
     const genVec2 onHandle{centre.x + 40.0f * std::sin(a), centre.y + 40.0f * std::cos(a)};
     ASSERT_TRUE(
-        control.test(host.handle(), host.api(), centre, 40.0f, onHandle, {1, 1}, 1.0f, 1.0f, 0))
+        control.test(host.handle(), host.record(), centre, 40.0f, onHandle, {1, 1}, 1.0f, 1.0f, 0))
         << c.degrees;
     control.pressed = control.hot;
-    control.test(host.handle(), host.api(), centre, 40.0f, onHandle, {1, 1}, 1.0f, 1.0f, 0);
-    EXPECT_NEAR(host.floatValue("cutDirection_0"), c.degrees, 1e-4f) << c.cutType;
+    control.test(host.handle(), host.record(), centre, 40.0f, onHandle, {1, 1}, 1.0f, 1.0f, 0);
+    EXPECT_NEAR(host.number("cutDirection_0"), c.degrees, 1e-4f) << c.cutType;
   }
 }
 
@@ -87,22 +87,26 @@ TEST(EffectInstance, ControlsAreBoundToTheirOwnCutOrInputAndSurviveACopy) {
   EXPECT_EQ(copy.shiftDown, 1);
 
   // Each control, in the original and in the copy, reaches exactly its own parameters.
-  testsupport::ParamHost host;
+  testsupport::InMemoryHost host;
   const veltrane::EffectInstance* both[] = {&record, &copy};
   for (const veltrane::EffectInstance* instance : both) {
     for (int i = 0; i < veltrane::kMaxCuts; ++i) {
-      host.clear();
-      instance->cutDirectionControls[static_cast<size_t>(i)].setter(host.handle(), host.api(),
+      host.clearCallLog();
+      instance->cutDirectionControls[static_cast<size_t>(i)].setter(host.handle(), host.record(),
                                                                     kPi / 2.0f, 0);
-      EXPECT_TRUE(host.has(cutParamId(param::kCutDirectionPrefix, i))) << i;
+      EXPECT_EQ(host.callsTo("SetAngleParam")
+                    .at(0)
+                    .rfind("SetAngleParam cutDirection_" + std::to_string(i) + " ", 0),
+                0u);
     }
     for (int j = 0; j < veltrane::kInputCount; ++j) {
-      host.setAngle(inputParamId(param::kInputFrameRotationPrefix, j), 10.0f * j);
-      host.setFloat(inputParamId(param::kInputFrameScalePrefix, j), 5.0f * (j + 1));
+      host.set(inputParamId(param::kInputFrameRotationPrefix, j), 10.0f * j);
+      host.set(inputParamId(param::kInputFrameScalePrefix, j), 5.0f * (j + 1));
       const auto rotation = instance->inputRotationControls[static_cast<size_t>(j)].getter;
-      EXPECT_NEAR(rotation(host.handle(), host.api(), 0), 10.0f * j * kPi / 180.0f, 1e-5f);
+      EXPECT_NEAR(rotation(host.handle(), host.record(), 0), 10.0f * j * kPi / 180.0f, 1e-5f);
       const auto rect = instance->inputQuadControls[static_cast<size_t>(j)].getter;
-      EXPECT_FLOAT_EQ(rect(host.handle(), host.api(), 0, kFrame).z - 960.0f, 48.0f * (j + 1)) << j;
+      EXPECT_FLOAT_EQ(rect(host.handle(), host.record(), 0, kFrame).z - 960.0f, 48.0f * (j + 1))
+          << j;
     }
   }
   veltrane::destroyInstance(&other);

@@ -7,7 +7,7 @@
 #include <cmath>
 #include <vector>
 
-#include "support/param_host.h"
+#include "refhost/host.h"
 
 namespace {
 
@@ -43,11 +43,8 @@ genVec2 around(float degrees, float distance, float along = 0.0f) {
           kCentre.y + distance * std::cos(a) - along * std::sin(a)};
 }
 
-int lastCursor(const testsupport::ParamHost& host) {
-  for (auto call = host.calls().rbegin(); call != host.calls().rend(); ++call) {
-    if (call->rfind("SetCursor(", 0) == 0) return std::stoi(call->substr(10));
-  }
-  return -1;
+int lastCursor(const refhost::Host& host) {
+  return host.cursorShapes().empty() ? -1 : host.cursorShapes().back();
 }
 
 TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
@@ -57,11 +54,10 @@ TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
   } cases[] = {{0, 10},   {20, 10},  {25, 11},  {90, 12},  {135, 13}, {180, 14},  {225, 15},
                {270, 16}, {315, 17}, {340, 10}, {-90, 16}, {450, 12}, {-675, 11}, {3600 + 240, 15}};
   for (const auto& c : cases) {
-    testsupport::ParamHost host;
-    host.recordCalls(true);
+    refhost::Host host;
     AngleParam param{c.degrees * kDegree, {}};
     RotationControl control = controlFor(param);
-    EXPECT_TRUE(control.test(host.handle(), host.api(), kCentre, 100.0f, around(c.degrees, 100.0f),
+    EXPECT_TRUE(control.test(host.handle(), &host.api(), kCentre, 100.0f, around(c.degrees, 100.0f),
                              kUnitScale, 1.0f, 0.0f, 0))
         << c.degrees;
     EXPECT_EQ(control.hot, 1);
@@ -91,12 +87,11 @@ TEST(RotationControl, HitAreaFollowsTheHandleModeAndSize) {
       {HandleMode::OnCircle, 4, 2.5f, 4, 0, -1},
   };
   for (const auto& c : cases) {
-    testsupport::ParamHost host;
-    host.recordCalls(true);
+    refhost::Host host;
     AngleParam param{30.0f * kDegree, {}};
     RotationControl control = controlFor(param, c.mode);
     const bool hot =
-        control.test(host.handle(), host.api(), kCentre, c.radius,
+        control.test(host.handle(), &host.api(), kCentre, c.radius,
                      around(30.0f, c.distance, c.along), kUnitScale, c.uiScale, 0.0f, 0);
     EXPECT_EQ(hot, c.cursor > 0) << static_cast<int>(c.mode) << " " << c.distance << " " << c.along;
     EXPECT_EQ(lastCursor(host), c.cursor) << static_cast<int>(c.mode) << " " << c.distance;
@@ -106,16 +101,16 @@ TEST(RotationControl, HitAreaFollowsTheHandleModeAndSize) {
 TEST(RotationControl, DragFollowsThePointerThroughSeveralTurns) {
   // Steps above a quarter turn renew the anchor every time; small ones every few steps.
   for (const float stepDegrees : {7.0f, -13.0f, 100.0f, -170.0f}) {
-    testsupport::ParamHost host;
+    refhost::Host host;
     AngleParam param{0.0f, {}};
     RotationControl control = controlFor(param);
-    ASSERT_TRUE(control.test(host.handle(), host.api(), kCentre, 100.0f, around(0.0f, 100.0f),
+    ASSERT_TRUE(control.test(host.handle(), &host.api(), kCentre, 100.0f, around(0.0f, 100.0f),
                              kUnitScale, 1.0f, 1.0f, 0));
     control.pressed = control.hot;
 
     const int steps = static_cast<int>(std::ceil(760.0f / std::fabs(stepDegrees)));
     for (int k = 1; k <= steps; ++k) {
-      control.test(host.handle(), host.api(), kCentre, 100.0f,
+      control.test(host.handle(), &host.api(), kCentre, 100.0f,
                    around(stepDegrees * static_cast<float>(k), 100.0f), kUnitScale, 1.0f, 1.0f, 0);
     }
     ASSERT_EQ(param.written.size(), static_cast<size_t>(steps));
@@ -131,23 +126,22 @@ TEST(RotationControl, DragFollowsThePointerThroughSeveralTurns) {
 
 TEST(RotationControl, PressedHoverSurvivesButtonUpMovesOnlyOnTheStickyHost) {
   for (const int hostId : {0, 3000}) {
-    testsupport::ParamHost host;
+    refhost::Host host;
     host.setHostId(hostId);
     AngleParam param;
     RotationControl control = controlFor(param);
-    control.test(host.handle(), host.api(), kCentre, 100.0f, around(0.0f, 100.0f), kUnitScale, 1.0f,
-                 1.0f, 0);
+    control.test(host.handle(), &host.api(), kCentre, 100.0f, around(0.0f, 100.0f), kUnitScale,
+                 1.0f, 1.0f, 0);
     control.pressed = control.hot;
     const float anchor = control.grabPointerAngle;
 
-    host.recordCalls(true);
-    EXPECT_FALSE(control.test(host.handle(), host.api(), kCentre, 100.0f, around(90.0f, 300.0f),
+    host.clearViewerRecords();
+    EXPECT_FALSE(control.test(host.handle(), &host.api(), kCentre, 100.0f, around(90.0f, 300.0f),
                               kUnitScale, 1.0f, 0.0f, 0));
     const bool sticky = hostId == 3000;
     EXPECT_EQ(control.hot, sticky ? 1 : 0) << hostId;
     EXPECT_EQ(control.grabPointerAngle == anchor, sticky) << hostId;
-    const auto& calls = host.calls();
-    EXPECT_EQ(std::count(calls.begin(), calls.end(), "Redraw()"), sticky ? 0 : 1) << hostId;
+    EXPECT_EQ(host.redrawCount(), sticky ? 0 : 1) << hostId;
     EXPECT_TRUE(param.written.empty()) << "a button-up move never drags";
   }
 }

@@ -11,7 +11,7 @@
 #include "geometry/cut_model.h"
 #include "geometry/cut_segments.h"
 #include "geometry/region_partition.h"
-#include "support/param_host.h"
+#include "support/in_memory_host.h"
 
 namespace veltrane {
 namespace {
@@ -28,10 +28,10 @@ struct Random {
 
 // Writes a random layout into the host's parameters. Positions and angles often repeat earlier
 // ones or share a coordinate with them, so that cuts start on, run along or duplicate others.
-void writeLayout(Random& random, testsupport::ParamHost& host, genVec2 frame, bool radial) {
+void writeLayout(Random& random, testsupport::InMemoryHost& host, genVec2 frame, bool radial) {
   const int count = 1 + random.below(kMaxCuts);
   host.setInt(param::kNumberOfCuts, count);
-  host.setChoice(param::kCutType, radial ? kCutTypeRadial : 0);
+  host.setInt(param::kCutType, radial ? kCutTypeRadial : 0);
   host.setPoint(param::kCutPositionGlobal, random.between(-0.6, 0.6) * frame.x,
                 random.between(-0.6, 0.6) * frame.y);
   std::vector<genVec2> positions;
@@ -48,7 +48,7 @@ void writeLayout(Random& random, testsupport::ParamHost& host, genVec2 frame, bo
     positions.push_back(p);
     angles.push_back(degrees);
     host.setPoint(cutParamId(param::kCutPositionPrefix, i), p.x, p.y);
-    host.setAngle(cutParamId(param::kCutDirectionPrefix, i), degrees);
+    host.set(cutParamId(param::kCutDirectionPrefix, i), degrees);
   }
 }
 
@@ -118,14 +118,15 @@ std::string brokenInvariant(Random& random, genVec2 frame, bool radial, const Cu
 
 TEST(GeometryProperties, RandomLayoutsTileTheFrame) {
   Random random{std::mt19937(20240611)};
-  testsupport::ParamHost host;
+  testsupport::InMemoryHost host;
   for (int i = 0; i < 10000; ++i) {
     const bool tiny = random.chance(0.1);
     const genVec2 frame{float(1 + random.below(tiny ? 4 : 8192)),
                         float(1 + random.below(tiny ? 4 : 4320))};
     const bool radial = random.chance(0.5);
+    host.clearCallLog();
     writeLayout(random, host, frame, radial);
-    const CutList cuts = readCutList(host.handle(), host.api(), 0, frame, false, 1.0f);
+    const CutList cuts = readCutList(host.handle(), host.record(), 0, frame, false, 1.0f);
     ASSERT_FALSE(cuts.empty());
     const RegionList regions = partitionFrame(cuts, frame, radial ? kCutTypeRadial : 0);
     const std::string broken =

@@ -5,7 +5,7 @@
 
 #include "effect/param_ids.h"
 #include "geometry/angles.h"
-#include "support/param_host.h"
+#include "support/in_memory_host.h"
 
 namespace veltrane {
 namespace {
@@ -14,10 +14,10 @@ class InputTransform : public ::testing::Test {
  protected:
   void place(int input, float tx, float ty, float scale, float degrees) {
     host.setPoint(inputParamId(param::kInputFrameTranslationPrefix, input), tx, ty);
-    host.setFloat(inputParamId(param::kInputFrameScalePrefix, input), scale);
-    host.setAngle(inputParamId(param::kInputFrameRotationPrefix, input), degrees);
+    host.set(inputParamId(param::kInputFrameScalePrefix, input), scale);
+    host.set(inputParamId(param::kInputFrameRotationPrefix, input), degrees);
   }
-  testsupport::ParamHost host;
+  testsupport::InMemoryHost host;
 };
 
 TEST_F(InputTransform, SamplingFromParameters) {
@@ -40,7 +40,7 @@ TEST_F(InputTransform, SamplingFromParameters) {
   };
   for (const auto& c : cases) {
     place(3, c.tx, c.ty, c.scale, c.degrees);
-    const InputSampling s = readInputSampling(host.handle(), host.api(), 0, c.width, c.height,
+    const InputSampling s = readInputSampling(host.handle(), host.record(), 0, c.width, c.height,
                                               c.aspectPresent, c.aspect, 3);
     EXPECT_FLOAT_EQ(s.sampleOffset.x, c.offsetX) << c.what;
     EXPECT_FLOAT_EQ(s.sampleOffset.y, c.offsetY) << c.what;
@@ -55,7 +55,7 @@ TEST_F(InputTransform, QuarterTurnPointsThePictureUpAlongPlusX) {
   // In a 2:1 frame the turn is true on screen: the middle of the picture's top edge lands half
   // a picture height, a quarter of the frame width, right of the centre.
   place(0, 0, 0, 100, 90);
-  const InputSampling s = readInputSampling(host.handle(), host.api(), 0, 200, 100, false, 1, 0);
+  const InputSampling s = readInputSampling(host.handle(), host.record(), 0, 200, 100, false, 1, 0);
   const auto picture = inputTextureCoordinate(s, {0.75f, 0.5f});
   EXPECT_NEAR(picture.x, 0.5f, 1e-6f);
   EXPECT_NEAR(picture.y, 1.0f, 1e-6f);
@@ -71,14 +71,14 @@ TEST_F(InputTransform, ControlRectangleAndRotation) {
   };
   for (const auto& c : cases) {
     place(8, c.tx, c.ty, c.scale, 0);
-    const auto rect = inputControlRect(host.handle(), host.api(), 0, {1920, 1080}, 8);
+    const auto rect = inputControlRect(host.handle(), host.record(), 0, {1920, 1080}, 8);
     EXPECT_FLOAT_EQ(rect.x, c.x0);
     EXPECT_FLOAT_EQ(rect.y, c.y0);
     EXPECT_FLOAT_EQ(rect.z, c.x1);
     EXPECT_FLOAT_EQ(rect.w, c.y1);
   }
   place(8, 0, 0, 100, 450);
-  EXPECT_FLOAT_EQ(inputRotationRadians(host.handle(), host.api(), 0, 8), 2.5f * kPi);
+  EXPECT_FLOAT_EQ(inputRotationRadians(host.handle(), host.record(), 0, 8), 2.5f * kPi);
 }
 
 }  // namespace

@@ -8,7 +8,7 @@
 
 #include "geometry/border_mesh.h"
 #include "gl/render_target.h"
-#include "gl_layer_test.h"
+#include "support/gl_host.h"
 
 namespace {
 
@@ -30,7 +30,7 @@ float distanceToSegment(float px, float py, const Segment& s) {
   return std::hypot(px - (s.x0 + t * dx), py - (s.y0 + t * dy));
 }
 
-class DistanceField : public gltest::GlLayerTest {
+class DistanceField : public testsupport::GlHostTest {
  protected:
   void SetUp() override {}  // each case starts its own host, in the profile it needs
 

@@ -9,8 +9,8 @@
 #include "gl/render_target.h"
 #include "gl/texture_units.h"
 #include "gl/textured_quad.h"
-#include "gl_layer_test.h"
 #include "shaders/shader_identifiers.h"
+#include "support/gl_host.h"
 
 namespace {
 
@@ -20,10 +20,10 @@ namespace ids = veltrane::shader_ids;
 constexpr int kWidth = 64;
 constexpr int kHeight = 36;
 
-class EffectStagePixels : public gltest::GlLayerTest {
+class EffectStagePixels : public testsupport::GlHostTest {
  protected:
   void SetUp() override {
-    GlLayerTest::SetUp();
+    GlHostTest::SetUp();
     buildPrograms();
   }
 

@@ -10,14 +10,14 @@
 #include "gl/render_target.h"
 #include "gl/texture_units.h"
 #include "gl/textured_quad.h"
-#include "gl_layer_test.h"
 #include "shaders/shader_identifiers.h"
+#include "support/gl_host.h"
 
 namespace {
 
 using namespace veltrane;
 
-using RenderTargets = gltest::GlLayerTest;
+using RenderTargets = testsupport::GlHostTest;
 
 TEST_F(RenderTargets, TemplateFollowsTheTextureFormatMode) {
   context_.output.scaleX = 2.0f;
@@ -91,7 +91,7 @@ TEST_F(RenderTargets, AttachingALevelSetsTheViewportToItsSize) {
   EXPECT_EQ(static_cast<GLuint>(attached), target.texture.id);
 }
 
-using TexturedDraw = gltest::GlLayerTest;
+using TexturedDraw = testsupport::GlHostTest;
 
 // The frame quad over the image part of a larger source texture, drawn through the copy
 // program, reproduces that image texel for texel: positions reach attribute 0, texture

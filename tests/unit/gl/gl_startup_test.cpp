@@ -10,14 +10,14 @@
 #include <fstream>
 #include <string>
 
-#include "gl_layer_test.h"
 #include "shaders/control_shaders.h"
 #include "shaders/effect_shaders.h"
+#include "support/gl_host.h"
 #include "support/temp_paths.h"
 
 namespace {
 
-using GlStartup = gltest::GlLayerTest;
+using GlStartup = testsupport::GlHostTest;
 
 TEST_F(GlStartup, BuildsTheProgramsInTheirFixedOrderAndOnlyTheHelpersOnce) {
   const char* const order[] = {"splitScreen",

@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "gl/effect_data.h"
-#include "gl_layer_test.h"
+#include "support/gl_host.h"
 
 namespace {
 
@@ -45,7 +45,7 @@ std::string compileLog(GLenum type, const std::string& source) {
   return log;
 }
 
-using ProgramRegistry = gltest::GlLayerTest;
+using ProgramRegistry = testsupport::GlHostTest;
 
 TEST_F(ProgramRegistry, WarningsArePrintedOnceAndOnlyWhenVerbose) {
   const std::string vertexLog = compileLog(GL_VERTEX_SHADER, kWarningVertex);

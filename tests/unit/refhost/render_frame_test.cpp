@@ -5,8 +5,8 @@
 #include <GL/glew.h>
 #include <gtest/gtest.h>
 
-#include "gl_host_test.h"
 #include "refhost/composition.h"
+#include "support/gl_host.h"
 
 namespace refhost {
 namespace {
@@ -46,7 +46,7 @@ TEST(RenderFrame, MillisecondsFollowTheFrameRate) {
   }
 }
 
-using RenderFrameWithGl = GlHostTest;
+using RenderFrameWithGl = testsupport::GlHostTest;
 
 TEST_F(RenderFrameWithGl, ContextDescribesTheFrameAndItsTextures) {
   Composition composition;
@@ -56,14 +56,14 @@ TEST_F(RenderFrameWithGl, ContextDescribesTheFrameAndItsTextures) {
   composition.duration = 90;
   composition.pixelAspect = 2.0f;
   composition.source = MediaSpec::ofPattern(Pattern::Counter);
-  InstalledComposition installed = installComposition(host, composition);
+  InstalledComposition installed = installComposition(host(), composition);
   EXPECT_EQ(installed.sourceFrameCount, 90);
-  ASSERT_EQ(host.layers().size(), 1u);  // the own layer
-  EXPECT_EQ(host.layers()[0].guid, kDefaultOwnLayerGuid);
-  EXPECT_EQ(host.timeInfo().frameRate, 30.0);
+  ASSERT_EQ(host().layers().size(), 1u);  // the own layer
+  EXPECT_EQ(host().layers()[0].guid, kDefaultOwnLayerGuid);
+  EXPECT_EQ(host().timeInfo().frameRate, 30.0);
 
   FrameSettings settings{64, 36, 30.0, 2.0f, 90, composition.ownLayerGuid};
-  RenderFrame frame(host, settings, 45);
+  RenderFrame frame(host(), settings, 45);
   const WispRenderContext& c = frame.context();
   EXPECT_EQ(c.time, 45);
   EXPECT_EQ(c.frameNumber, 45u);
@@ -82,20 +82,20 @@ TEST_F(RenderFrameWithGl, ContextDescribesTheFrameAndItsTextures) {
     EXPECT_EQ(texture->s1, 1.0f);
     EXPECT_EQ(texture->t1, 1.0f);
   }
-  EXPECT_EQ(host.outstandingTextures(), 0);  // the host's, not the plug-in's
+  EXPECT_EQ(host().outstandingTextures(), 0);  // the host's, not the plug-in's
 
   RgbaImage source;
   source.width = 64;
   source.height = 36;
-  source.pixels = flipRows(host.readTexture(c.source.id, 64, 36), 64, 36);
+  source.pixels = flipRows(host().readTexture(c.source.id, 64, 36), 64, 36);
   EXPECT_EQ(readCounterCode(source), 45);
 }
 
 // What the plug-in leaves in the output texture comes back with the frame's top edge first.
 TEST_F(RenderFrameWithGl, OutputReadsBackUpright) {
-  host.setSourceFrames(frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient))));
+  host().setSourceFrames(frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient))));
   FrameSettings settings{64, 36, 25.0, 1.0f, 1, kDefaultOwnLayerGuid};
-  RenderFrame frame(host, settings, 0);
+  RenderFrame frame(host(), settings, 0);
   const WispRenderContext& c = frame.context();
   glCopyImageSubData(c.source.id, GL_TEXTURE_2D, 0, 0, 0, 0, c.output.id, GL_TEXTURE_2D, 0, 0, 0, 0,
                      64, 36, 1);
@@ -116,21 +116,21 @@ TEST_F(RenderFrameWithGl, LayersComeFromTheirMedia) {
   counter.layer.height = 18;
   counter.media = MediaSpec::ofPattern(Pattern::Counter);
   composition.layers.push_back(counter);
-  installComposition(host, composition);
-  ASSERT_EQ(host.layers().size(), 2u);
-  EXPECT_EQ(host.layers()[1].name, "Counter");
+  installComposition(host(), composition);
+  ASSERT_EQ(host().layers().size(), 2u);
+  EXPECT_EQ(host().layers()[1].name, "Counter");
 
   TextureRecord texture{};
-  ASSERT_EQ(
-      host.api().RenderLayerFrame(host.handle(), nullptr, counter.layer.guid.c_str(), 7, &texture),
-      0);
+  ASSERT_EQ(host().api().RenderLayerFrame(host().handle(), nullptr, counter.layer.guid.c_str(), 7,
+                                          &texture),
+            0);
   EXPECT_EQ(texture.imageWidth, 32);
   RgbaImage picture;
   picture.width = 32;
   picture.height = 18;
-  picture.pixels = flipRows(host.readTexture(texture.id, 32, 18), 32, 18);
+  picture.pixels = flipRows(host().readTexture(texture.id, 32, 18), 32, 18);
   EXPECT_EQ(readCounterCode(picture), 7);
-  host.api().ReleaseTexture(host.handle(), nullptr, texture.id);
+  host().api().ReleaseTexture(host().handle(), nullptr, texture.id);
 }
 
 }  // namespace

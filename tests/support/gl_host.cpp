@@ -1,13 +1,13 @@
-// The GL-layer test fixture: host start-up and the checks every GL test ends with.
-#include "gl_layer_test.h"
+// The GL host fixture: host start-up and the checks every GL test ends with.
+#include "support/gl_host.h"
 
 #include <cstdlib>
 
 #include "render/gl_startup.h"
 
-namespace gltest {
+namespace testsupport {
 
-bool GlLayerTest::startHost(refhost::GlProfile profile, int width, int height) {
+bool GlHostTest::startHost(refhost::GlProfile profile, int width, int height) {
   // Mesa keeps compiled shaders on disk and, on a hit, skips the compile and its info log; the
   // tests of printed logs need every compile to speak. Read when the driver starts.
   setenv("MESA_SHADER_CACHE_DISABLE", "true", 1);
@@ -35,7 +35,7 @@ bool GlLayerTest::startHost(refhost::GlProfile profile, int width, int height) {
   return true;
 }
 
-void GlLayerTest::finishHost() {
+void GlHostTest::finishHost() {
   if (!host_ || !host_->gl()) return;
   registry_.reset();
   for (GLuint id : textures_) glDeleteTextures(1, &id);
@@ -48,15 +48,15 @@ void GlLayerTest::finishHost() {
   host_.reset();
 }
 
-void GlLayerTest::buildPrograms() {
+void GlHostTest::buildPrograms() {
   registry_ = std::make_unique<veltrane::EffectData>();
   api()->pluginData = registry_.get();
   veltrane::prepareGl(handle(), api());
 }
 
-TextureRecord GlLayerTest::makeTexture(int imageWidth, int imageHeight, int allocatedWidth,
-                                       int allocatedHeight, GLenum internalFormat,
-                                       const std::vector<float>& rgba) {
+TextureRecord GlHostTest::makeTexture(int imageWidth, int imageHeight, int allocatedWidth,
+                                      int allocatedHeight, GLenum internalFormat,
+                                      const std::vector<float>& rgba) {
   GLuint id = 0;
   glGenTextures(1, &id);
   glBindTexture(GL_TEXTURE_2D, id);
@@ -76,14 +76,14 @@ TextureRecord GlLayerTest::makeTexture(int imageWidth, int imageHeight, int allo
   return record;
 }
 
-std::vector<float> GlLayerTest::readImage(const TextureRecord& texture) {
+std::vector<float> GlHostTest::readImage(const TextureRecord& texture) {
   glFramebufferTexture2D(GL_FRAMEBUFFER, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D, texture.id, 0);
   std::vector<float> pixels(static_cast<size_t>(texture.imageWidth * texture.imageHeight * 4));
   glReadPixels(0, 0, texture.imageWidth, texture.imageHeight, GL_RGBA, GL_FLOAT, pixels.data());
   return pixels;
 }
 
-void GlLayerTest::forgetCompileErrors(const std::string& compileLog) {
+void GlHostTest::forgetCompileErrors(const std::string& compileLog) {
   std::vector<refhost::GlDebugMessage> others;
   for (const auto& error : host_->gl()->errors()) {
     if (compileLog.find(error.text) == std::string::npos) others.push_back(error);
@@ -92,4 +92,4 @@ void GlLayerTest::forgetCompileErrors(const std::string& compileLog) {
   for (const auto& error : others) ADD_FAILURE() << "GL error: " << error.text;
 }
 
-}  // namespace gltest
+}  // namespace testsupport

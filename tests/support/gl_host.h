@@ -1,6 +1,6 @@
-// Fixture of the GL-layer tests: a reference host with a headless context, its framebuffer
-// bound and a render context of a small frame. A test fails (never skips) without a context,
-// and fails on any GL error, host problem or texture or buffer not given back.
+// The GL host of the unit tests: the reference host (no module) with a headless context, its
+// framebuffer bound and a render context of a small frame. A test fails (never skips) without a
+// context, and fails on any GL error, host problem or texture or buffer not given back.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -12,9 +12,9 @@
 #include "gl/effect_data.h"
 #include "refhost/host.h"
 
-namespace gltest {
+namespace testsupport {
 
-class GlLayerTest : public ::testing::Test {
+class GlHostTest : public ::testing::Test {
  protected:
   void SetUp() override { ASSERT_TRUE(startHost(refhost::GlProfile::Core, 64, 36)); }
   void TearDown() override { finishHost(); }
@@ -36,6 +36,7 @@ class GlLayerTest : public ::testing::Test {
   // fails a compile on purpose forgets exactly those.
   void forgetCompileErrors(const std::string& compileLog);
 
+  refhost::Host& host() { return *host_; }
   tagWispAPI* api() { return &host_->api(); }
   WispHost* handle() { return host_->handle(); }
 
@@ -46,4 +47,4 @@ class GlLayerTest : public ::testing::Test {
   std::vector<GLuint> textures_;
 };
 
-}  // namespace gltest
+}  // namespace testsupport

@@ -1,0 +1,322 @@
+// The host's parameter panel as the plug-in's calls build and use it: declaration and its call
+// log, refused calls, keyframed values, undo steps, and the viewer requests the host records.
+#include <gtest/gtest.h>
+
+#include <cmath>
+
+#include "refhost/host.h"
+#include "refhost/text.h"
+
+namespace refhost {
+namespace {
+
+const char* const kLayerA = "11111111-2222-3333-4444-555555555555";
+const char* const kLayerB = "aaaaaaaa-bbbb-cccc-dddd-eeeeeeeeeeee";
+
+// One parameter of every kind, two of them in nested groups, in the plug-in's style.
+class HostPanel : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    int32_t second = 1;
+    const int32_t results[] = {
+        api.AddChoiceParam(h, L"Preset", "c", 98, L"A|B|C", &second, 0),
+        api.BeginParamGroup(h, L"Cuts"),
+        api.AddFloatParam(h, L"Width", L"px", "f", 3, 0, 200, 2, 1),
+        api.BeginParamGroup(h, L"Cut 1"),
+        api.AddAngleParam(h, L"Direction", "a", 17, 1, 225),
+        api.EndParamGroup(h),
+        api.EndParamGroup(h),
+        api.AddIntParam(h, L"Count", L"", "i", 0, 1, 8, 1),
+        api.AddBoolParam(h, L"Show", "b", 1, 0),
+        api.AddPointParam(h, L"Position", "p", 1, 0, 0),
+        api.AddColorParam(h, L"Color", "col", 1, 0, 0, 0),
+        api.AddLayerParam(h, L"Layer", "l", 1),
+    };
+    for (int32_t result : results) ASSERT_EQ(result, 0);
+  }
+
+  // Reads a parameter through the operation the plug-in would use for its kind, as text.
+  std::string read(const std::string& id, int32_t time) {
+    const char* name = id.c_str();
+    switch (host.param(id).kind) {
+      case ParamKind::Float:
+        return formatValue(ParamKind::Float, ParamValue::ofFloat(api.GetFloatParam(h, name, time)));
+      case ParamKind::Angle:
+        return formatValue(ParamKind::Angle, ParamValue::ofFloat(api.GetAngleParam(h, name, time)));
+      case ParamKind::Int:
+        return std::to_string(api.GetIntParam(h, name, time));
+      case ParamKind::Bool:
+        return std::to_string(api.GetBoolParam(h, name, time));
+      case ParamKind::Choice:
+        return std::to_string(api.GetChoiceParam(h, name, time));
+      case ParamKind::Point: {
+        float x = -1, y = -1;
+        api.GetPointParam(h, name, time, &x, &y);
+        return formatValue(ParamKind::Point, ParamValue::ofPoint(x, y));
+      }
+      case ParamKind::Color: {
+        float r = -1, g = -1, b = -1;
+        api.GetColorParam(h, name, time, &r, &g, &b);
+        return formatValue(ParamKind::Color, ParamValue::ofColor(r, g, b));
+      }
+      case ParamKind::Layer: {
+        char buffer[40] = "garbage";
+        api.GetLayerParam(h, name, time, buffer);
+        return buffer;
+      }
+    }
+    return "";
+  }
+  std::vector<ParamState> snapshot() const {
+    std::vector<ParamState> states;
+    for (const Param& param : host.panel().params()) states.push_back(param.state);
+    return states;
+  }
+
+  Host host;
+  tagWispAPI& api = host.api();
+  WispHost* h = host.handle();
+};
+
+TEST_F(HostPanel, HoldsExactlyWhatWasDeclaredAndLogsEveryCall) {
+  const ParamPanel& panel = host.panel();
+  ASSERT_EQ(panel.params().size(), 8u);
+  ASSERT_EQ(panel.groups().size(), 2u);
+  EXPECT_EQ(panel.openGroupDepth(), 0);
+  const Param& choice = host.param("c");
+  EXPECT_EQ(choice.choices, (std::vector<std::string>{"A", "B", "C"}));
+  EXPECT_EQ(choice.defaultValue.integer, 1);
+  EXPECT_TRUE(panel.groupPath(choice).empty());
+  const Param& width = host.param("f");
+  EXPECT_EQ(width.displayName, "Width");
+  EXPECT_EQ(width.unit, "px");
+  EXPECT_EQ(width.maximum, 200.0);
+  EXPECT_EQ(width.precision, 1);
+  EXPECT_EQ(panel.groupPath(width), std::vector<std::string>{"Cuts"});
+  const Param& angle = host.param("a");
+  EXPECT_EQ(angle.extra, 1);
+  EXPECT_EQ(angle.flags, 17);
+  EXPECT_EQ(panel.groupPath(angle), (std::vector<std::string>{"Cuts", "Cut 1"}));
+  EXPECT_EQ(read("a", 0), "225");
+
+  // The flag bit 0x2 starts a parameter disabled; SetParamEnabled then decides.
+  EXPECT_FALSE(host.isEnabled("c"));
+  EXPECT_FALSE(host.isEnabled("f"));
+  EXPECT_TRUE(host.isEnabled("l"));
+  uint8_t on = 1, off = 0;
+  api.SetParamEnabled(h, "f", &on);
+  api.SetParamEnabled(h, "l", &off);
+  EXPECT_TRUE(host.isEnabled("f"));
+  EXPECT_FALSE(host.isEnabled("l"));
+
+  const std::vector<std::string> firstCalls(host.callLog().begin(), host.callLog().begin() + 6);
+  EXPECT_EQ(firstCalls, (std::vector<std::string>{
+                            "AddChoiceParam \"Preset\" c 98 \"A|B|C\" 1 0",
+                            "BeginParamGroup \"Cuts\"",
+                            "AddFloatParam \"Width\" \"px\" f 3 0 200 2 1",
+                            "BeginParamGroup \"Cut 1\"",
+                            "AddAngleParam \"Direction\" a 17 1 225",
+                            "EndParamGroup",
+                        }));
+  EXPECT_EQ(host.callsTo("SetParamEnabled"),
+            (std::vector<std::string>{"SetParamEnabled f 1", "SetParamEnabled l 0"}));
+}
+
+TEST_F(HostPanel, RefusesTheArmedCallDuplicatesAndUnbalancedGroups) {
+  // Counting restarts when the failure is armed, and later calls succeed again.
+  host.failDeclarationCall(2);
+  EXPECT_EQ(api.AddBoolParam(h, L"A", "x", 0, 0), 0);
+  EXPECT_NE(api.AddBoolParam(h, L"B", "y", 0, 0), 0);
+  EXPECT_EQ(api.AddBoolParam(h, L"C", "z", 0, 0), 0);
+  EXPECT_EQ(host.declarationCallCount(), 3);
+  EXPECT_EQ(host.panel().find("y"), nullptr);
+  EXPECT_TRUE(host.problems().empty());
+
+  EXPECT_NE(api.AddIntParam(h, L"Again", L"", "i", 0, 1, 8, 1), 0);
+  EXPECT_NE(api.EndParamGroup(h), 0);
+  EXPECT_NE(api.AddLayerParam(h, L"No id", nullptr, 0), 0);
+  EXPECT_EQ(host.param("i").displayName, "Count");
+  EXPECT_EQ(host.problems().size(), 3u);
+}
+
+TEST_F(HostPanel, InterpolatesContinuousKindsAndHoldsDiscreteOnes) {
+  const struct {
+    const char* id;
+    ParamValue at10, at20;
+  } keys[] = {
+      {"f", ParamValue::ofFloat(0), ParamValue::ofFloat(100)},
+      {"i", ParamValue::ofInt(1), ParamValue::ofInt(8)},
+      {"b", ParamValue::ofInt(0), ParamValue::ofInt(1)},
+      {"c", ParamValue::ofInt(2), ParamValue::ofInt(0)},
+      {"p", ParamValue::ofPoint(-10, 4), ParamValue::ofPoint(10, 8)},
+      {"a", ParamValue::ofFloat(90), ParamValue::ofFloat(-270)},
+      {"col", ParamValue::ofColor(0, 1, 0.5f), ParamValue::ofColor(1, 0, 0.5f)},
+      {"l", ParamValue::ofLayer(kLayerA), ParamValue::ofLayer(kLayerB)},
+  };
+  for (const auto& key : keys) {
+    host.setKeyframe(key.id, 10, key.at10);
+    host.setKeyframe(key.id, 20, key.at20);
+  }
+  const struct {
+    const char* id;
+    int32_t time;
+    std::string expected;
+  } cases[] = {
+      {"f", 5, "0"},
+      {"f", 12, "20"},
+      {"f", 99, "100"},
+      {"a", 15, "-90"},
+      {"a", 11, "54"},
+      {"p", 15, "(0, 6)"},
+      {"p", 0, "(-10, 4)"},
+      {"i", 19, "1"},
+      {"i", 20, "8"},
+      {"i", -5, "1"},
+      {"b", 19, "0"},
+      {"b", 20, "1"},
+      {"c", 15, "2"},
+      {"c", 25, "0"},
+      {"l", 19, kLayerA},
+      {"l", 20, kLayerB},
+      {"col", 15, "(0.5, 0.5, 0.5)"},
+  };
+  for (const auto& c : cases) EXPECT_EQ(read(c.id, c.time), c.expected) << c.id << " @" << c.time;
+
+  // A plug-in edit of an animated parameter adds a keyframe; of a static one sets the value.
+  api.SetFloatParam(h, "f", 15, 10, 0);
+  EXPECT_EQ(host.param("f").state.keyframes.size(), 3u);
+  EXPECT_EQ(read("f", 12), "4");
+  host.clearKeyframes("i");
+  api.SetIntParam(h, "i", 50, 7, 0);
+  EXPECT_TRUE(host.param("i").state.keyframes.empty());
+  EXPECT_EQ(read("i", -1000), "7");
+  EXPECT_TRUE(host.problems().empty());
+}
+
+TEST_F(HostPanel, StoresWhatItIsGivenAndReportsMisuse) {
+  // Values outside the declared range are stored as given: the plug-in must cope with them.
+  host.setValue("i", ParamValue::ofInt(-3));
+  host.setValue("f", ParamValue::ofFloat(NAN));
+  EXPECT_EQ(read("i", 7), "-3");
+  EXPECT_TRUE(std::isnan(api.GetFloatParam(h, "f", 0)));
+  EXPECT_EQ(read("l", 0), kNoLayer);
+
+  // Unknown ids and kind mismatches read zero values, write nothing and are reported.
+  EXPECT_EQ(api.GetIntParam(h, "nope", 0), 0);
+  EXPECT_EQ(api.GetChoiceParam(h, "i", 0), 0);
+  float x = 3, y = 3;
+  api.GetPointParam(h, nullptr, 0, &x, &y);
+  EXPECT_EQ(x + y, 0.0f);
+  char guid[40];
+  api.GetLayerParam(h, "missing", 0, guid);
+  EXPECT_STREQ(guid, kNoLayer);
+  api.SetFloatParam(h, "i", 0, 1.5f, 0);
+  EXPECT_EQ(host.valueAt("i", 0).integer, -3);
+  EXPECT_EQ(host.problems().size(), 5u);
+  EXPECT_EQ(host.callLog().back(), "SetFloatParam i 0 1.5 0");
+  EXPECT_THROW(host.setValue("typo", ParamValue::ofInt(1)), std::out_of_range);
+}
+
+TEST_F(HostPanel, UndoAndRedoRestoreExactStatesAcrossSteps) {
+  host.setKeyframe("a", 0, ParamValue::ofFloat(0));
+  host.setKeyframe("a", 100, ParamValue::ofFloat(90));
+  std::vector<std::vector<ParamState>> history{snapshot()};
+
+  // Step 1: two edits of the same point and a width: one step, the first state kept.
+  const float x1 = 10, y1 = 20, x2 = -0.0f, y2 = NAN;
+  api.BeginUndo(h, "Move Cut");
+  api.SetPointParam(h, "p", 0, &x1, &y1, 0);
+  api.SetPointParam(h, "p", 0, &x2, &y2, 0);
+  api.SetFloatParam(h, "f", 0, 7.25f, 0);
+  api.EndUndo(h);
+  history.push_back(snapshot());
+  // Step 2: a nested bracket joins the outer step; the animated angle gains a keyframe.
+  api.BeginUndo(h, "Rotate Cut");
+  api.SetAngleParam(h, "a", 50, 1e30f, 0);
+  api.BeginUndo(h, "inner");
+  api.SetLayerParam(h, "l", 0, kLayerA, 0);
+  api.EndUndo(h);
+  api.EndUndo(h);
+  history.push_back(snapshot());
+  // Step 3: a bracket without edits is still a step.
+  api.BeginUndo(h, "Select");
+  api.EndUndo(h);
+  history.push_back(snapshot());
+
+  EXPECT_EQ(host.undoStepNames(), (std::vector<std::string>{"Move Cut", "Rotate Cut", "Select"}));
+  EXPECT_TRUE(host.immediateEdits().empty());
+  for (int step = 3; step > 0; --step) {
+    ASSERT_TRUE(host.undo());
+    EXPECT_EQ(snapshot(), history[static_cast<std::size_t>(step - 1)]) << "undoing " << step;
+  }
+  EXPECT_FALSE(host.undo());
+  for (std::size_t step = 1; step <= 3; ++step) {
+    ASSERT_TRUE(host.redo());
+    EXPECT_EQ(snapshot(), history[step]) << "redoing " << step;
+  }
+  EXPECT_FALSE(host.redo());
+  EXPECT_TRUE(std::isnan(host.valueAt("p", 0).number[1]));
+  EXPECT_TRUE(std::signbit(host.valueAt("p", 0).number[0]));
+}
+
+TEST_F(HostPanel, NewStepDropsRedoAndEditsOutsideBracketsAreImmediate) {
+  api.BeginUndo(h, "First");
+  api.SetFloatParam(h, "f", 0, 5, 0);
+  api.EndUndo(h);
+  ASSERT_TRUE(host.undo());
+
+  api.SetLayerParam(h, "l", 4, kLayerB, 0);
+  ASSERT_EQ(host.immediateEdits().size(), 1u);
+  EXPECT_EQ(host.immediateEdits()[0].id, "l");
+  EXPECT_EQ(host.immediateEdits()[0].time, 4);
+  EXPECT_EQ(host.immediateEdits()[0].value, kLayerB);
+  EXPECT_EQ(host.redoStepNames(), std::vector<std::string>{"First"});  // immediate edits keep it
+
+  api.BeginUndo(h, "Second");
+  api.SetFloatParam(h, "f", 0, 9, 0);
+  api.EndUndo(h);
+  EXPECT_EQ(host.undoStepNames(), std::vector<std::string>{"Second"});
+  EXPECT_FALSE(host.redo());
+
+  // Undo is refused while the plug-in holds a bracket open (a drag in progress).
+  api.BeginUndo(h, "Drag");
+  EXPECT_FALSE(host.undo());
+  api.EndUndo(h);
+  api.EndUndo(h);  // unbalanced
+  EXPECT_EQ(host.problems(), std::vector<std::string>{"EndUndo without BeginUndo"});
+}
+
+TEST(HostViewerRecords, RecordsRequestsAndAnswersAsConfigured) {
+  Host host;
+  tagWispAPI& api = host.api();
+  WispHost* h = host.handle();
+  host.queuePopupAnswer(2);
+  EXPECT_EQ(api.ShowPopupMenu(h, "A|B|C"), 2);
+  EXPECT_EQ(api.ShowPopupMenu(h, ""), -1);  // no answer left: dismissed
+  const uint32_t frames[] = {12, 12};
+  api.SetCursor(h, 3);
+  api.Redraw(h, 0);
+  api.RequestFrames(h, 2, frames);
+  api.RequestLayerFrames(h, kLayerA, 2, frames);
+  EXPECT_EQ(host.popupMenus(), (std::vector<std::string>{"A|B|C", ""}));
+  EXPECT_EQ(host.cursorShapes(), std::vector<int32_t>{3});
+  EXPECT_EQ(host.redrawCount(), 1);
+  ASSERT_EQ(host.frameRequests().size(), 2u);
+  EXPECT_EQ(host.frameRequests()[0].layerGuid, "");
+  EXPECT_EQ(host.frameRequests()[1].frames, (std::vector<uint32_t>{12, 12}));
+  EXPECT_EQ(host.callsTo("RequestLayerFrames"),
+            std::vector<std::string>{std::string("RequestLayerFrames ") + kLayerA + " 2 12 12"});
+  host.clearViewerRecords();
+  EXPECT_TRUE(host.cursorShapes().empty() && host.frameRequests().empty());
+
+  EXPECT_EQ(toUtf8(api.GetHostIdentifier(h)), "org.veltrane.refhost");
+  host.setHostId(6001);
+  host.setHostIdentifier(L"org.example.\u00e9dit");
+  EXPECT_EQ(api.GetHostId(h), 6001);
+  EXPECT_EQ(toUtf8(api.GetHostIdentifier(h)),
+            "org.example.\xC3\xA9"
+            "dit");
+}
+
+}  // namespace
+}  // namespace refhost
