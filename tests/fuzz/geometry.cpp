@@ -113,7 +113,10 @@ void runSplit(FuzzedDataProvider& data) {
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, std::size_t size) {
   FuzzedDataProvider data(bytes, size);
-  testsupport::InMemoryHost host;
+  // One host for every input, as a host keeps its values: what an input leaves unwritten keeps
+  // an earlier input's value.
+  static testsupport::InMemoryHost host;
+  host.setCallLogging(false);
   fillParameters(data, host);
   runEvent(data, host);
   runSplit(data);

@@ -76,40 +76,22 @@ class RenderFixture {
   // errors after the message.
   std::vector<uint8_t> render(Rgba sourceColour, int32_t frame = 10,
                               const refhost::FrameSource& sourceFrames = {}) {
-    const refhost::FrameSource source = sourceFrames ? sourceFrames : solidSource(sourceColour);
-    host_->setSourceFrames(source);
-    const std::vector<uint8_t> sourcePixels = source(frame, width_, height_);
-    WispRenderContext context{};
-    context.source = host_->createTexture(width_, height_, sourcePixels.data());
-    context.output = host_->createTexture(width_, height_);
-    context.second = context.output;
-    context.width = width_;
-    context.height = height_;
-    context.time = frame;
-    context.frameNumber = static_cast<uint32_t>(frame);
-    context.sourceFrameIndex = frame;
-    context.sourceFrameCount = 100;
-    context.pixelAspect = 1.0f;
-    const refhost::Matrix4 projection = refhost::pixelProjection(width_, height_);
-    std::copy(projection.begin(), projection.end(), context.projection);
-    for (int i = 0; i < 4; ++i) context.modelView[i * 5] = 1.0f;
-    context.ownLayerGuid = kOwnLayer;
-    for (int i = 0; i < 4; ++i) context.view.lens[i * 5] = context.view.view[i * 5] = 1.0f;
-    context.currentTimeMs = frame * 40;
-    context.layerTimeMs = frame * 40;
-    host_->setRenderContext(&context);
-    EXPECT_EQ(host_->send(12), 1);
-    EXPECT_EQ(host_->send(10), 1);
-    host_->setRenderContext(nullptr);
-    std::vector<uint8_t> pixels = host_->readTexture(context.output.id, width_, height_);
-    host_->deleteTexture(context.source.id);
-    host_->deleteTexture(context.output.id);
+    host_->setSourceFrames(sourceFrames ? sourceFrames : solidSource(sourceColour));
+    std::vector<uint8_t> pixels;
+    {
+      refhost::RenderFrame target(*host_, {width_, height_, 25.0, 1.0f, 100, kOwnLayer}, frame);
+      host_->setRenderContext(&target.context());
+      EXPECT_EQ(host_->send(12), 1);
+      EXPECT_EQ(host_->send(10), 1);
+      host_->setRenderContext(nullptr);
+      pixels = host_->readTexture(target.context().output.id, width_, height_);
+    }
     EXPECT_EQ(host_->outstandingTextures(), 0);
     EXPECT_EQ(host_->outstandingBuffers(), 0);
     for (const std::string& problem : host_->problems()) ADD_FAILURE() << "host: " << problem;
     host_->clearProblems();
-    EXPECT_TRUE(host_->gl()->errors().empty())
-        << host_->gl()->errors().size() << " GL errors, first: " << host_->gl()->errors()[0].text;
+    for (const auto& error : host_->gl()->errors()) ADD_FAILURE() << "GL error: " << error.text;
+    host_->gl()->clearErrors();
     return pixels;
   }
 

@@ -4,6 +4,7 @@
 #include <stdlib.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <stdexcept>
 #include <vector>
@@ -30,6 +31,21 @@ std::string makeTempDirectory(const std::string& prefix) {
   std::vector<char> path = pattern(prefix);
   if (!mkdtemp(path.data())) throw std::runtime_error("cannot create a temporary folder");
   return path.data();
+}
+
+ScratchDirectory::ScratchDirectory() : path_(makeTempDirectory("veltrane_test_")) {}
+
+ScratchDirectory::~ScratchDirectory() {
+  std::error_code ignored;
+  std::filesystem::remove_all(path_, ignored);
+}
+
+std::vector<std::string> ScratchDirectory::entries() const {
+  std::vector<std::string> names;
+  for (const auto& entry : std::filesystem::directory_iterator(path_))
+    names.push_back(entry.path().filename().string());
+  std::sort(names.begin(), names.end());
+  return names;
 }
 
 }  // namespace testsupport

@@ -1,4 +1,4 @@
-// Spawning the command line with redirected output, and scratch directories.
+// Spawning the command line with redirected output.
 #include "cli_runner.h"
 
 #include <fcntl.h>
@@ -7,8 +7,6 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <algorithm>
-#include <filesystem>
 #include <fstream>
 #include <sstream>
 
@@ -65,19 +63,4 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin) {
   unlink(outPath);
   unlink(errPath);
   return run;
-}
-
-ScratchDirectory::ScratchDirectory() { path_ = testsupport::makeTempDirectory("veltrane_test_"); }
-
-ScratchDirectory::~ScratchDirectory() {
-  std::error_code ignored;
-  std::filesystem::remove_all(path_, ignored);
-}
-
-std::vector<std::string> ScratchDirectory::entries() const {
-  std::vector<std::string> names;
-  for (const auto& entry : std::filesystem::directory_iterator(path_))
-    names.push_back(entry.path().filename().string());
-  std::sort(names.begin(), names.end());
-  return names;
 }

@@ -1,9 +1,12 @@
-// Runs the `veltrane` command line as a separate process and captures what it printed; plus a
-// scratch directory that removes itself.
+// Runs the `veltrane` command line as a separate process and captures what it printed.
 #pragma once
 
 #include <string>
 #include <vector>
+
+#include "support/temp_paths.h"
+
+using testsupport::ScratchDirectory;
 
 struct CliRun {
   int status = -1;  // exit status; -1 when the process did not exit normally
@@ -17,19 +20,3 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin = nullptr
 
 std::string slurp(const std::string& path);
 void writeText(const std::string& path, const std::string& text);
-
-class ScratchDirectory {
- public:
-  ScratchDirectory();
-  ~ScratchDirectory();
-  ScratchDirectory(const ScratchDirectory&) = delete;
-  ScratchDirectory& operator=(const ScratchDirectory&) = delete;
-
-  const std::string& path() const { return path_; }
-  std::string file(const std::string& name) const { return path_ + "/" + name; }
-  // Names of the entries, hidden ones included, sorted.
-  std::vector<std::string> entries() const;
-
- private:
-  std::string path_;
-};
