@@ -20,6 +20,8 @@ std::vector<float> segmentRecords(const std::vector<std::vector<float>>& points)
   return records;
 }
 
+// The field's exact values are checked on GL; here what a draw cannot show: the vertex order
+// of the band and the closing of each cap's rim on itself.
 TEST(BorderMesh, HorizontalSegmentGivesItsBandAndTwoCaps) {
   const std::vector<float> records = segmentRecords({{-10, 0, 10, 0}});
   const SegmentList segments{records.data(), 1};
@@ -30,37 +32,24 @@ TEST(BorderMesh, HorizontalSegmentGivesItsBandAndTwoCaps) {
       {0, 0, 0}, {-10, -3, 1}, {10, -3, 1}, {-10, 0, 0}, {10, 0, 0}, {-10, 3, 1}, {10, 3, 1}};
   ASSERT_EQ(strip.vertices.size(), expectedStrip.size());
   for (size_t i = 0; i < expectedStrip.size(); ++i) {
-    EXPECT_FLOAT_EQ(strip.vertices[i].x, expectedStrip[i][0]) << i;
-    EXPECT_FLOAT_EQ(strip.vertices[i].y, expectedStrip[i][1]) << i;
-    EXPECT_FLOAT_EQ(strip.vertices[i].value, expectedStrip[i][2]) << i;
+    const MeshVertex& v = strip.vertices[i];
+    EXPECT_EQ((std::vector<float>{v.x, v.y, v.value}), expectedStrip[i]) << i;
   }
   EXPECT_EQ(strip.indices, (std::vector<uint32_t>{0, 1, 2, 3, 4, 5, 6, 0}));
 
   const BorderMesh caps = buildCapMesh(segments, 3.0f, true);
   EXPECT_EQ(caps.mode, static_cast<uint32_t>(GL_TRIANGLE_FAN));
   EXPECT_TRUE(caps.restart);
-  ASSERT_EQ(caps.vertices.size(), 1u + 2 * 34);
   EXPECT_FLOAT_EQ(caps.vertices[0].x, -1e10f);
-  EXPECT_FLOAT_EQ(caps.vertices[1].x, -10);
-  EXPECT_FLOAT_EQ(caps.vertices[1].value, 0);
+  EXPECT_FLOAT_EQ(caps.vertices[1].x, -10);  // the first fan's centre, then its rim from -x
   EXPECT_FLOAT_EQ(caps.vertices[2].x, -13);
-  EXPECT_FLOAT_EQ(caps.vertices[2].y, 0);
-  for (size_t k = 2; k <= 34; ++k) {
-    const MeshVertex& rim = caps.vertices[k];
-    EXPECT_NEAR(std::hypot(rim.x + 10, rim.y), 3.0f, 1e-5f) << k;
-    EXPECT_FLOAT_EQ(rim.value, 1.0f);
-  }
   EXPECT_NEAR(caps.vertices[34].x, -13.0f, 1e-5f) << "the rim closes on itself";
   EXPECT_NEAR(caps.vertices[34].y, 0.0f, 1e-5f);
-  // Sixteen steps of pi/16 turn the first rim point half way round.
-  EXPECT_NEAR(caps.vertices[18].x, -7.0f, 1e-5f);
+  EXPECT_FLOAT_EQ(caps.vertices[35].x, 10) << "the end point's fan follows";
   std::vector<uint32_t> firstFan = {0};
   for (uint32_t i = 1; i <= 34; ++i) firstFan.push_back(i);
-  firstFan.insert(firstFan.end(), {2, 0});
-  EXPECT_EQ(std::vector<uint32_t>(caps.indices.begin(), caps.indices.begin() + 37), firstFan);
-  EXPECT_FLOAT_EQ(caps.vertices[35].x, 10) << "the end point's fan follows";
-  EXPECT_EQ(caps.indices.size(), 1u + 2 * 36);
-  EXPECT_EQ(caps.indices[37], 35u);
+  firstFan.insert(firstFan.end(), {2, 0, 35});
+  EXPECT_EQ(std::vector<uint32_t>(caps.indices.begin(), caps.indices.begin() + 38), firstFan);
   EXPECT_EQ(caps.indices.back(), 0u);
 }
 
@@ -149,20 +138,6 @@ TEST(PrimitiveRestartDecision, IntelHd4000IsRecognisedFromVendorOrRenderer) {
   for (const auto& c : cases) {
     EXPECT_EQ(isIntelHd4000(c.vendor, c.renderer), c.hd4000)
         << (c.vendor ? c.vendor : "(none)") << " / " << (c.renderer ? c.renderer : "(none)");
-  }
-
-  const struct {
-    bool listed, entryPoint;
-    const char* renderer;
-    bool usable;
-  } restart[] = {
-      {true, true, "Intel(R) HD Graphics 4000", false},
-      {true, true, "Intel(R) HD Graphics 4600", true},
-      {false, true, "Intel(R) HD Graphics 4600", false},
-      {true, false, "llvmpipe", false},
-  };
-  for (const auto& c : restart) {
-    EXPECT_EQ(restartAllowed(c.listed, c.entryPoint, "Intel", c.renderer), c.usable) << c.renderer;
   }
 }
 
