@@ -127,4 +127,23 @@ TEST(OverlayDrawing, AtMostOneHandleIsHighlighted) {
   EXPECT_NEAR(Viewer::maxAlpha(image, 95, 35, 110, 55), normal, 2);    // no longer highlighted
 }
 
+// Hovering one edge of the selected input's rectangle highlights that edge alone.
+TEST(OverlayDrawing, HoveredEdgeOfTheSelectedInputIsHighlighted) {
+  RenderFixture fixture(refhost::GlProfile::Core, kW, kH);
+  refhost::Host& host = fixture.host();
+  host.setValue("cutPosition_0", ParamValue::ofPoint(-60.0f, 0.0f));
+  host.setValue("cutDirection_0", ParamValue::ofFloat(0.0f));
+  host.setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
+  Viewer viewer(fixture);
+  viewer.pointer(1005, 100, 60, 1.0);  // select input 0; its rectangle is x 40..120, y 22.5..67.5
+  viewer.pointer(1006, 100, 60, 0.0);
+  const std::vector<uint8_t> idle = viewer.draw();
+  EXPECT_EQ(viewer.pointer(1004, 120, 45, 0.0), 1);  // on the right edge
+  const std::vector<uint8_t> hovered = viewer.draw();
+  const int right = Viewer::maxAlpha(hovered, 118, 25, 122, 31);
+  EXPECT_GT(right, Viewer::maxAlpha(idle, 118, 25, 122, 31));
+  EXPECT_EQ(Viewer::maxAlpha(hovered, 38, 25, 42, 31), Viewer::maxAlpha(idle, 38, 25, 42, 31));
+  EXPECT_EQ(Viewer::maxAlpha(hovered, 60, 20, 70, 25), Viewer::maxAlpha(idle, 60, 20, 70, 25));
+}
+
 }  // namespace

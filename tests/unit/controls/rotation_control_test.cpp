@@ -7,6 +7,7 @@
 #include <cmath>
 #include <vector>
 
+#include "controls/handle_math.h"
 #include "refhost/host.h"
 
 namespace {
@@ -63,6 +64,16 @@ TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
     EXPECT_EQ(control.hot, 1);
     EXPECT_EQ(lastCursor(host), c.cursor) << c.degrees;
   }
+}
+
+// Each rotate and resize cursor covers 45 degrees centred on its direction, upper bounds
+// included: the cursor turns exactly half way between two directions.
+TEST(RotationControl, CursorOctantsTurnHalfWayBetweenDirections) {
+  const std::pair<float, int> cases[] = {{0, 0},      {22.5f, 0},   {22.51f, 1},
+                                         {67.5f, 1},  {67.51f, 2},  {292.5f, 6},
+                                         {337.5f, 7}, {337.51f, 0}, {359.9f, 0}};
+  for (const auto& [degrees, octant] : cases)
+    EXPECT_EQ(veltrane::handle_math::octantOfDegrees(degrees), octant) << degrees;
 }
 
 TEST(RotationControl, HitAreaFollowsTheHandleModeAndSize) {

@@ -98,6 +98,19 @@ TEST_F(CutModel, WrapsAnyAngleInBoundedTime) {
   }
 }
 
+TEST(Angles, WrapIntoRangeKeepsBothEndsOfTheRange) {
+  const struct {
+    float alpha, start, end, wrapped;
+  } cases[] = {{1, -1, 1, 1},
+               {-1, -1, 1, -1},
+               {1 + kTwoPi, -1, 1, 1},
+               {-1 - 2 * kTwoPi, -1, 1, -1},
+               {0.5f, 4, 7, 0.5f + kTwoPi},
+               {kPi, -kPi, kPi, kPi}};
+  for (const auto& c : cases)
+    EXPECT_NEAR(wrapIntoRange(c.alpha, c.start, c.end), c.wrapped, 1e-5f) << c.alpha;
+}
+
 TEST_F(CutModel, PixelAspectStretchesPositionAndDirection) {
   addCut(2, 300, 10, 45);
   const Cut cut = read(2, kHd, true, 2.0f);
