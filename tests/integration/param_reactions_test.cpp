@@ -101,7 +101,9 @@ TEST_F(LoadedPlugin, FrameRequestsNameTheCurrentFrameOfEveryLayerInUse) {
     EXPECT_EQ(requests[0].layerGuid, "");
     for (size_t k = 0; k < requests.size(); ++k) {
       EXPECT_EQ(requests[k].frames, (std::vector<uint32_t>{42, 42}));
-      if (k > 0) EXPECT_EQ(requests[k].layerGuid, row.requested[k - 1]);
+      if (k > 0) {
+        EXPECT_EQ(requests[k].layerGuid, row.requested[k - 1]);
+      }
     }
   }
 }

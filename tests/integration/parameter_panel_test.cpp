@@ -83,7 +83,9 @@ TEST_F(LoadedPlugin, DeclaresEveryParameterInOrder) {
       EXPECT_EQ(actual.minimum, want.minimum);
       EXPECT_EQ(actual.maximum, want.maximum);
     }
-    if (want.kind == ParamKind::Angle) EXPECT_EQ(actual.extra, 1);
+    if (want.kind == ParamKind::Angle) {
+      EXPECT_EQ(actual.extra, 1);
+    }
   }
   EXPECT_EQ(panel.params()[0].choices, (std::vector<std::string>{"N/A"}));
   EXPECT_EQ(panel.params()[1].choices, (std::vector<std::string>{"Local", "Radial"}));

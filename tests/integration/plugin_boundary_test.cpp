@@ -85,8 +85,10 @@ TEST_F(LoadedPlugin, MessageResultTable) {
       {5, 2},    {6, 2},  {9, 2},    {11, 2},   {15, 2},   {101, 2},  {999, 2},  {1000, 2},
       {1015, 2}, {12, 1}, {1001, 1}, {1002, 1}, {1009, 0}, {1010, 0}, {1011, 0}, {1012, 0},
   };
-  for (const auto& row : table)
+  for (const auto& row : table) {
     EXPECT_EQ(host().send(row.message), row.expected) << "message " << row.message;
+    EXPECT_EQ(host().messageHistory().back().result, row.expected) << "as the host recorded";
+  }
   EXPECT_EQ(sendParamEvent(7, "borderWidth"), 1);
   EXPECT_EQ(sendParamEvent(13, "borderWidth"), 1);
   EXPECT_EQ(sendParamEvent(14, "cutType"), 1);

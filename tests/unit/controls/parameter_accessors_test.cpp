@@ -3,6 +3,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <stdexcept>
 
@@ -86,27 +87,41 @@ TEST(EffectInstance, ControlsAreBoundToTheirOwnCutOrInputAndSurviveACopy) {
   EXPECT_EQ(copy.selectedInput, 3);
   EXPECT_EQ(copy.shiftDown, 1);
 
-  // Each control, in the original and in the copy, reaches exactly its own parameters.
+  // Each control, in the original and in the copy, reads and writes exactly its own parameters.
   testsupport::InMemoryHost host;
+  const auto writtenIds = [&host] {
+    std::vector<std::string> ids;
+    for (const std::string& call : host.callLog()) {
+      const size_t id = call.find(' ') + 1;
+      if (call.rfind("Set", 0) == 0) ids.push_back(call.substr(id, call.find(' ', id) - id));
+    }
+    host.clearCallLog();
+    std::sort(ids.begin(), ids.end());
+    return ids;
+  };
   const veltrane::EffectInstance* both[] = {&record, &copy};
   for (const veltrane::EffectInstance* instance : both) {
-    for (int i = 0; i < veltrane::kMaxCuts; ++i) {
-      host.clearCallLog();
-      instance->cutDirectionControls[static_cast<size_t>(i)].setter(host.handle(), host.record(),
-                                                                    kPi / 2.0f, 0);
-      EXPECT_EQ(host.callsTo("SetAngleParam")
-                    .at(0)
-                    .rfind("SetAngleParam cutDirection_" + std::to_string(i) + " ", 0),
-                0u);
+    for (size_t i = 0; i < veltrane::kMaxCuts; ++i) {
+      instance->cutDirectionControls[i].setter(host.handle(), host.record(), kPi / 2.0f, 0);
+      EXPECT_EQ(writtenIds(), std::vector<std::string>{"cutDirection_" + std::to_string(i)});
     }
-    for (int j = 0; j < veltrane::kInputCount; ++j) {
-      host.set(inputParamId(param::kInputFrameRotationPrefix, j), 10.0f * j);
-      host.set(inputParamId(param::kInputFrameScalePrefix, j), 5.0f * (j + 1));
-      const auto rotation = instance->inputRotationControls[static_cast<size_t>(j)].getter;
-      EXPECT_NEAR(rotation(host.handle(), host.record(), 0), 10.0f * j * kPi / 180.0f, 1e-5f);
-      const auto rect = instance->inputQuadControls[static_cast<size_t>(j)].getter;
-      EXPECT_FLOAT_EQ(rect(host.handle(), host.record(), 0, kFrame).z - 960.0f, 48.0f * (j + 1))
+    for (size_t j = 0; j < veltrane::kInputCount; ++j) {
+      const std::string n = std::to_string(j);
+      host.set("inputFrameRotation" + n, 10.0f * j);
+      host.set("inputFrameScale" + n, 5.0f * (j + 1));
+      host.setPoint("inputFrameTranslation" + n, 0, 0);
+      const auto& rotation = instance->inputRotationControls[j];
+      EXPECT_NEAR(rotation.getter(host.handle(), host.record(), 0), 10.0f * j * kPi / 180, 1e-5f);
+      const auto& rect = instance->inputQuadControls[j];
+      EXPECT_FLOAT_EQ(rect.getter(host.handle(), host.record(), 0, kFrame).z - 960.0f,
+                      48.0f * (j + 1))
           << j;
+      rotation.setter(host.handle(), host.record(), 0.5f, 0);
+      EXPECT_EQ(writtenIds(), std::vector<std::string>{"inputFrameRotation" + n});
+      rect.setter(host.handle(), host.record(), {0, 0, 1920, 1080}, {0, 0, 2880, 1080},
+                  veltrane::kEdgeBitX1, 0, kFrame);
+      EXPECT_EQ(writtenIds(),
+                (std::vector<std::string>{"inputFrameScale" + n, "inputFrameTranslation" + n}));
     }
   }
   veltrane::destroyInstance(&other);

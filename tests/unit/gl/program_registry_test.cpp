@@ -208,15 +208,15 @@ TEST_F(ProgramRegistry, AttributeLocationsFollowTheBuildOperation) {
     EffectData registry;
     const std::string prefix = c.sourceNames ? "vertex" : "in_";
     const std::string source = vertex(prefix);
-    if (c.build == Dual) {
-      registry.addDualTexCoordProgram(source, fragment("fragTexCoord"), false, "p", c.sourceNames);
-    } else if (c.build == Geometry) {
-      registry.addGeometryProgram(source, geometry, fragment("passedTexCoord"), false, "p",
-                                  c.sourceNames);
-    } else {
-      registry.addProgram(source, fragment("fragTexCoord"), false, "p", c.sourceNames,
-                          c.build == WithTexCoord);
-    }
+    const int built =
+        c.build == Dual ? registry.addDualTexCoordProgram(source, fragment("fragTexCoord"), false,
+                                                          "p", c.sourceNames)
+        : c.build == Geometry
+            ? registry.addGeometryProgram(source, geometry, fragment("passedTexCoord"), false, "p",
+                                          c.sourceNames)
+            : registry.addProgram(source, fragment("fragTexCoord"), false, "p", c.sourceNames,
+                                  c.build == WithTexCoord);
+    EXPECT_EQ(built, 1);
     const std::pair<const char*, int> roles[] = {{"Position", c.position},
                                                  {"TexCoord", c.texCoord},
                                                  {"TexCoord0", c.texCoord0},

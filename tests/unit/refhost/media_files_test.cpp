@@ -102,7 +102,9 @@ TEST(OutputTarget, NamesChooseTheKindOfOutput) {
   for (const auto& c : cases) {
     const OutputTarget target = parseOutputTarget(c.path);
     EXPECT_EQ(target.kind, c.kind) << c.path;
-    if (c.kind != OutputKind::Video) EXPECT_EQ(target.imageFormat, c.format) << c.path;
+    if (c.kind != OutputKind::Video) {
+      EXPECT_EQ(target.imageFormat, c.format) << c.path;
+    }
   }
   for (const char* bad : {"out.jpg", "out", "f_%04d.mp4", "f_%s.png", "f_%04d_%04d.png",
                           "f_%123d.png", "dir.png/out"}) {

@@ -311,6 +311,10 @@ TEST(HostViewerRecords, RecordsRequestsAndAnswersAsConfigured) {
 
   EXPECT_EQ(toUtf8(api.GetHostIdentifier(h)), "org.veltrane.refhost");
   host.setHostId(6001);
+  host.setVerbose(true);
+  host.setTextureFormatMode(2);
+  EXPECT_EQ(api.verbose, 1);
+  EXPECT_EQ(api.textureFormatMode, 2u);
   host.setHostIdentifier(L"org.example.\u00e9dit");
   EXPECT_EQ(api.GetHostId(h), 6001);
   EXPECT_EQ(toUtf8(api.GetHostIdentifier(h)),
