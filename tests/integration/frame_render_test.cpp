@@ -1,5 +1,6 @@
 // The frame render through the real module: regions show the right inputs, the border has the
 // promised coverage, and every host resource is given back.
+#include <algorithm>
 #include <cmath>
 
 #include "render_fixture.h"
@@ -70,21 +71,32 @@ TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
   EXPECT_EQ(fixture.pixel(pixels, 8, 30), kBlue);                     // -x +y: input 1
 }
 
-// Coverage a = clamp(h - d + 0.5, 0, 1) x clamp(h, 0, 1) of the border colour over the
-// picture, d the distance of the pixel centre to the cut.
+// Coverage c = clamp(h - d + 0.5, 0, 1) x clamp(h, 0, 1) of the border colour (premultiplied by
+// its alpha) over the picture, h half the border width and d the distance of the pixel centre
+// to the cut. No coverage leaves the picture exactly as it was.
 TEST(FrameRender, BorderCoverageFollowsTheDistanceToTheCut) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();
-  setLocalCut(host, 0, 0.5f, 0.0f, 0.0f);  // x = 0.5: pixel centres at integer distances + 0.5
-  host.setValue("borderWidth", ParamValue::ofFloat(6.0f));  // h = 3
-  host.setValue("borderColor", ParamValue::ofColor(1.0f, 1.0f, 1.0f));
-  const std::vector<uint8_t> pixels = fixture.render({0, 0, 0, 255});
-  for (int column = 26; column < 40; ++column) {
-    const float centre = static_cast<float>(column) + 0.5f - 32.0f;
-    const float distance = std::fabs(centre - 0.5f);
-    const float coverage = std::fmin(std::fmax(3.0f - distance + 0.5f, 0.0f), 1.0f);
-    const int red = fixture.pixel(pixels, column, 18)[0];
-    EXPECT_NEAR(red, coverage * 255.0f, 2.0f) << "column " << column << " distance " << distance;
+  setLocalCut(host, 0, 0.5f, 0.0f, 0.0f);  // x = 0.5: pixel centres at whole distances from it
+  host.setValue("borderColor", ParamValue::ofColor(1.0f, 0.0f, 0.0f));
+  const Rgba picture{100, 100, 100, 255};
+  const struct { float width, alpha; } borders[] = {{6, 1}, {6, 0.5f}, {1, 1}, {0, 1}};
+  for (const auto& border : borders) {
+    host.setValue("borderWidth", ParamValue::ofFloat(border.width));
+    host.setValue("borderAlpha", ParamValue::ofFloat(border.alpha));
+    const std::vector<uint8_t> pixels = fixture.render(picture);
+    const float h = border.width / 2.0f;
+    const float colour[4] = {255 * border.alpha, 0, 0, 255 * border.alpha};
+    for (int column = 26; column < 40; ++column) {
+      const float distance = std::fabs(static_cast<float>(column) - 32.0f);
+      const float coverage =
+          std::clamp(h - distance + 0.5f, 0.0f, 1.0f) * std::clamp(h, 0.0f, 1.0f);
+      for (int k = 0; k < 4; ++k) {
+        const float expected = picture[k] * (1 - coverage) + colour[k] * coverage;
+        EXPECT_NEAR(fixture.pixel(pixels, column, 18)[k], expected, coverage > 0 ? 2.0f : 0.0f)
+            << "width " << border.width << " alpha " << border.alpha << " column " << column;
+      }
+    }
   }
 }
 
