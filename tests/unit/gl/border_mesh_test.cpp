@@ -62,6 +62,7 @@ TEST(BorderMesh, SizesGrowBySegmentAndZeroLengthSegmentsKeepOnlyTheirCaps) {
       {{}, 1, 1, 1, 1},
       {{{5, 5, 5, 5}}, 1, 1, 69, 73},
       {{{0, 0, 1, 0}, {3, 3, 3, 3}}, 7, 8, 137, 145},
+      {{{0, 0, 0.01f, 0}}, 7, 8, 69, 73},  // however short, a segment has its band
       {std::vector<std::vector<float>>(8, {-1, -2, 3, 4}), 49, 57, 545, 577},
   };
   for (const Case& c : cases) {
