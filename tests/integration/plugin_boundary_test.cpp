@@ -1,7 +1,4 @@
 // The module as a host sees it: its exports, its registration and the result of every message.
-#include <dlfcn.h>
-#include <malloc.h>
-
 #include <climits>
 #include <cstdio>
 #include <cwchar>
@@ -10,8 +7,14 @@
 
 #include "loaded_plugin.h"
 
+#ifdef __GLIBC__
+#include <malloc.h>
+#endif
+
 namespace {
 
+// The Windows build reads its DLL's export table on the build machine instead.
+#ifndef _WIN32
 std::set<std::string> exportedSymbols(const std::string& path) {
   std::set<std::string> names;
   const std::string command = "nm -D --defined-only '" + path + "'";
@@ -29,6 +32,7 @@ std::set<std::string> exportedSymbols(const std::string& path) {
 TEST(ModuleExports, ExportsExactlyPluginInfoAndNotify) {
   EXPECT_EQ(exportedSymbols(VELTRANE_MODULE_PATH), (std::set<std::string>{"Notify", "PluginInfo"}));
 }
+#endif
 
 TEST(Registration, FieldsAreWrittenAndStableAcrossCalls) {
   refhost::Module module(VELTRANE_MODULE_PATH);
@@ -52,10 +56,7 @@ TEST(Registration, FieldsAreWrittenAndStableAcrossCalls) {
 }
 
 TEST(Registration, NullIdentifierPointerIsSkipped) {
-  void* library = dlopen(VELTRANE_MODULE_PATH, RTLD_NOW | RTLD_LOCAL);
-  ASSERT_NE(library, nullptr) << dlerror();
-  auto pluginInfo = reinterpret_cast<PluginInfoFunction>(dlsym(library, "PluginInfo"));
-  ASSERT_NE(pluginInfo, nullptr);
+  refhost::Module module(VELTRANE_MODULE_PATH);
   std::vector<wchar_t> name(kRegistrationNameChars, L'x'), category(kRegistrationCategoryChars),
       vendor(kRegistrationVendorChars), notice(kRegistrationNoticeChars);
   PluginRegistration record{};
@@ -64,7 +65,7 @@ TEST(Registration, NullIdentifierPointerIsSkipped) {
   record.vendor = vendor.data();
   record.notice = notice.data();
   record.identifier = nullptr;
-  pluginInfo(nullptr, nullptr, &record);
+  module.fillRegistration(&record);
   EXPECT_STREQ(record.name, L"Veltrane {split-screen}");
   // The bounded copy zero-fills the rest of the buffer.
   EXPECT_EQ(name.back(), L'\0');
@@ -72,7 +73,6 @@ TEST(Registration, NullIdentifierPointerIsSkipped) {
   EXPECT_EQ(record.capabilityFlags, 69u);
   EXPECT_EQ(record.interfaceRevision, 5u);
   EXPECT_EQ(record.identifier, nullptr);
-  dlclose(library);
 }
 
 // Messages that need neither GL nor a pointer event, with the result each must give.
@@ -134,6 +134,7 @@ TEST_F(LoadedPlugin, UnlistedMessagesAnswerTwoWithoutCallingTheHost) {
   EXPECT_EQ(host().api().pluginData, plugin);
 }
 
+#ifdef __GLIBC__  // counts the heap through glibc's allocator statistics
 TEST_F(LoadedPlugin, RepeatedCreateAndDestroyLeavesNoMemoryBehind) {
   const auto allocatedBytes = [] { return mallinfo2().uordblks; };
   ASSERT_EQ(host().send(4), 1);
@@ -149,5 +150,6 @@ TEST_F(LoadedPlugin, RepeatedCreateAndDestroyLeavesNoMemoryBehind) {
   const size_t hostHistory = 2000 * sizeof(refhost::MessageRecord) * 2;
   EXPECT_LE(allocatedBytes(), before + hostHistory);
 }
+#endif
 
 }  // namespace
