@@ -1,5 +1,5 @@
-// A headless OpenGL context made through EGL without a display, with a debug callback that
-// records every GL error so tests can assert there were none.
+// The host's own OpenGL context, with a debug callback that records every GL error so tests can
+// assert there were none: headless EGL on Linux, WGL on a hidden window on Windows.
 #pragma once
 
 #include <memory>
@@ -42,10 +42,15 @@ class GlContext {
  private:
   static void debugCallback(unsigned source, unsigned type, unsigned id, unsigned severity,
                             int length, const char* message, const void* user);
+  // The platform's side (gl_context_egl.cpp, gl_context_wgl.cpp): create a 4.1 debug context of
+  // the profile and make it current, or throw saying which step failed; give it back.
+  void createPlatformContext();
+  void destroyPlatformContext();
 
   GlProfile profile_;
-  void* display_ = nullptr;
-  void* context_ = nullptr;
+  void* display_ = nullptr;  // the EGL display, or the hidden window's device context (WGL)
+  void* context_ = nullptr;  // the EGL context or the WGL rendering context
+  void* window_ = nullptr;   // the hidden window (WGL)
   std::vector<GlDebugMessage> errors_;
   std::vector<GlDebugMessage> messages_;
 };

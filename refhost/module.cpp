@@ -1,7 +1,6 @@
-// Loading the plug-in module with dlopen and reading its registration record.
+// Loading the plug-in module and reading its registration record.
 #include "refhost/module.h"
 
-#include <dlfcn.h>
 #include <sys/stat.h>
 
 #include <cerrno>
@@ -10,6 +9,7 @@
 #include <stdexcept>
 #include <vector>
 
+#include "refhost/shared_library.h"
 #include "refhost/text.h"
 
 namespace refhost {
@@ -19,7 +19,7 @@ std::runtime_error loadError(const std::string& path, const std::string& what) {
   return std::runtime_error("cannot load plug-in module '" + path + "': " + what);
 }
 
-// Checks the path before dlopen so that a missing file is reported as such and not through the
+// Checks the path before loading so that a missing file is reported as such and not through the
 // loader's library search, which would look elsewhere for a bare name.
 void checkFile(const std::string& path) {
   if (path.empty()) throw loadError(path, "the path is empty");
@@ -30,8 +30,7 @@ void checkFile(const std::string& path) {
 }
 
 void* resolve(void* handle, const std::string& path, const char* symbol) {
-  dlerror();
-  void* address = dlsym(handle, symbol);
+  void* address = findSymbol(handle, symbol);
   if (!address) {
     throw loadError(path, std::string("it does not export ") + symbol +
                               " (not a plug-in module of this interface)");
@@ -57,24 +56,19 @@ std::string Registration::versionText() const {
 
 Module::Module(const std::string& path) : path_(path) {
   checkFile(path);
-  // A bare file name would send dlopen through the library search path; name it as a path.
-  std::string openPath = path.find('/') == std::string::npos ? "./" + path : path;
-  handle_ = dlopen(openPath.c_str(), RTLD_NOW | RTLD_LOCAL);
-  if (!handle_) {
-    const char* reason = dlerror();
-    throw loadError(path, std::string("not a loadable shared library (") +
-                              (reason ? reason : "unknown loader error") + ")");
-  }
+  std::string reason;
+  handle_ = openSharedLibrary(path, reason);
+  if (!handle_) throw loadError(path, "not a loadable shared library (" + reason + ")");
   try {
     pluginInfo_ = reinterpret_cast<PluginInfoFunction>(resolve(handle_, path, "PluginInfo"));
     notify_ = reinterpret_cast<NotifyFunction>(resolve(handle_, path, "Notify"));
   } catch (...) {
-    dlclose(handle_);
+    closeSharedLibrary(handle_);
     throw;
   }
 }
 
-Module::~Module() { dlclose(handle_); }
+Module::~Module() { closeSharedLibrary(handle_); }
 
 Registration Module::readRegistration() const {
   // The buffers have exactly the sizes the record promises; the module's bounded copies may

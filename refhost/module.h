@@ -28,7 +28,7 @@ struct Registration {
   std::string versionText() const;  // "1.2.0.0"
 };
 
-// Owns the dlopen handle; the module stays loaded until the Module is destroyed, so every Host
+// Owns the library handle; the module stays loaded until the Module is destroyed, so every Host
 // driving it must be destroyed first.
 class Module {
  public:
@@ -44,6 +44,8 @@ class Module {
   // Calls PluginInfo with freshly allocated host buffers of the declared sizes and reads the
   // record back. Every call asks the module again.
   Registration readRegistration() const;
+  // Calls PluginInfo with the caller's record and buffers, read back by the caller.
+  void fillRegistration(PluginRegistration* record) const { pluginInfo_(nullptr, nullptr, record); }
 
   int32_t notify(WispHost* host, tagWispAPI* api, int32_t message) const {
     return notify_(host, api, message);

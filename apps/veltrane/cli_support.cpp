@@ -1,13 +1,13 @@
 // Option parsing and module lookup shared by the subcommands.
 #include "cli_support.h"
 
-#include <unistd.h>
-
 #include <cctype>
 #include <cerrno>
 #include <climits>
 #include <cstdlib>
 #include <filesystem>
+
+#include "refhost/shared_library.h"
 
 namespace veltrane_cli {
 
@@ -75,10 +75,16 @@ refhost::GlProfile glProfile(const std::map<std::string, std::string>& options) 
 }
 
 std::string installedPluginPath() {
-  std::error_code error;
-  std::filesystem::path executable = std::filesystem::read_symlink("/proc/self/exe", error);
-  if (error) return "veltrane.so";
-  return (executable.parent_path() / ".." / "lib" / "veltrane.so").lexically_normal().string();
+#ifdef _WIN32
+  constexpr const char* kModuleName = "veltrane.dll";
+#else
+  constexpr const char* kModuleName = "veltrane.so";
+#endif
+  const std::string executable = refhost::executablePath();
+  if (executable.empty()) return kModuleName;
+  return (std::filesystem::path(executable).parent_path() / ".." / "lib" / kModuleName)
+      .lexically_normal()
+      .string();
 }
 
 std::string pluginPath(const std::map<std::string, std::string>& options) {

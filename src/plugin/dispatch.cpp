@@ -11,6 +11,7 @@
 #include "effect/param_change.h"
 #include "effect/param_declaration.h"
 #include "gl/effect_data.h"
+#include "plugin/fault_guard.h"
 #include "plugin/plugin_exception.h"
 #include "render/frame_render.h"
 #include "render/gl_startup.h"
@@ -18,11 +19,15 @@
 namespace veltrane {
 namespace {
 
+void destroyEffectData(void* effectData) { delete static_cast<EffectData*>(effectData); }
+
+// Any exception or machine fault while destroying the registry answers 2; the slot is cleared
+// either way, since a half-destroyed registry cannot be destroyed again.
 int32_t unloadPlugin(tagWispAPI* api) {
   int32_t result = 1;
   if (api->pluginData) {
     try {
-      delete static_cast<EffectData*>(api->pluginData);
+      if (!runCatchingMachineFaults(destroyEffectData, api->pluginData)) result = kResultNotHandled;
     } catch (...) {
       result = kResultNotHandled;
     }
