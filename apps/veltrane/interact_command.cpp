@@ -12,6 +12,7 @@
 #include "refhost/staged_file.h"
 #include "scene_file.h"
 #include "scene_session.h"
+#include "stop_signals.h"
 
 namespace veltrane_cli {
 namespace {
@@ -88,6 +89,7 @@ int runInteract(const std::vector<std::string>& args) {
   refhost::GlProfile profile = glProfile(options);
   std::string module = pluginPath(options);
 
+  noteStopSignals();
   Scene scene = loadScene(parsed.positional.front());
   EventScript script = loadEventScript(options["--events"]);
   std::optional<OverlayFolder> overlayFolder;
@@ -103,6 +105,7 @@ int runInteract(const std::vector<std::string>& args) {
   EventReplay replay(session, script);
   nlohmann::ordered_json result = replay.play(overlays.get());
   session.finish();
+  throwIfStopped();
   // The result is written whole, under its temporary name, before the pictures move into
   // place: a write that fails leaves neither. Only the result's rename comes after them.
   refhost::StagedFile resultFile(output);

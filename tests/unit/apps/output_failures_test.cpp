@@ -1,15 +1,18 @@
-// What the command line leaves when writing fails: one line naming the output, nothing new on
-// disk, and every file that was there before as it was.
+// What the command line leaves when writing fails or it is stopped: one line naming the output,
+// nothing new on disk, and every file that was there before as it was.
 #include <gtest/gtest.h>
 #include <sched.h>
+#include <signal.h>
 #include <sys/mount.h>
 #include <unistd.h>
 
+#include <chrono>
 #include <cstring>
 #include <filesystem>
 #include <map>
 #include <nlohmann/json.hpp>
 #include <regex>
+#include <thread>
 
 #include "cli_runner.h"
 
@@ -56,7 +59,8 @@ std::map<std::string, std::string> snapshot(const std::string& folder) {
 // Runs `command` (render or interact) on a 64x36 scene of `frames` frames and a script of
 // `events` pointer moves, with the options' values (every second item) named in `folder`.
 CliRun runOn(const std::string& command, int frames, int events,
-             const std::vector<std::string>& options, const std::string& folder) {
+             const std::vector<std::string>& options, const std::string& folder,
+             const std::function<void(int)>& whileRunning = nullptr) {
   ScratchDirectory inputs;
   writeText(inputs.file("scene.json"),
             R"({"width": 64, "height": 36, "fps": 25, "source": {"pattern": "counter"}, "layers":)"
@@ -69,7 +73,7 @@ CliRun runOn(const std::string& command, int frames, int events,
   if (command == "interact") args.insert(args.end(), {"--events", inputs.file("events.json")});
   for (std::size_t i = 0; i < options.size(); ++i)
     args.push_back(i % 2 ? folder + "/" + options[i] : options[i]);
-  return runCli(args);
+  return runCli(args, nullptr, whileRunning);
 }
 
 // What the command printed last, after its progress bar.
@@ -117,6 +121,55 @@ TEST(OutputWrites, AnOverlayFolderThatIsAFileIsOneLine) {
   EXPECT_EQ(run.err, "veltrane interact: option '--overlay' expects a folder, '" +
                          folder.file("f") + "' is a file (see 'veltrane interact --help')\n");
   EXPECT_EQ(folder.entries(), std::vector<std::string>{"f"});
+}
+
+// Sends the signal once the command has written into a temporary, and had a moment more.
+std::function<void(int)> signalPartWay(const std::string& folder, int signal) {
+  return [folder, signal](int pid) {
+    bool written = false;  // within a minute
+    for (int tries = 0; !written && tries < 6000; ++tries) {
+      std::this_thread::sleep_for(std::chrono::milliseconds(10));
+      std::error_code error;  // the command may remove a folder while it is being listed
+      for (fs::recursive_directory_iterator it(folder, error), end; !error && it != end;
+           it.increment(error))
+        written |= it->is_regular_file(error) &&
+                   it->path().string().find(".partial-") != std::string::npos;
+    }
+    std::this_thread::sleep_for(std::chrono::milliseconds(300));
+    kill(pid, signal);
+  };
+}
+
+TEST(StopSignals, StopCleanlyWithTheSignalsExitStatus) {
+  struct Case {
+    int signal;
+    std::string name, command;
+    std::vector<std::string> outputs;
+  } const cases[] = {
+      {SIGINT, "SIGINT", "render", {"-o", "s_%04d.png"}},
+      {SIGTERM, "SIGTERM", "render", {"-o", "v.mp4"}},
+      {SIGHUP, "SIGHUP", "interact", {"-o", "r.json", "--overlay", "ov"}},
+  };
+  for (const Case& c : cases) {
+    ScratchDirectory folder;
+    for (const char* name : {"s_0001.png", "v.mp4", "r.json"}) writeText(folder.file(name), "old");
+    std::map<std::string, std::string> before = snapshot(folder.path());
+    CliRun run = runOn(c.command, 100000, 5000, c.outputs, folder.path(),
+                       signalPartWay(folder.path(), c.signal));
+    EXPECT_EQ(run.status, 128 + c.signal) << c.name;
+    EXPECT_EQ(lastLine(run.err),
+              "veltrane " + c.command + ": stopped by " + c.name + "; nothing was written\n");
+    EXPECT_EQ(snapshot(folder.path()), before) << c.name;
+  }
+}
+
+TEST(StopSignals, TemporariesOfAKilledRenderGoOnTheNextRun) {
+  ScratchDirectory folder;
+  std::vector<std::string> output{"-o", "s_%04d.png"};
+  runOn("render", 100000, 0, output, folder.path(), signalPartWay(folder.path(), SIGKILL));
+  ASSERT_EQ(folder.entries().size(), 1u);  // the hidden folder of frames
+  EXPECT_EQ(runOn("render", 2, 0, output, folder.path()).status, 0);
+  EXPECT_EQ(folder.entries(), (std::vector<std::string>{"s_0000.png", "s_0001.png"}));
 }
 
 }  // namespace
