@@ -51,7 +51,8 @@ class StillSink : public FrameSink {
   explicit StillSink(const OutputTarget& target) : target_(target), file_(target.path) {}
   void write(int32_t, const RgbaImage& picture) override {
     if (written_) throw std::runtime_error(target_.path + ": a still image holds one frame");
-    writeImageFile(picture, file_.temporaryPath(), target_.imageFormat);
+    std::vector<uint8_t> bytes = encodeImage(picture, target_.imageFormat, target_.path);
+    file_.write(bytes.data(), bytes.size());
     written_ = true;
   }
   std::vector<std::string> commit() override {
@@ -66,25 +67,21 @@ class StillSink : public FrameSink {
   bool written_ = false;
 };
 
+// Frames wait in a hidden folder until the last one is written, so a sequence that fails
+// part-way leaves none of its frames.
 class SequenceSink : public FrameSink {
  public:
-  explicit SequenceSink(const OutputTarget& target) : target_(target) {}
+  explicit SequenceSink(const OutputTarget& target) : target_(target), files_(target.path) {}
   void write(int32_t frame, const RgbaImage& picture) override {
-    files_.emplace_back(target_.frameName(frame));
-    writeImageFile(picture, files_.back().temporaryPath(), target_.imageFormat);
+    std::string name = target_.frameName(frame);
+    std::vector<uint8_t> bytes = encodeImage(picture, target_.imageFormat, name);
+    files_.write(name, bytes.data(), bytes.size());
   }
-  std::vector<std::string> commit() override {
-    std::vector<std::string> names;
-    for (StagedFile& file : files_) {
-      file.commit();
-      names.push_back(file.finalPath());
-    }
-    return names;
-  }
+  std::vector<std::string> commit() override { return files_.commit(); }
 
  private:
   OutputTarget target_;
-  std::vector<StagedFile> files_;
+  StagedFileSet files_;
 };
 
 class VideoSink : public FrameSink {
@@ -93,12 +90,13 @@ class VideoSink : public FrameSink {
       : target_(target),
         file_(target.path),
         writer_(std::make_unique<VideoWriter>(file_.temporaryPath(), target.container, width,
-                                              height, frameRate)) {}
+                                              height, frameRate, target.path)) {}
   ~VideoSink() override { writer_.reset(); }  // closes the file before the temporary goes
   void write(int32_t, const RgbaImage& picture) override { writer_->write(picture); }
   std::vector<std::string> commit() override {
     writer_->finish();
     writer_.reset();
+    syncFile(file_.temporaryPath(), target_.path);
     file_.commit();
     return {target_.path};
   }
@@ -127,6 +125,9 @@ OutputTarget parseOutputTarget(const std::string& path) {
   std::string extension = lowerExtension(path);
   if (path.find('%') != std::string::npos) {
     numberField(path);
+    if (path.find('/', path.find('%')) != std::string::npos)
+      throw std::invalid_argument(
+          "a sequence's frame number goes in the file name, not a folder's, got '" + path + "'");
     if (extension != "png" && extension != "exr")
       throw std::invalid_argument("an image sequence pattern ends in .png or .exr, got '" + path +
                                   "'");

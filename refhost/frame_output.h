@@ -26,9 +26,9 @@ struct OutputTarget {
   std::string frameName(int32_t frame) const;
 };
 
-// By the name: a pattern with one %0Nd or %d and ending in .png or .exr is a sequence; .png
-// and .exr alone are stills; .mp4, .mov and .mkv are videos (letter case ignored). Throws
-// std::invalid_argument saying what was expected.
+// By the name: a pattern with one %0Nd or %d in the file name (not a folder's) and ending in
+// .png or .exr is a sequence; .png and .exr alone are stills; .mp4, .mov and .mkv are videos
+// (letter case ignored). Throws std::invalid_argument saying what was expected.
 OutputTarget parseOutputTarget(const std::string& path);
 
 class FrameSink {
@@ -36,7 +36,8 @@ class FrameSink {
   virtual ~FrameSink() = default;  // deletes whatever was not committed
   // A picture of the sink's size, top row first.
   virtual void write(int32_t frame, const RgbaImage& picture) = 0;
-  // Moves everything written into place; returns the final names.
+  // Moves everything written into place, all or nothing; returns the final names. Every write
+  // and the flush at the end is checked: errors name the final name and the system's reason.
   virtual std::vector<std::string> commit() = 0;
   // Empty, or something the user should know about how the frames were written.
   virtual std::string note() const { return ""; }

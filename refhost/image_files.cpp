@@ -11,13 +11,14 @@
 #include <stdexcept>
 
 #include "refhost/image_module/image_module.h"
+#include "refhost/staged_file.h"
 
 namespace refhost {
 namespace {
 
 struct ImageModule {
   RefhostReadImage read = nullptr;
-  RefhostWriteImage write = nullptr;
+  RefhostEncodeImage encode = nullptr;
   std::string failure;  // why the module could not be loaded
 };
 
@@ -48,12 +49,13 @@ const ImageModule& imageModule() {
         continue;
       }
       module.read = reinterpret_cast<RefhostReadImage>(dlsym(handle, REFHOST_READ_IMAGE_SYMBOL));
-      module.write = reinterpret_cast<RefhostWriteImage>(dlsym(handle, REFHOST_WRITE_IMAGE_SYMBOL));
-      if (module.read && module.write) return;
+      module.encode =
+          reinterpret_cast<RefhostEncodeImage>(dlsym(handle, REFHOST_ENCODE_IMAGE_SYMBOL));
+      if (module.read && module.encode) return;
       reasons += (reasons.empty() ? "" : "; ") + path + " lacks the image functions";
     }
     module.read = nullptr;
-    module.write = nullptr;
+    module.encode = nullptr;
     module.failure = "the image module could not be loaded (" + reasons + ")";
   });
   return module;
@@ -83,12 +85,23 @@ RgbaImage readImageFile(const std::string& path) {
   return image;
 }
 
-void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format) {
-  const ImageModule& module = requireModule(path, "write image");
+std::vector<uint8_t> encodeImage(const RgbaImage& image, ImageFormat format,
+                                 const std::string& shownName) {
+  const ImageModule& module = requireModule(shownName, "write image");
   char error[512] = {};
-  if (module.write(path.c_str(), format == ImageFormat::Png ? 0 : 1, image.width, image.height,
-                   image.pixels.data(), error, sizeof error) != 0)
-    throw std::runtime_error(path + ": cannot write image: " + error);
+  uint8_t* bytes = nullptr;
+  std::size_t size = 0;
+  if (module.encode(format == ImageFormat::Png ? 0 : 1, image.width, image.height,
+                    image.pixels.data(), &bytes, &size, error, sizeof error) != 0)
+    throw std::runtime_error(shownName + ": cannot write image: " + error);
+  std::vector<uint8_t> encoded(bytes, bytes + size);
+  std::free(bytes);
+  return encoded;
+}
+
+void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format) {
+  std::vector<uint8_t> bytes = encodeImage(image, format, path);
+  writeFileContents(path, path, bytes.data(), bytes.size());
 }
 
 }  // namespace refhost

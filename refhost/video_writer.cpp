@@ -37,6 +37,7 @@ const char* muxerName(VideoContainer container) {
 
 struct VideoWriter::Encoder {
   std::string path;
+  std::string shownName;
   int32_t width = 0, height = 0;  // the pictures written
   AVFormatContext* format = nullptr;
   AVCodecContext* codec = nullptr;
@@ -62,7 +63,7 @@ struct VideoWriter::Encoder {
   }
 
   [[noreturn]] void fail(const std::string& what, int code = 0) const {
-    throw std::runtime_error(path + ": cannot write video: " + what +
+    throw std::runtime_error(shownName + ": cannot write video: " + what +
                              (code ? " (" + errorText(code) + ")" : ""));
   }
 
@@ -157,9 +158,10 @@ struct VideoWriter::Encoder {
 };
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int32_t width,
-                         int32_t height, double frameRate)
+                         int32_t height, double frameRate, const std::string& shownName)
     : encoder_(std::make_unique<Encoder>()) {
   encoder_->path = path;
+  encoder_->shownName = shownName.empty() ? path : shownName;
   // The libraries' progress chatter would bury the command line's own output.
   av_log_set_level(AV_LOG_ERROR);
   encoder_->width = width;

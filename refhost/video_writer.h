@@ -16,9 +16,11 @@ class VideoWriter {
  public:
   // Opens the file for frames of the size at the rate (frames per second), written as the
   // container whatever the path's name. 4:2:0 video needs even sizes: an odd width or height
-  // is padded by repeating the last column or row. Throws std::runtime_error naming the path.
+  // is padded by repeating the last column or row. Throws std::runtime_error naming the file
+  // by `shownName` when given (the user's name for a file written under a temporary one), else
+  // by the path.
   VideoWriter(const std::string& path, VideoContainer container, int32_t width, int32_t height,
-              double frameRate);
+              double frameRate, const std::string& shownName = "");
   // Without finish() the file is closed as it is (unplayable); the caller deletes it.
   ~VideoWriter();
   VideoWriter(const VideoWriter&) = delete;

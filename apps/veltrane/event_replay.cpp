@@ -2,6 +2,7 @@
 #include "event_replay.h"
 
 #include "scene_params.h"
+#include "stop_signals.h"
 
 namespace veltrane_cli {
 namespace {
@@ -92,6 +93,7 @@ nlohmann::ordered_json EventReplay::play(refhost::FrameSink* overlays) {
   nlohmann::ordered_json cursors = nlohmann::ordered_json::array();
   bool held = false;
   for (std::size_t i = 0; i < script_.events.size(); ++i) {
+    throwIfStopped();
     const ViewerEvent& event = script_.events[i];
     sent_ = nlohmann::ordered_json::array();
     std::vector<refhost::ParamState> before = snapshot(host.panel());

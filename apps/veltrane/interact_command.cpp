@@ -2,7 +2,7 @@
 // redo) on a scene running in the plug-in and writes what came of them as JSON.
 #include <cstdio>
 #include <filesystem>
-#include <fstream>
+#include <optional>
 #include <stdexcept>
 
 #include "cli_support.h"
@@ -12,9 +12,12 @@
 #include "refhost/staged_file.h"
 #include "scene_file.h"
 #include "scene_session.h"
+#include "stop_signals.h"
 
 namespace veltrane_cli {
 namespace {
+
+namespace fs = std::filesystem;
 
 const char kInteractHelp[] =
     "Usage: veltrane interact SCENE.json --events EVENTS.json -o RESULT.json [--overlay DIR]\n"
@@ -26,7 +29,7 @@ const char kInteractHelp[] =
     "with scripted answers, and the host's undo and redo. After each event the host reports\n"
     "changed parameters with message 7. RESULT.json receives every parameter's value in the\n"
     "scene's form, the undo steps, the cursor after each event, the menus shown and each\n"
-    "message's answer.\n"
+    "message's answer. The outputs appear only when all are complete, as with 'render'.\n"
     "\n"
     "Options:\n"
     "  --events FILE   the event script (required)\n"
@@ -37,15 +40,32 @@ const char kInteractHelp[] =
     "  --plugin PATH   the module to load\n"
     "  -h, --help      show this help\n";
 
-void writeResult(const std::string& path, const nlohmann::ordered_json& result) {
-  refhost::StagedFile file(path);
-  {
-    std::ofstream out(file.temporaryPath());
-    out << result.dump(2) << "\n";
-    if (!out) throw std::runtime_error(path + ": cannot be written");
+// The --overlay folder, made where it is missing; a run that fails removes the folders it made.
+class OverlayFolder {
+ public:
+  explicit OverlayFolder(const std::string& path) {
+    std::error_code error;
+    if (fs::exists(path, error) && !fs::is_directory(path, error))
+      throw UsageError("option '--overlay' expects a folder, '" + path + "' is a file");
+    for (fs::path missing = path; !missing.empty() && !fs::exists(missing, error);
+         missing = missing.parent_path())
+      made_.push_back(missing);  // deepest first
+    fs::create_directories(path, error);
+    if (error) throw std::runtime_error(path + ": cannot create the folder: " + error.message());
   }
-  file.commit();
-}
+  ~OverlayFolder() {
+    std::error_code ignored;
+    if (!kept_)
+      for (const fs::path& folder : made_) fs::remove(folder, ignored);
+  }
+  OverlayFolder(const OverlayFolder&) = delete;
+  OverlayFolder& operator=(const OverlayFolder&) = delete;
+  void keep() { kept_ = true; }
+
+ private:
+  std::vector<fs::path> made_;
+  bool kept_ = false;
+};
 
 }  // namespace
 
@@ -69,11 +89,13 @@ int runInteract(const std::vector<std::string>& args) {
   refhost::GlProfile profile = glProfile(options);
   std::string module = pluginPath(options);
 
+  noteStopSignals();
   Scene scene = loadScene(parsed.positional.front());
   EventScript script = loadEventScript(options["--events"]);
+  std::optional<OverlayFolder> overlayFolder;
   std::unique_ptr<refhost::FrameSink> overlays;
   if (options.count("--overlay")) {
-    std::filesystem::create_directories(options["--overlay"]);
+    overlayFolder.emplace(options["--overlay"]);
     refhost::OutputTarget target =
         refhost::parseOutputTarget(options["--overlay"] + "/event_%04d.png");
     overlays = refhost::openFrameSink(target, scene.composition.width, scene.composition.height,
@@ -83,8 +105,14 @@ int runInteract(const std::vector<std::string>& args) {
   EventReplay replay(session, script);
   nlohmann::ordered_json result = replay.play(overlays.get());
   session.finish();
-  writeResult(output, result);
+  throwIfStopped();
+  // The result is written whole, under its temporary name, before the pictures move into
+  // place: a write that fails leaves neither. Only the result's rename comes after them.
+  refhost::StagedFile resultFile(output);
+  resultFile.write(result.dump(2) + "\n");
   std::size_t pictures = overlays ? overlays->commit().size() : 0;
+  resultFile.commit();
+  if (overlayFolder) overlayFolder->keep();
   std::printf("wrote %s (%zu event%s)", output.c_str(), script.events.size(),
               script.events.size() == 1 ? "" : "s");
   if (overlays)

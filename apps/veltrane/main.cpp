@@ -7,6 +7,7 @@
 
 #include "cli_support.h"
 #include "commands.h"
+#include "stop_signals.h"
 
 namespace {
 
@@ -67,6 +68,9 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "veltrane %s: %s (see 'veltrane %s --help')\n", chosen->name, error.what(),
                  chosen->name);
     return 2;
+  } catch (const veltrane_cli::Stopped& stop) {
+    std::fprintf(stderr, "veltrane %s: %s\n", chosen->name, stop.what());
+    return 128 + stop.signal();  // as a shell reports a process ended by the signal
   } catch (const std::exception& error) {
     std::fprintf(stderr, "veltrane %s: %s\n", chosen->name, error.what());
     return 1;

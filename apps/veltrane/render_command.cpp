@@ -9,6 +9,7 @@
 #include "refhost/frame_output.h"
 #include "scene_file.h"
 #include "scene_session.h"
+#include "stop_signals.h"
 
 namespace veltrane_cli {
 namespace {
@@ -26,7 +27,9 @@ const char kRenderHelp[] =
     "  NAME.png, NAME.exr        one frame (frame 0 unless --frame N)\n"
     "  NAME_%04d.png (or .exr)   an image sequence, one file per frame\n"
     "  NAME.mp4, .mov, .mkv      H.264 video at the scene's rate\n"
-    "Files appear under their names only when complete.\n"
+    "Files appear under their names only when complete, a sequence's all at once; on any\n"
+    "failure, or when stopped by SIGINT, SIGTERM or SIGHUP (exit status 128 + the signal's\n"
+    "number), nothing new is left and a file that had the name keeps its contents.\n"
     "\n"
     "Options:\n"
     "  -o, --output OUT   where the frames go (required)\n"
@@ -104,6 +107,7 @@ int runRender(const std::vector<std::string>& args) {
   refhost::GlProfile profile = glProfile(options);
   std::string module = pluginPath(options);
 
+  noteStopSignals();
   Scene scene = loadScene(parsed.positional.front());
   FrameRange frames = chooseFrames(options, target, scene);
   const refhost::Composition& composition = scene.composition;
@@ -115,11 +119,13 @@ int runRender(const std::vector<std::string>& args) {
   {
     ProgressBar progress("rendering", frames.count());
     for (int32_t frame = frames.first; frame <= frames.last; ++frame) {
+      throwIfStopped();
       sink->write(frame, session.render(frame));
       progress.update(frame - frames.first + 1);
     }
   }
   session.finish();
+  throwIfStopped();
   std::string note = sink->note();
   std::vector<std::string> written = sink->commit();
   if (!note.empty()) std::fprintf(stderr, "veltrane render: note: %s\n", note.c_str());

@@ -1,6 +1,7 @@
 // The image module: OpenImageIO reading and writing behind a C interface.
 #include "image_module.h"
 
+#include <OpenImageIO/filesystem.h>
 #include <OpenImageIO/imageio.h>
 
 #include <algorithm>
@@ -61,9 +62,9 @@ extern "C" __attribute__((visibility("default"))) int refhostReadImage(
   return 0;
 }
 
-extern "C" __attribute__((visibility("default"))) int refhostWriteImage(
-    const char* path, int format, int32_t width, int32_t height, const uint8_t* pixels, char* error,
-    std::size_t errorSize) {
+extern "C" __attribute__((visibility("default"))) int refhostEncodeImage(
+    int format, int32_t width, int32_t height, const uint8_t* pixels, uint8_t** bytes,
+    std::size_t* size, char* error, std::size_t errorSize) {
   auto output = OIIO::ImageOutput::create(format == 0 ? "png" : "openexr");
   if (!output) return fail(error, errorSize, orDefault(OIIO::geterror(), "no writer"));
   OIIO::ImageSpec spec(width, height, 4,
@@ -71,8 +72,17 @@ extern "C" __attribute__((visibility("default"))) int refhostWriteImage(
   spec.alpha_channel = 3;
   // The bytes go out as they are held; the writer must not divide colour by alpha.
   spec.attribute("oiio:UnassociatedAlpha", 1);
-  if (!output->open(path, spec) || !output->write_image(OIIO::TypeDesc::UINT8, pixels) ||
-      !output->close())
-    return fail(error, errorSize, orDefault(output->geterror(), "write failed"));
+  // Encoded into memory: the host writes the file itself, where every write and the final
+  // flush are checked (the writers here can lose a failure at close).
+  std::vector<unsigned char> encoded;
+  OIIO::Filesystem::IOVecOutput memory(encoded);
+  if (!output->set_ioproxy(&memory) ||
+      !output->open(format == 0 ? "image.png" : "image.exr", spec) ||
+      !output->write_image(OIIO::TypeDesc::UINT8, pixels) || !output->close())
+    return fail(error, errorSize, orDefault(output->geterror(), "encoding failed"));
+  *bytes = static_cast<uint8_t*>(std::malloc(std::max<std::size_t>(encoded.size(), 1)));
+  if (!*bytes) return fail(error, errorSize, "out of memory");
+  std::memcpy(*bytes, encoded.data(), encoded.size());
+  *size = encoded.size();
   return 0;
 }

@@ -13,12 +13,14 @@ extern "C" {
 typedef int (*RefhostReadImage)(const char* path, int32_t* width, int32_t* height, uint8_t** pixels,
                                 char* error, std::size_t errorSize);
 
-// Writes RGBA8 pixels (top row first) as an 8-bit PNG (format 0) or a half-float OpenEXR
-// (format 1), whatever the path's name. Returns 0, or non-zero with the reason in `error`.
-typedef int (*RefhostWriteImage)(const char* path, int format, int32_t width, int32_t height,
-                                 const uint8_t* pixels, char* error, std::size_t errorSize);
+// Encodes RGBA8 pixels (top row first) as the bytes of an 8-bit PNG (format 0) or a half-float
+// OpenEXR (format 1) file. On success returns 0 and `size` bytes from malloc, which the caller
+// frees; otherwise non-zero with the reason in `error`.
+typedef int (*RefhostEncodeImage)(int format, int32_t width, int32_t height, const uint8_t* pixels,
+                                  uint8_t** bytes, std::size_t* size, char* error,
+                                  std::size_t errorSize);
 
 }  // extern "C"
 
 #define REFHOST_READ_IMAGE_SYMBOL "refhostReadImage"
-#define REFHOST_WRITE_IMAGE_SYMBOL "refhostWriteImage"
+#define REFHOST_ENCODE_IMAGE_SYMBOL "refhostEncodeImage"

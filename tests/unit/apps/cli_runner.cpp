@@ -26,7 +26,8 @@ void writeText(const std::string& path, const std::string& text) {
   file << text;
 }
 
-CliRun runCli(const std::vector<std::string>& args, const char* plugin) {
+CliRun runCli(const std::vector<std::string>& args, const char* plugin,
+              const std::function<void(int)>& whileRunning) {
   const std::string outFile = testsupport::makeTempFile("veltrane_cli_out_");
   const std::string errFile = testsupport::makeTempFile("veltrane_cli_err_");
   const char* outPath = outFile.c_str();
@@ -53,6 +54,7 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin) {
   CliRun run;
   pid_t pid = 0;
   if (posix_spawn(&pid, VELTRANE_CLI_PATH, &actions, nullptr, argv.data(), envp.data()) == 0) {
+    if (whileRunning) whileRunning(pid);
     int status = 0;
     waitpid(pid, &status, 0);
     run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;

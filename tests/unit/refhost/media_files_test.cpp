@@ -107,7 +107,7 @@ TEST(OutputTarget, NamesChooseTheKindOfOutput) {
     }
   }
   for (const char* bad : {"out.jpg", "out", "f_%04d.mp4", "f_%s.png", "f_%04d_%04d.png",
-                          "f_%123d.png", "dir.png/out"}) {
+                          "f_%123d.png", "dir.png/out", "d%02d/f.png"}) {
     EXPECT_THROW(parseOutputTarget(bad), std::invalid_argument) << bad;
   }
   EXPECT_EQ(parseOutputTarget("a/f_%04d.png").frameName(7), "a/f_0007.png");

@@ -1,0 +1,175 @@
+// What the command line leaves when writing fails or it is stopped: one line naming the output,
+// nothing new on disk, and every file that was there before as it was.
+#include <gtest/gtest.h>
+#include <sched.h>
+#include <signal.h>
+#include <sys/mount.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstring>
+#include <filesystem>
+#include <map>
+#include <nlohmann/json.hpp>
+#include <regex>
+#include <thread>
+
+#include "cli_runner.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using nlohmann::json;
+
+// Why this process cannot have mounts of its own, or "". As root a mount namespace is enough;
+// otherwise a user namespace makes the process root over its own mounts.
+std::string enterMountNamespace() {
+  if (unshare(CLONE_NEWNS) != 0) {
+    std::string uid = std::to_string(getuid()), gid = std::to_string(getgid());
+    if (unshare(CLONE_NEWUSER | CLONE_NEWNS) != 0) return std::strerror(errno);
+    writeText("/proc/self/setgroups", "deny");
+    writeText("/proc/self/uid_map", "0 " + uid + " 1");
+    writeText("/proc/self/gid_map", "0 " + gid + " 1");
+  }
+  // Mounts made here must not show in the namespace the process came from.
+  return mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) ? std::strerror(errno) : "";
+}
+
+// A tmpfs of that many 4 KiB pages, seen by this process and the commands it starts.
+class SmallFileSystem : public ScratchDirectory {
+ public:
+  explicit SmallFileSystem(std::size_t pages) {
+    static const std::string failure = enterMountNamespace();
+    std::string size = "size=" + std::to_string(pages * 4096);
+    if (!failure.empty() || mount("tmpfs", path().c_str(), "tmpfs", 0, size.c_str()) != 0)
+      throw std::runtime_error("cannot mount a tmpfs (needs root or user namespaces): " +
+                               (failure.empty() ? std::strerror(errno) : failure));
+  }
+  ~SmallFileSystem() { umount2(path().c_str(), MNT_DETACH); }
+};
+
+// Every entry under the folder with its contents ("/" for a folder).
+std::map<std::string, std::string> snapshot(const std::string& folder) {
+  std::map<std::string, std::string> found;
+  for (const auto& entry : fs::recursive_directory_iterator(folder))
+    found[entry.path()] = entry.is_directory() ? "/" : slurp(entry.path());
+  return found;
+}
+
+// Runs `command` (render or interact) on a 64x36 scene of `frames` frames and a script of
+// `events` pointer moves, with the options' values (every second item) named in `folder`.
+CliRun runOn(const std::string& command, int frames, int events,
+             const std::vector<std::string>& options, const std::string& folder,
+             const std::function<void(int)>& whileRunning = nullptr) {
+  ScratchDirectory inputs;
+  writeText(inputs.file("scene.json"),
+            R"({"width": 64, "height": 36, "fps": 25, "source": {"pattern": "counter"}, "layers":)"
+            R"( [{"guid": "aaaaaaaa-0000-4000-8000-000000000001", "name": "A"}], "duration": )" +
+                std::to_string(frames) + "}");
+  writeText(inputs.file("events.json"),
+            json{{"events", std::vector<json>(events, {{"move", {10, 10}}})}}.dump());
+  std::vector<std::string> args{command, inputs.file("scene.json"), "--plugin",
+                                VELTRANE_MODULE_PATH};
+  if (command == "interact") args.insert(args.end(), {"--events", inputs.file("events.json")});
+  for (std::size_t i = 0; i < options.size(); ++i)
+    args.push_back(i % 2 ? folder + "/" + options[i] : options[i]);
+  return runCli(args, nullptr, whileRunning);
+}
+
+// What the command printed last, after its progress bar.
+std::string lastLine(const std::string& text) {
+  return text.substr(text.rfind('\n', text.size() - 2) + 1);
+}
+
+TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
+  struct Case {
+    std::string command;
+    std::vector<std::string> outputs, there;  // files there before; a folder ends in '/'
+    std::size_t freePages;                    // of 4 KiB, beyond those the files there take
+    std::string error;                        // after the folder, a regular expression
+  };
+  const std::string n(240, 'n'), full = ": cannot write: No space left on device";
+  const Case cases[] = {
+      {"render", {"-o", n + ".png"}, {n + ".png"}, 0, n + "\\.png" + full},  // near the name limit
+      {"render", {"-o", n + "%04d.png"}, {n + "0003.png"}, 5, n + "00(0[1-9]|[12].)\\.png" + full},
+      {"render", {"-o", "s%d.png"}, {"s1.png", "s2.png/"}, 256, "s2\\.png: cannot replace it: .*"},
+      {"render", {"-o", "v.mp4"}, {"v.mp4"}, 0, "v\\.mp4: cannot write video: .*space.*"},
+      {"interact", {"-o", "r"}, {"r"}, 0, "r" + full},
+      {"interact", {"-o", "r", "--overlay", "o/v"}, {"r"}, 2, "o/v/event_000[1-9].png" + full},
+  };
+  for (const Case& c : cases) {
+    SmallFileSystem disk(c.there.size() + c.freePages);
+    for (const std::string& file : c.there)
+      file.back() == '/' ? (void)fs::create_directory(disk.file(file))
+                         : writeText(disk.file(file), "old");
+    std::map<std::string, std::string> before = snapshot(disk.path());
+    CliRun run = runOn(c.command, 30, 4, c.outputs, disk.path());
+    EXPECT_EQ(run.status, 1) << c.error;
+    std::string line = lastLine(run.err), start = "veltrane " + c.command + ": " + disk.file("");
+    EXPECT_TRUE(line.rfind(start, 0) == 0 &&
+                std::regex_match(line.substr(start.size()), std::regex(c.error + "\n")))
+        << run.err;
+    EXPECT_EQ(snapshot(disk.path()), before) << c.error;
+  }
+}
+
+TEST(OutputWrites, AnOverlayFolderThatIsAFileIsOneLine) {
+  ScratchDirectory folder;
+  writeText(folder.file("f"), "");
+  CliRun run = runOn("interact", 1, 1, {"-o", "r.json", "--overlay", "f"}, folder.path());
+  EXPECT_EQ(run.status, 2);
+  EXPECT_EQ(run.err, "veltrane interact: option '--overlay' expects a folder, '" +
+                         folder.file("f") + "' is a file (see 'veltrane interact --help')\n");
+  EXPECT_EQ(folder.entries(), std::vector<std::string>{"f"});
+}
+
+// Sends the signal once the command has written into a temporary, and had a moment more.
+std::function<void(int)> signalPartWay(const std::string& folder, int signal) {
+  return [folder, signal](int pid) {
+    bool written = false;  // within a minute
+    for (int tries = 0; !written && tries < 6000; ++tries) {
+      std::this_thread::sleep_for(std::chrono::milliseconds(10));
+      std::error_code error;  // the command may remove a folder while it is being listed
+      for (fs::recursive_directory_iterator it(folder, error), end; !error && it != end;
+           it.increment(error))
+        written |= it->is_regular_file(error) &&
+                   it->path().string().find(".partial-") != std::string::npos;
+    }
+    std::this_thread::sleep_for(std::chrono::milliseconds(300));
+    kill(pid, signal);
+  };
+}
+
+TEST(StopSignals, StopCleanlyWithTheSignalsExitStatus) {
+  struct Case {
+    int signal;
+    std::string name, command;
+    std::vector<std::string> outputs;
+  } const cases[] = {
+      {SIGINT, "SIGINT", "render", {"-o", "s_%04d.png"}},
+      {SIGTERM, "SIGTERM", "render", {"-o", "v.mp4"}},
+      {SIGHUP, "SIGHUP", "interact", {"-o", "r.json", "--overlay", "ov"}},
+  };
+  for (const Case& c : cases) {
+    ScratchDirectory folder;
+    for (const char* name : {"s_0001.png", "v.mp4", "r.json"}) writeText(folder.file(name), "old");
+    std::map<std::string, std::string> before = snapshot(folder.path());
+    CliRun run = runOn(c.command, 100000, 5000, c.outputs, folder.path(),
+                       signalPartWay(folder.path(), c.signal));
+    EXPECT_EQ(run.status, 128 + c.signal) << c.name;
+    EXPECT_EQ(lastLine(run.err),
+              "veltrane " + c.command + ": stopped by " + c.name + "; nothing was written\n");
+    EXPECT_EQ(snapshot(folder.path()), before) << c.name;
+  }
+}
+
+TEST(StopSignals, TemporariesOfAKilledRenderGoOnTheNextRun) {
+  ScratchDirectory folder;
+  std::vector<std::string> output{"-o", "s_%04d.png"};
+  runOn("render", 100000, 0, output, folder.path(), signalPartWay(folder.path(), SIGKILL));
+  ASSERT_EQ(folder.entries().size(), 1u);  // the hidden folder of frames
+  EXPECT_EQ(runOn("render", 2, 0, output, folder.path()).status, 0);
+  EXPECT_EQ(folder.entries(), (std::vector<std::string>{"s_0000.png", "s_0001.png"}));
+}
+
+}  // namespace
