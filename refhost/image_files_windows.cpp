@@ -5,6 +5,7 @@
 #include <stdexcept>
 
 #include "refhost/image_files.h"
+#include "refhost/staged_file.h"
 
 // Paths are UTF-8 here, as everywhere in the host; stb converts them for Windows' wide calls.
 #define STBI_WINDOWS_UTF8
@@ -33,12 +34,25 @@ RgbaImage readImageFile(const std::string& path) {
   return image;
 }
 
-void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format) {
+std::vector<uint8_t> encodeImage(const RgbaImage& image, ImageFormat format,
+                                 const std::string& shownName) {
   if (format != ImageFormat::Png)
-    throw std::runtime_error(path + ": cannot write image: the Windows build writes PNG only");
-  if (!stbi_write_png(path.c_str(), image.width, image.height, 4, image.pixels.data(),
-                      image.width * 4))
-    throw std::runtime_error(path + ": cannot write image: the file could not be written");
+    throw std::runtime_error(shownName + ": cannot write image: the Windows build writes PNG only");
+  std::vector<uint8_t> bytes;
+  const auto append = [](void* into, void* data, int size) {
+    const auto* first = static_cast<const uint8_t*>(data);
+    static_cast<std::vector<uint8_t>*>(into)->insert(
+        static_cast<std::vector<uint8_t>*>(into)->end(), first, first + size);
+  };
+  if (!stbi_write_png_to_func(append, &bytes, image.width, image.height, 4, image.pixels.data(),
+                              image.width * 4))
+    throw std::runtime_error(shownName + ": cannot write image: the picture could not be encoded");
+  return bytes;
+}
+
+void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format) {
+  const std::vector<uint8_t> bytes = encodeImage(image, format, path);
+  writeFileContents(path, path, bytes.data(), bytes.size());
 }
 
 }  // namespace refhost

@@ -2,11 +2,13 @@
 // and rename on commit (all or nothing for a set).
 #include "refhost/staged_file.h"
 
-#include <fcntl.h>
-#include <signal.h>
-#include <sys/stat.h>
+#ifndef _WIN32
 #include <unistd.h>
+#else
+#include <io.h>
+#endif
 
+#include <algorithm>
 #include <atomic>
 #include <cerrno>
 #include <cstdint>
@@ -14,6 +16,8 @@
 #include <filesystem>
 #include <stdexcept>
 #include <system_error>
+
+#include "refhost/file_system.h"
 
 namespace fs = std::filesystem;
 
@@ -51,13 +55,10 @@ std::string temporaryPrefix(const fs::path& target) {
 // A hidden name in the same directory, so that the rename stays on one file system.
 std::string temporaryPathFor(const std::string& finalPath) {
   fs::path target(finalPath);
-  std::string name =
-      temporaryPrefix(target) + std::to_string(getpid()) + "-" + std::to_string(stagedCount++);
+  std::string name = temporaryPrefix(target) + std::to_string(files::currentProcessId()) + "-" +
+                     std::to_string(stagedCount++);
   return (target.parent_path() / name).string();
 }
-
-// Whether a process of that id runs (or, refusing the probe with EPERM, runs as someone else).
-bool processRuns(long pid) { return kill(static_cast<pid_t>(pid), 0) == 0 || errno == EPERM; }
 
 // The process id in "<pid>-<n>", or 0 when the rest of a name is not of that form.
 long ownerOf(const std::string& rest) {
@@ -72,11 +73,13 @@ long ownerOf(const std::string& rest) {
 // Writes and closes the file, checking both; with `flush`, the data goes to the disk first.
 void writeWhole(const std::string& path, const std::string& shownName, const void* data,
                 std::size_t size, bool flush) {
-  int file = ::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666);
+  int file = files::createForWriting(path);
   if (file < 0) fail(shownName, "cannot create the file", errno);
   const char* next = static_cast<const char*>(data);
   while (size > 0) {
-    ssize_t written = ::write(file, next, size);
+    // Pieces of at most 1 GiB: Windows counts a write's bytes in an unsigned int.
+    const auto written =
+        ::write(file, next, static_cast<unsigned>(std::min<std::size_t>(size, 1u << 30)));
     if (written < 0 && errno == EINTR) continue;
     if (written <= 0) {
       int error = written < 0 ? errno : ENOSPC;  // a regular file takes nothing only when full
@@ -88,7 +91,7 @@ void writeWhole(const std::string& path, const std::string& shownName, const voi
   }
   // Some file systems (network ones, or any on a delayed write-back) report a full disk only
   // when the data goes out; the rename must not replace a good file with one that never arrives.
-  if (flush && ::fsync(file) != 0) {
+  if (flush && !files::flushToDisk(file)) {
     int error = errno;
     ::close(file);
     fail(shownName, "cannot write", error);
@@ -99,7 +102,7 @@ void writeWhole(const std::string& path, const std::string& shownName, const voi
 // Flushes everything written to the file system of the open folder to the disk, reporting a
 // write-back failure that happened on it since the folder was opened.
 void flushFileSystem(int folder, const std::string& shownName) {
-  if (::syncfs(folder) != 0) fail(shownName, "cannot write", errno);
+  if (!files::flushFolder(folder)) fail(shownName, "cannot write", errno);
 }
 
 }  // namespace
@@ -110,9 +113,9 @@ void writeFileContents(const std::string& path, const std::string& shownName, co
 }
 
 void syncFile(const std::string& path, const std::string& shownName) {
-  int file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+  int file = files::openForReading(path);
   if (file < 0) fail(shownName, "cannot reopen the written file", errno);
-  bool synced = ::fsync(file) == 0;
+  bool synced = files::flushToDisk(file);
   int error = errno;
   bool closed = ::close(file) == 0;
   if (synced && !closed) error = errno;
@@ -129,7 +132,7 @@ void removeStaleTemporaries(const std::string& finalPath) {
     std::string name = it->path().filename().string();
     if (name.compare(0, prefix.size(), prefix) != 0) continue;
     long owner = ownerOf(name.substr(prefix.size()));
-    if (owner > 0 && !processRuns(owner)) stale.push_back(it->path());
+    if (owner > 0 && !files::processRuns(owner)) stale.push_back(it->path());
   }
   for (const fs::path& path : stale) fs::remove_all(path, error);  // best effort
 }
@@ -157,7 +160,7 @@ void StagedFile::write(const void* data, std::size_t size) {
 }
 
 void StagedFile::commit() {
-  if (std::rename(temporaryPath_.c_str(), finalPath_.c_str()) != 0)
+  if (!files::replace(temporaryPath_, finalPath_))
     fail(finalPath_, "cannot move the finished file into place", errno);
   committed_ = true;
 }
@@ -171,17 +174,18 @@ void writeFileAtomically(const std::string& path, const std::string& text) {
 StagedFileSet::StagedFileSet(std::string name) : name_(std::move(name)) {
   removeStaleTemporaries(name_);
   folder_ = temporaryPathFor(name_);
-  if (::mkdir(folder_.c_str(), 0777) != 0) fail(name_, "cannot create files here", errno);
-  folderHandle_ = ::open(folder_.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+  if (!files::makeFolder(folder_)) fail(name_, "cannot create files here", errno);
+  folderHandle_ = files::openFolder(folder_);
   if (folderHandle_ < 0) {
     int error = errno;
-    ::rmdir(folder_.c_str());
+    std::error_code ignored;
+    fs::remove(folder_, ignored);
     fail(name_, "cannot open the folder of files", error);
   }
 }
 
 StagedFileSet::~StagedFileSet() {
-  ::close(folderHandle_);
+  files::closeFolder(folderHandle_);
   if (committed_) return;
   std::error_code ignored;
   fs::remove_all(folder_, ignored);
@@ -191,9 +195,9 @@ void StagedFileSet::write(const std::string& finalPath, const void* data, std::s
   // Short names inside the hidden folder: a final name may already be near the length limit.
   std::string staged = folder_ + "/" + std::to_string(entries_.size());
   entries_.push_back({finalPath, staged, staged + "-previous"});
-  // Flushed together at the commit: one flush of the file system costs what one file's does,
-  // and a sequence has hundreds.
-  writeWhole(staged, finalPath, data, size, false);
+  // Flushed together at the commit where the file system allows: one flush of it costs what one
+  // file's does, and a sequence has hundreds.
+  writeWhole(staged, finalPath, data, size, !files::flushesFolders());
 }
 
 void StagedFileSet::place(Entry& entry) {

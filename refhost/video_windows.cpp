@@ -27,7 +27,8 @@ double VideoReader::frameRate() const { return 0; }
 int32_t VideoReader::frameCount() const { return 0; }
 RgbaImage VideoReader::frame(int32_t, int32_t, int32_t) { return {}; }
 
-VideoWriter::VideoWriter(const std::string& path, VideoContainer, int32_t, int32_t, double) {
+VideoWriter::VideoWriter(const std::string& path, VideoContainer, int32_t, int32_t, double,
+                         const std::string&) {
   unavailable(path);
 }
 VideoWriter::~VideoWriter() = default;
