@@ -110,6 +110,12 @@ TEST(InputCapture, LayersAreAlignedOnlyWhenTheirPlacementDiffers) {
   EXPECT_EQ(fixture.pixel(pixels, 28, 15), kGreen);
   EXPECT_EQ(fixture.pixel(pixels, 8, 30), kClear);  // above it, still in input 1's region
   EXPECT_EQ(fixture.pixel(pixels, 56, 30), kRed);
+
+  // The same layer in 3D, exactly where the flat one sits once taken into camera space (the
+  // lens distance, 1000 * H / 720 pixels in front of the camera), looks the same.
+  host.layers().back().is3D = true;
+  host.layers().back().placement[14] = -1000.0f * RenderFixture::kHeight / 720.0f;
+  EXPECT_EQ(fixture.render(kRed), pixels);
 }
 
 }  // namespace
