@@ -201,6 +201,8 @@ class Host {
     if (callLogging_) callLog_.push_back(std::move(line));
   }
   void problem(std::string text) { problems_.push_back(std::move(text)); }
+  // The interface's reserved arguments are 0; anything else is the plug-in misusing it.
+  void checkReserved(const char* operation, int32_t reserved);
   Param& mutableParam(const std::string& id);
   bool requireGl(const char* operation);
   void finishMessage(int32_t message, int32_t result);

@@ -89,9 +89,14 @@ void Host::write(const char* operation, const char* id, int32_t time, const Para
   param->edit(time, value);
 }
 
+void Host::checkReserved(const char* operation, int32_t reserved) {
+  if (reserved != 0) problem(std::string(operation) + ": the last argument must be 0");
+}
+
 void Host::setIntParam(const char* id, int32_t time, int32_t value, int32_t reserved) {
   log("SetIntParam " + logId(id) + " " + std::to_string(time) + " " + std::to_string(value) + " " +
       std::to_string(reserved));
+  checkReserved("SetIntParam", reserved);
   // The interface has no setter of its own for choices and booleans; they are integers here.
   write("SetIntParam", id, time, ParamValue::ofInt(value),
         {ParamKind::Int, ParamKind::Choice, ParamKind::Bool});
@@ -100,6 +105,7 @@ void Host::setIntParam(const char* id, int32_t time, int32_t value, int32_t rese
 void Host::setFloatParam(const char* id, int32_t time, float value, int32_t reserved) {
   log("SetFloatParam " + logId(id) + " " + std::to_string(time) + " " + formatFloat(value) + " " +
       std::to_string(reserved));
+  checkReserved("SetFloatParam", reserved);
   write("SetFloatParam", id, time, ParamValue::ofFloat(value), {ParamKind::Float});
 }
 
@@ -108,6 +114,7 @@ void Host::setPointParam(const char* id, int32_t time, const float* x, const flo
   log("SetPointParam " + logId(id) + " " + std::to_string(time) + " " +
       (x ? formatFloat(*x) : "null") + " " + (y ? formatFloat(*y) : "null") + " " +
       std::to_string(reserved));
+  checkReserved("SetPointParam", reserved);
   if (!x || !y) {
     problem("SetPointParam " + logId(id) + ": null coordinate pointer; nothing stored");
     return;
@@ -118,6 +125,7 @@ void Host::setPointParam(const char* id, int32_t time, const float* x, const flo
 void Host::setAngleParam(const char* id, int32_t time, float degrees, int32_t reserved) {
   log("SetAngleParam " + logId(id) + " " + std::to_string(time) + " " + formatFloat(degrees) + " " +
       std::to_string(reserved));
+  checkReserved("SetAngleParam", reserved);
   write("SetAngleParam", id, time, ParamValue::ofFloat(degrees), {ParamKind::Angle});
 }
 
@@ -129,6 +137,7 @@ void Host::setLayerParam(const char* id, int32_t time, const char* guid, int32_t
        : text.empty() ? "\"\""
                       : text) +
       " " + std::to_string(reserved));
+  checkReserved("SetLayerParam", reserved);
   if (!guid) {
     problem("SetLayerParam " + logId(id) + ": null GUID; nothing stored");
     return;

@@ -16,6 +16,7 @@ void Host::endUndo() {
 
 void Host::redraw(int32_t reserved) {
   log("Redraw " + std::to_string(reserved));
+  checkReserved("Redraw", reserved);
   ++redraws_;
 }
 
