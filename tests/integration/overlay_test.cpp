@@ -31,7 +31,9 @@ class Viewer : public ViewerEvents {
     const std::vector<uint8_t> transparent(static_cast<size_t>(kW) * kH * 4, 0);
     target_ = host_.createTexture(kW, kH, transparent.data());
     host_.setDrawTarget(target_.id, kW, kH);
+    glClearColor(0.25f, 0.5f, 0.75f, 1.0f);
     EXPECT_EQ(send(1003, nullptr), 1);
+    expectGlStateLeftForTheHost({0.25f, 0.5f, 0.75f, 1.0f});
     context().name = nullptr;
     EXPECT_EQ(host_.outstandingTextures(), 0);
     EXPECT_EQ(host_.outstandingBuffers(), 0);
@@ -138,12 +140,27 @@ TEST(OverlayDrawing, HoveredEdgeOfTheSelectedInputIsHighlighted) {
   viewer.pointer(1005, 100, 60, 1.0);  // select input 0; its rectangle is x 40..120, y 22.5..67.5
   viewer.pointer(1006, 100, 60, 0.0);
   const std::vector<uint8_t> idle = viewer.draw();
-  EXPECT_EQ(viewer.pointer(1004, 120, 45, 0.0), 1);  // on the right edge
-  const std::vector<uint8_t> hovered = viewer.draw();
-  const int right = Viewer::maxAlpha(hovered, 118, 25, 122, 31);
-  EXPECT_GT(right, Viewer::maxAlpha(idle, 118, 25, 122, 31));
-  EXPECT_EQ(Viewer::maxAlpha(hovered, 38, 25, 42, 31), Viewer::maxAlpha(idle, 38, 25, 42, 31));
-  EXPECT_EQ(Viewer::maxAlpha(hovered, 60, 20, 70, 25), Viewer::maxAlpha(idle, 60, 20, 70, 25));
+  // Where each edge is hovered, and a stretch of it away from the resize arrow drawn there.
+  const struct {
+    int x, y, box[4];
+  } edges[] = {{40, 45, {38, 25, 42, 31}},
+               {120, 45, {118, 25, 122, 31}},
+               {80, 22, {45, 20, 55, 24}},
+               {80, 67, {45, 66, 55, 69}}};
+  for (const auto& hovered : edges) {
+    EXPECT_EQ(viewer.pointer(1004, hovered.x, hovered.y, 0.0), 1);
+    const std::vector<uint8_t> image = viewer.draw();
+    for (const auto& edge : edges) {
+      const auto alpha = [&edge](const std::vector<uint8_t>& picture) {
+        return Viewer::maxAlpha(picture, edge.box[0], edge.box[1], edge.box[2], edge.box[3]);
+      };
+      if (&edge == &hovered) {
+        EXPECT_GT(alpha(image), alpha(idle)) << hovered.x << "," << hovered.y;
+      } else {
+        EXPECT_EQ(alpha(image), alpha(idle)) << hovered.x << "," << hovered.y;
+      }
+    }
+  }
 }
 
 }  // namespace

@@ -2,8 +2,10 @@
 // inputs and a render context filled the way the host fills it for message 10.
 #pragma once
 
+#include <GL/glew.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <array>
 #include <memory>
 #include <string>
@@ -22,6 +24,24 @@ inline refhost::FrameSource solidSource(Rgba colour) {
       for (size_t c = 0; c < 4; ++c) pixels[i + c] = colour[c];
     return pixels;
   };
+}
+
+// The GL state the render and the overlay leave for the host: blending off with GL_FUNC_ADD and
+// GL_ONE/GL_ONE, no program in use, and the clear colour as the host had set it.
+inline void expectGlStateLeftForTheHost(const std::array<float, 4>& clearColour) {
+  GLint equation = 0, source = 0, destination = 0, program = -1;
+  glGetIntegerv(GL_BLEND_EQUATION_RGB, &equation);
+  glGetIntegerv(GL_BLEND_SRC_RGB, &source);
+  glGetIntegerv(GL_BLEND_DST_RGB, &destination);
+  glGetIntegerv(GL_CURRENT_PROGRAM, &program);
+  EXPECT_FALSE(glIsEnabled(GL_BLEND));
+  EXPECT_EQ(equation, GL_FUNC_ADD);
+  EXPECT_EQ(source, GL_ONE);
+  EXPECT_EQ(destination, GL_ONE);
+  EXPECT_EQ(program, 0);
+  std::array<float, 4> clear{};
+  glGetFloatv(GL_COLOR_CLEAR_VALUE, clear.data());
+  EXPECT_EQ(clear, clearColour);
 }
 
 class RenderFixture {
@@ -82,8 +102,20 @@ class RenderFixture {
       refhost::RenderFrame target(*host_, {width_, height_, 25.0, 1.0f, 100, kOwnLayer}, frame);
       host_->setRenderContext(&target.context());
       EXPECT_EQ(host_->send(12), 1);
+      glClearColor(0.25f, 0.5f, 0.75f, 1.0f);
       EXPECT_EQ(host_->send(10), 1);
       host_->setRenderContext(nullptr);
+      // Besides, unit 0 is left active with the source bound and filtering nearest.
+      expectGlStateLeftForTheHost({0.25f, 0.5f, 0.75f, 1.0f});
+      GLint unit = 0, bound = 0, minifying = 0, magnifying = 0;
+      glGetIntegerv(GL_ACTIVE_TEXTURE, &unit);
+      glGetIntegerv(GL_TEXTURE_BINDING_2D, &bound);
+      glGetTexParameteriv(GL_TEXTURE_2D, GL_TEXTURE_MIN_FILTER, &minifying);
+      glGetTexParameteriv(GL_TEXTURE_2D, GL_TEXTURE_MAG_FILTER, &magnifying);
+      EXPECT_EQ(unit, GL_TEXTURE0);
+      EXPECT_EQ(static_cast<uint32_t>(bound), target.context().source.id);
+      EXPECT_EQ(minifying, GL_NEAREST);
+      EXPECT_EQ(magnifying, GL_NEAREST);
       pixels = host_->readTexture(target.context().output.id, width_, height_);
     }
     EXPECT_EQ(host_->outstandingTextures(), 0);
