@@ -2,6 +2,7 @@
 // turns any error into one line on stderr and a non-zero exit status.
 #include <cstdio>
 #include <exception>
+#include <new>
 #include <string>
 #include <vector>
 
@@ -67,6 +68,9 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "veltrane %s: %s (see 'veltrane %s --help')\n", chosen->name, error.what(),
                  chosen->name);
     return 2;
+  } catch (const std::bad_alloc&) {
+    std::fprintf(stderr, "veltrane %s: out of memory\n", chosen->name);
+    return 1;
   } catch (const std::exception& error) {
     std::fprintf(stderr, "veltrane %s: %s\n", chosen->name, error.what());
     return 1;
