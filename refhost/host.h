@@ -106,6 +106,10 @@ class Host {
   // Creates the host's context (and makes it current). Throws std::runtime_error with the
   // reason when none can be made.
   GlContext& attachGl(GlProfile profile = GlProfile::Core);
+  // Uses a context another host made, so that hosts in turn can drive one plug-in whose GL
+  // programs live in it; each host's own GL objects still go with the host.
+  GlContext& shareGl(std::shared_ptr<GlContext> context);
+  std::shared_ptr<GlContext> sharedGl() const { return gl_; }
   GlContext* gl() { return gl_.get(); }
   uint32_t framebuffer() const { return framebuffer_; }
   // A texture the host's framebuffer shows before every drawing message (colour attachment 0,
@@ -308,7 +312,7 @@ class Host {
   bool failLayerQueries_ = false;
   bool failTimeInfo_ = false;
 
-  std::unique_ptr<GlContext> gl_;
+  std::shared_ptr<GlContext> gl_;
   uint32_t framebuffer_ = 0;
   uint32_t drawTarget_ = 0;
   int32_t drawTargetWidth_ = 0;
