@@ -86,6 +86,7 @@ class Host {
   int32_t send(int32_t message);
   static bool isDrawingMessage(int32_t message) { return message == 10 || message == 1003; }
   const std::vector<MessageRecord>& messageHistory() const { return messages_; }
+  void clearMessageHistory() { messages_.clear(); }
 
   tagWispAPI& api() { return api_; }
   WispHost* handle() { return reinterpret_cast<WispHost*>(&handle_); }
@@ -190,6 +191,7 @@ class Host {
   void queuePopupAnswer(int32_t index) { popupAnswers_.push_back(index); }
   const std::vector<std::string>& popupMenus() const { return popupMenus_; }
   const std::vector<FrameRequest>& frameRequests() const { return frameRequests_; }
+  void clearFrameRequests() { frameRequests_.clear(); }
   void clearViewerRecords();
 
  private:

@@ -22,6 +22,8 @@ const Command kCommands[] = {
      &veltrane_cli::runInteract},
     {"bench", "measure milliseconds per frame across frame sizes and cut counts",
      &veltrane_cli::runBench},
+    {"soak", "render a scene's frames many times over and watch resident memory",
+     &veltrane_cli::runSoak},
 };
 
 void printUsage(std::FILE* out) {

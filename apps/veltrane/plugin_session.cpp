@@ -38,6 +38,10 @@ int32_t PluginSession::send(int32_t message, std::initializer_list<int32_t> expe
   host_->clearCallLog();
   int32_t result = host_->send(message);
   reportHostProblems();
+  // Nothing here reads the host's message history or frame requests; over a long render they
+  // would grow by every message.
+  host_->clearMessageHistory();
+  host_->clearFrameRequests();
   std::string what = "message " + std::to_string(message);
   bool accepted = expected.size() == 0;
   for (int32_t value : expected) accepted = accepted || value == result;
