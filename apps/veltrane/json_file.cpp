@@ -1,12 +1,10 @@
 // Bounded reading and checked parsing of JSON input files.
 #include "json_file.h"
 
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
-
 #include <cerrno>
 #include <cstring>
+#include <filesystem>
+#include <fstream>
 #include <vector>
 
 #include "json_fields.h"
@@ -140,40 +138,25 @@ class CheckedBuilder {
   std::vector<Level> open_;
 };
 
-class FileDescriptor {
- public:
-  explicit FileDescriptor(int fd) : fd_(fd) {}
-  ~FileDescriptor() {
-    if (fd_ >= 0) close(fd_);
-  }
-  FileDescriptor(const FileDescriptor&) = delete;
-  FileDescriptor& operator=(const FileDescriptor&) = delete;
-  int get() const { return fd_; }
-
- private:
-  int fd_;
-};
-
 std::string readLimited(const std::string& path) {
-  auto unreadable = [&](int error) {
-    return FieldError(path + ": cannot be read (" + std::strerror(error) + ")");
-  };
-  FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
-  struct stat info {};
-  if (file.get() < 0 || fstat(file.get(), &info) != 0) throw unreadable(errno);
-  if (S_ISDIR(info.st_mode)) throw FieldError(path + ": is a directory; expected a JSON file");
+  std::error_code error;
+  const std::filesystem::file_status status = std::filesystem::status(path, error);
+  if (error) throw FieldError(path + ": cannot be read (" + error.message() + ")");
+  if (std::filesystem::is_directory(status))
+    throw FieldError(path + ": is a directory; expected a JSON file");
+  std::ifstream in(path, std::ios::binary);
+  if (!in) throw FieldError(path + ": cannot be read (" + std::strerror(errno) + ")");
   std::string text;
   char buffer[1 << 16];
-  for (;;) {
-    ssize_t got = read(file.get(), buffer, sizeof buffer);
-    if (got < 0 && errno == EINTR) continue;
-    if (got < 0) throw unreadable(errno);
-    if (got == 0) return text;
-    if (text.size() + static_cast<std::size_t>(got) > kMaxJsonBytes)
+  while (in.read(buffer, sizeof buffer) || in.gcount() > 0) {
+    const auto got = static_cast<std::size_t>(in.gcount());
+    if (text.size() + got > kMaxJsonBytes)
       throw FieldError(path + ": is larger than " + std::to_string(kMaxJsonBytes >> 20) +
                        " MiB; expected a smaller JSON file");
-    text.append(buffer, static_cast<std::size_t>(got));
+    text.append(buffer, got);
   }
+  if (in.bad()) throw FieldError(path + ": cannot be read (a read failed)");
+  return text;
 }
 
 }  // namespace
