@@ -86,6 +86,7 @@ class Host {
   int32_t send(int32_t message);
   static bool isDrawingMessage(int32_t message) { return message == 10 || message == 1003; }
   const std::vector<MessageRecord>& messageHistory() const { return messages_; }
+  void clearMessageHistory() { messages_.clear(); }
 
   tagWispAPI& api() { return api_; }
   WispHost* handle() { return reinterpret_cast<WispHost*>(&handle_); }
@@ -106,6 +107,10 @@ class Host {
   // Creates the host's context (and makes it current). Throws std::runtime_error with the
   // reason when none can be made.
   GlContext& attachGl(GlProfile profile = GlProfile::Core);
+  // Uses a context another host made, so that hosts in turn can drive one plug-in whose GL
+  // programs live in it; each host's own GL objects still go with the host.
+  GlContext& shareGl(std::shared_ptr<GlContext> context);
+  std::shared_ptr<GlContext> sharedGl() const { return gl_; }
   GlContext* gl() { return gl_.get(); }
   uint32_t framebuffer() const { return framebuffer_; }
   // A texture the host's framebuffer shows before every drawing message (colour attachment 0,
@@ -188,6 +193,7 @@ class Host {
   void queuePopupAnswer(int32_t index) { popupAnswers_.push_back(index); }
   const std::vector<std::string>& popupMenus() const { return popupMenus_; }
   const std::vector<FrameRequest>& frameRequests() const { return frameRequests_; }
+  void clearFrameRequests() { frameRequests_.clear(); }
   void clearViewerRecords();
 
  private:
@@ -315,7 +321,7 @@ class Host {
   bool failLayerQueries_ = false;
   bool failTimeInfo_ = false;
 
-  std::unique_ptr<GlContext> gl_;
+  std::shared_ptr<GlContext> gl_;
   uint32_t framebuffer_ = 0;
   uint32_t drawTarget_ = 0;
   int32_t drawTargetWidth_ = 0;

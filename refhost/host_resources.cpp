@@ -49,7 +49,14 @@ void deleteTextures(std::set<uint32_t>& names) {
 
 GlContext& Host::attachGl(GlProfile profile) {
   releaseGl();
-  gl_ = std::make_unique<GlContext>(profile);
+  gl_ = std::make_shared<GlContext>(profile);
+  return *gl_;
+}
+
+GlContext& Host::shareGl(std::shared_ptr<GlContext> context) {
+  releaseGl();
+  gl_ = std::move(context);
+  gl_->makeCurrent();
   return *gl_;
 }
 

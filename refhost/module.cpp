@@ -9,6 +9,7 @@
 #include <stdexcept>
 #include <vector>
 
+#include "refhost/elf_check.h"
 #include "refhost/shared_library.h"
 #include "refhost/text.h"
 
@@ -20,13 +21,19 @@ std::runtime_error loadError(const std::string& path, const std::string& what) {
 }
 
 // Checks the path before loading so that a missing file is reported as such and not through the
-// loader's library search, which would look elsewhere for a bare name.
+// loader's library search, which would look elsewhere for a bare name; and, on ELF systems,
+// checks the file's structure, since the loader maps segments without checking they exist in
+// the file.
 void checkFile(const std::string& path) {
   if (path.empty()) throw loadError(path, "the path is empty");
   struct stat info {};
   if (stat(path.c_str(), &info) != 0) throw loadError(path, std::strerror(errno));
   if (S_ISDIR(info.st_mode)) throw loadError(path, "it is a directory, not a shared library");
   if (!S_ISREG(info.st_mode)) throw loadError(path, "it is not a regular file");
+#ifndef _WIN32
+  if (std::string problem = elfModuleProblem(path); !problem.empty())
+    throw loadError(path, "not a loadable shared library (" + problem + ")");
+#endif
 }
 
 void* resolve(void* handle, const std::string& path, const char* symbol) {

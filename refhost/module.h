@@ -33,7 +33,7 @@ struct Registration {
 class Module {
  public:
   // Throws std::runtime_error naming the path and what was wrong: no such file, not a loadable
-  // shared library, or an export missing.
+  // shared library (also a truncated one, or one for another machine), or an export missing.
   explicit Module(const std::string& path);
   ~Module();
   Module(const Module&) = delete;

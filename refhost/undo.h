@@ -27,6 +27,8 @@ class UndoStack {
   // steps that could have been redone. False when no step is open.
   bool end(const ParamPanel& panel);
   bool isOpen() const { return depth_ > 0; }
+  // The name the open step was begun with (meaningful while isOpen()).
+  const std::string& openStepName() const { return open_.name; }
 
   // Called before a parameter edit while a step is open; keeps only the first state per id.
   void noteBefore(const Param& param);

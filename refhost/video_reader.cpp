@@ -10,6 +10,7 @@ extern "C" {
 
 #include <algorithm>
 #include <cmath>
+#include <cstdarg>
 #include <stdexcept>
 
 namespace refhost {
@@ -22,6 +23,24 @@ std::string errorText(int code) {
   char buffer[AV_ERROR_MAX_STRING_SIZE] = {};
   av_strerror(code, buffer, sizeof buffer);
   return buffer;
+}
+
+// The libraries' last error message on this thread. They report details ("Invalid NAL unit
+// size") only through their log, which would otherwise print several lines around the one
+// line of a failure; kept here, the detail goes into that line instead.
+thread_local std::string lastLibraryError;
+
+void keepLibraryError(void* context, int level, const char* format, va_list arguments) {
+  if (level > AV_LOG_ERROR) return;
+  char line[512] = {};
+  int prefix = 0;
+  av_log_format_line2(context, level, format, arguments, line, sizeof line, &prefix);
+  std::string text(line);
+  while (!text.empty() && (text.back() == '\n' || text.back() == '.')) text.pop_back();
+  // The prefix names the library object by address ("[h264 @ 0x...]"): noise to a user.
+  std::string::size_type object = text.find("] ");
+  if (text.rfind('[', 0) == 0 && object != std::string::npos) text.erase(0, object + 2);
+  if (!text.empty()) lastLibraryError = text;
 }
 
 }  // namespace
@@ -53,8 +72,10 @@ struct VideoReader::Decoder {
   }
 
   [[noreturn]] void fail(const std::string& what, int code = 0) const {
+    std::string reason = code ? errorText(code) : "";
+    if (!lastLibraryError.empty()) reason += (reason.empty() ? "" : ": ") + lastLibraryError;
     throw std::runtime_error(path + ": cannot decode video: " + what +
-                             (code ? " (" + errorText(code) + ")" : ""));
+                             (reason.empty() ? "" : " (" + reason + ")"));
   }
 
   void open() {
@@ -98,15 +119,16 @@ struct VideoReader::Decoder {
   void seek(int32_t index) {
     int64_t target = startTime + av_rescale_q(index, av_inv_q(rate), timeBase);
     int result = av_seek_frame(format, stream, target, AVSEEK_FLAG_BACKWARD);
-    if (result < 0) fail("seek to frame " + std::to_string(index) + " failed", result);
+    if (result < 0) fail("frame " + std::to_string(index) + ": the seek failed", result);
     avcodec_flush_buffers(codec);
     currentIndex = -1;
     draining = false;
     ended = false;
   }
 
-  // Feeds the decoder one packet of the stream, or tells it the stream has ended.
-  void feed() {
+  // Feeds the decoder one packet of the stream, or tells it the stream has ended. `index` is
+  // the frame being decoded towards, for messages.
+  void feed(int32_t index) {
     while (!draining) {
       int result = av_read_frame(format, packet);
       if (result < 0) {
@@ -118,7 +140,8 @@ struct VideoReader::Decoder {
       if (ours) result = avcodec_send_packet(codec, packet);
       av_packet_unref(packet);
       if (ours) {
-        if (result < 0 && result != AVERROR(EAGAIN)) fail("bad packet", result);
+        if (result < 0 && result != AVERROR(EAGAIN))
+          fail("frame " + std::to_string(index) + ": its data is damaged or cut short", result);
         return;
       }
     }
@@ -138,14 +161,14 @@ struct VideoReader::Decoder {
         currentIndex = indexOf(current);
         if (currentIndex >= index) return;
       } else if (result == AVERROR(EAGAIN)) {
-        feed();
+        feed(index);
       } else if (result == AVERROR_EOF) {
         ended = true;
       } else {
-        fail("decoding frame " + std::to_string(index) + " failed", result);
+        fail("frame " + std::to_string(index) + ": decoding failed", result);
       }
     }
-    if (currentIndex < 0) fail("frame " + std::to_string(index) + " could not be decoded");
+    if (currentIndex < 0) fail("frame " + std::to_string(index) + ": no picture decodes");
   }
 
   RgbaImage convert(int32_t width, int32_t height) {
@@ -164,8 +187,10 @@ struct VideoReader::Decoder {
 
 VideoReader::VideoReader(const std::string& path) : decoder_(std::make_unique<Decoder>()) {
   decoder_->path = path;
-  // The libraries' progress chatter would bury the command line's own output.
-  av_log_set_level(AV_LOG_ERROR);
+  // The libraries' messages would bury the command line's own output; errors are kept for the
+  // one line a failure gives.
+  av_log_set_callback(keepLibraryError);
+  lastLibraryError.clear();
   decoder_->open();
 }
 
@@ -177,6 +202,7 @@ double VideoReader::frameRate() const { return av_q2d(decoder_->rate); }
 int32_t VideoReader::frameCount() const { return decoder_->frameCount; }
 
 RgbaImage VideoReader::frame(int32_t index, int32_t width, int32_t height) {
+  lastLibraryError.clear();
   index = std::max(index, 0);
   if (decoder_->frameCount > 0) index = std::min(index, decoder_->frameCount - 1);
   if (index != decoder_->currentIndex) decoder_->decodeTo(index);

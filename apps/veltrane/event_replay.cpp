@@ -1,6 +1,8 @@
 // Delivering scripted viewer events to the plug-in.
 #include "event_replay.h"
 
+#include <cctype>
+
 #include "scene_params.h"
 #include "stop_signals.h"
 
@@ -22,10 +24,13 @@ EventReplay::EventReplay(SceneSession& session, const EventScript& script)
   const refhost::FrameSettings& frame = session.frameSettings();
   viewer_ = refhost::makeViewerContext(frame.width, frame.height, script.viewScaleX,
                                        script.viewScaleY, script.uiScale, script.time);
+  probeTarget_ = session.host().createTexture(frame.width, frame.height).id;
 }
 
-int32_t EventReplay::send(int32_t message, void* context, void* event,
-                          std::initializer_list<int32_t> expected) {
+EventReplay::~EventReplay() { session_.host().deleteTexture(probeTarget_); }
+
+int32_t EventReplay::sendUnrecorded(int32_t message, void* context, void* event,
+                                    std::initializer_list<int32_t> expected) {
   refhost::Host& host = session_.host();
   host.setRenderContext(context);
   host.setEvent(event);
@@ -39,7 +44,16 @@ int32_t EventReplay::send(int32_t message, void* context, void* event,
   }
   host.setRenderContext(nullptr);
   host.setEvent(nullptr);
-  sent_.push_back({{"message", message}, {"result", result}});
+  return result;
+}
+
+int32_t EventReplay::send(int32_t message, void* context, void* event,
+                          std::initializer_list<int32_t> expected, const char* param) {
+  int32_t result = sendUnrecorded(message, context, event, expected);
+  nlohmann::ordered_json entry = {{"message", message}};
+  if (param) entry["param"] = param;
+  entry["result"] = result;
+  sent_.push_back(std::move(entry));
   return result;
 }
 
@@ -66,31 +80,59 @@ void EventReplay::reportChanges(const std::vector<refhost::ParamState>& before) 
   for (std::size_t i = 0; i < params.size() && i < before.size(); ++i) {
     if (params[i].state == before[i]) continue;
     WispParamEvent event{params[i].id.c_str()};
-    send(7, nullptr, &event, {1});
+    send(7, nullptr, &event, {1}, event.id);
   }
 }
 
-refhost::RgbaImage EventReplay::frameWithOverlay() {
+void EventReplay::drawOverlay(uint32_t texture, int32_t width, int32_t height) {
   refhost::Host& host = session_.host();
-  refhost::RenderFrame frame(host, session_.frameSettings(), script_.time);
-  send(12, &frame.context(), nullptr, {1});
-  send(10, &frame.context(), nullptr, {1});
-  // The overlay is drawn over the rendered picture, as over a viewer's.
-  host.setDrawTarget(frame.context().output.id, frame.context().width, frame.context().height);
+  host.setDrawTarget(texture, width, height);
   try {
-    send(1003, &viewer_, nullptr, {1});
+    sendUnrecorded(1003, &viewer_, nullptr, {1});
   } catch (...) {
     host.setDrawTarget(0, 0, 0);
     throw;
   }
   host.setDrawTarget(0, 0, 0);
+}
+
+EventReplay::ViewerState EventReplay::viewerState() {
+  refhost::Host& host = session_.host();
+  const refhost::FrameSettings& frame = session_.frameSettings();
+  drawOverlay(probeTarget_, frame.width, frame.height);
+  ViewerState state;
+  for (const std::string& line : host.callLog()) {
+    // "GetPointParam inputFrameTranslation3 0": the id is the second word; inputs are numbered
+    // by the id's last digit.
+    std::string::size_type id = line.find(" inputFrame");
+    if (id == std::string::npos) continue;
+    std::string::size_type end = line.find(' ', id + 1);
+    if (end != std::string::npos && std::isdigit(static_cast<unsigned char>(line[end - 1]))) {
+      state.selectedInput = line[end - 1] - '0';
+      break;
+    }
+  }
+  state.hover = sendUnrecorded(1012, &viewer_, nullptr, {0, 1}) == 1;
+  return state;
+}
+
+refhost::RgbaImage EventReplay::frameWithOverlay() try {
+  refhost::RenderFrame frame(session_.host(), session_.frameSettings(), script_.time);
+  sendUnrecorded(12, &frame.context(), nullptr, {1});
+  sendUnrecorded(10, &frame.context(), nullptr, {1});
+  // The overlay is drawn over the rendered picture, as over a viewer's.
+  drawOverlay(frame.context().output.id, frame.context().width, frame.context().height);
   return frame.readOutput();
+} catch (const std::bad_alloc&) {
+  throw session_.memoryError();
 }
 
 nlohmann::ordered_json EventReplay::play(refhost::FrameSink* overlays) {
   refhost::Host& host = session_.host();
   nlohmann::ordered_json results = nlohmann::ordered_json::array();
   nlohmann::ordered_json cursors = nlohmann::ordered_json::array();
+  nlohmann::ordered_json selectedInputs = nlohmann::ordered_json::array();
+  nlohmann::ordered_json hover = nlohmann::ordered_json::array();
   bool held = false;
   for (std::size_t i = 0; i < script_.events.size(); ++i) {
     throwIfStopped();
@@ -136,12 +178,22 @@ nlohmann::ordered_json EventReplay::play(refhost::FrameSink* overlays) {
     const std::vector<int32_t>& shapes = host.cursorShapes();
     cursors.push_back(shapes.empty() ? 0 : shapes.back());
     results.push_back(sent_);
+    ViewerState state = viewerState();
+    selectedInputs.push_back(state.selectedInput);
+    hover.push_back(state.hover);
     // The messages of the picture are not the event's.
     if (overlays) overlays->write(static_cast<int32_t>(i), frameWithOverlay());
   }
-  return {{"params", paramValuesJson(host.panel())}, {"undoSteps", host.undoStepNames()},
-          {"redoSteps", host.redoStepNames()},       {"cursors", cursors},
-          {"popupMenus", host.popupMenus()},         {"results", results}};
+  const refhost::UndoStack& undo = host.undoStack();
+  return {{"params", paramValuesJson(host.panel())},
+          {"undoSteps", host.undoStepNames()},
+          {"redoSteps", host.redoStepNames()},
+          {"openUndoStep", undo.isOpen() ? nlohmann::ordered_json(undo.openStepName()) : nullptr},
+          {"cursors", cursors},
+          {"selectedInputs", selectedInputs},
+          {"hover", hover},
+          {"popupMenus", host.popupMenus()},
+          {"results", results}};
 }
 
 }  // namespace veltrane_cli

@@ -4,6 +4,7 @@
 #include <climits>
 
 #include "json_fields.h"
+#include "json_file.h"
 
 namespace veltrane_cli {
 namespace {
@@ -33,7 +34,7 @@ uint32_t readKey(const JsonField& field) {
     if (name == "Escape") return kKeyEscape;
     field.fail(expected);
   }
-  if (!field.present() || !field.json().is_number_integer()) field.fail(expected);
+  if (!field.isWholeNumber()) field.fail(expected);
   return static_cast<uint32_t>(field.integerIn(0, INT32_MAX));
 }
 

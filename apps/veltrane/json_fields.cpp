@@ -1,8 +1,8 @@
 // Path-aware typed reads of JSON values and the errors they raise.
 #include "json_fields.h"
 
+#include <cctype>
 #include <cmath>
-#include <fstream>
 #include <sstream>
 
 namespace veltrane_cli {
@@ -15,21 +15,20 @@ std::string shown(const nlohmann::json& value) {
 
 }  // namespace
 
+std::string fieldName(const std::string& key) {
+  bool plain = !key.empty() && key.size() <= 60;
+  for (char c : key) plain = plain && std::isprint(static_cast<unsigned char>(c));
+  if (plain) return key;
+  std::string quoted =
+      nlohmann::json(key).dump(-1, ' ', false, nlohmann::json::error_handler_t::replace);
+  return quoted.size() > 60 ? quoted.substr(0, 56) + "...\"" : quoted;
+}
+
 std::string numberText(double value) {
   std::ostringstream text;
   text.precision(15);
   text << value;
   return text.str();
-}
-
-nlohmann::json readJsonFile(const std::string& path) {
-  std::ifstream in(path);
-  if (!in) throw FieldError(path + ": cannot be read");
-  try {
-    return nlohmann::json::parse(in);
-  } catch (const nlohmann::json::parse_error& error) {
-    throw FieldError(path + ": not valid JSON: " + error.what());
-  }
 }
 
 JsonField::JsonField(const nlohmann::json& document, const std::string& file)
@@ -41,7 +40,8 @@ JsonField JsonField::member(const std::string& name) const {
     auto found = value_->find(name);
     if (found != value_->end()) child = &*found;
   }
-  return JsonField(child, path_.empty() ? name : path_ + "." + name, file_);
+  std::string shownName = fieldName(name);
+  return JsonField(child, path_.empty() ? shownName : path_ + "." + shownName, file_);
 }
 
 JsonField JsonField::element(std::size_t index) const {
@@ -66,7 +66,8 @@ void JsonField::requireObject(std::initializer_list<const char*> allowedMembers)
       list += std::string(list.empty() ? "" : ", ") + name;
     }
     if (!known) {
-      JsonField unknown(&it.value(), path_.empty() ? it.key() : path_ + "." + it.key(), file_);
+      std::string name = fieldName(it.key());
+      JsonField unknown(&it.value(), path_.empty() ? name : path_ + "." + name, file_);
       unknown.fail("no such field (known fields: " + list + ")");
     }
   }
@@ -91,10 +92,23 @@ double JsonField::numberIn(double minimum, double maximum) const {
   return value;
 }
 
+bool JsonField::isWholeNumber() const {
+  if (!present() || !value_->is_number()) return false;
+  if (value_->is_number_integer()) return true;
+  double value = value_->get<double>();
+  return std::isfinite(value) && std::trunc(value) == value;
+}
+
 int32_t JsonField::integerIn(int64_t minimum, int64_t maximum) const {
   std::string what =
       "a whole number from " + std::to_string(minimum) + " to " + std::to_string(maximum);
-  if (!present() || !value_->is_number_integer()) fail(what);
+  if (!isWholeNumber()) fail(what);
+  if (value_->is_number_float()) {
+    // Compared as a double first: a whole number written with a fraction can exceed int64.
+    double value = value_->get<double>();
+    if (value < static_cast<double>(minimum) || value > static_cast<double>(maximum)) fail(what);
+    return static_cast<int32_t>(value);
+  }
   int64_t value = value_->is_number_unsigned()
                       ? static_cast<int64_t>(std::min<uint64_t>(value_->get<uint64_t>(), INT64_MAX))
                       : value_->get<int64_t>();
@@ -110,6 +124,13 @@ bool JsonField::boolean() const {
 std::string JsonField::string(const std::string& what) const {
   if (!isString()) fail(what);
   return value_->get<std::string>();
+}
+
+std::string JsonField::fileName(const std::string& what) const {
+  std::string name = string(what);
+  if (name.empty()) fail(what);
+  if (name.find('\0') != std::string::npos) fail(what + " without NUL characters");
+  return name;
 }
 
 }  // namespace veltrane_cli

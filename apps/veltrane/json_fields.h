@@ -17,9 +17,6 @@ class FieldError : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-// Reads a JSON file; throws FieldError naming the file for an unreadable or malformed one.
-nlohmann::json readJsonFile(const std::string& path);
-
 class JsonField {
  public:
   // The document's top level.
@@ -40,12 +37,16 @@ class JsonField {
   void requireObject(std::initializer_list<const char*> allowedMembers) const;
   std::size_t arraySize(std::size_t minimum, std::size_t maximum, const std::string& what) const;
   bool isNumber() const { return present() && value_->is_number(); }
+  // An integer, or a number written with a fraction of zero ("64.0", "1e3").
+  bool isWholeNumber() const;
   bool isString() const { return present() && value_->is_string(); }
   double number(const std::string& what) const;
   double numberIn(double minimum, double maximum) const;
   int32_t integerIn(int64_t minimum, int64_t maximum) const;
   bool boolean() const;
   std::string string(const std::string& what) const;
+  // A non-empty string without NUL characters, which a file name cannot hold.
+  std::string fileName(const std::string& what) const;
 
  private:
   JsonField(const nlohmann::json* value, std::string path, const std::string* file)
@@ -55,6 +56,10 @@ class JsonField {
   std::string path_;
   const std::string* file_;
 };
+
+// An object key as a message shows it: as written when it is short and printable, else quoted
+// with escapes and shortened, so that a message stays one line.
+std::string fieldName(const std::string& key);
 
 // A number without trailing noise: the shortest text that reads back as the same float.
 std::string numberText(double value);

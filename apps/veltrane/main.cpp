@@ -2,6 +2,7 @@
 // turns any error into one line on stderr and a non-zero exit status.
 #include <cstdio>
 #include <exception>
+#include <new>
 #include <string>
 #include <vector>
 
@@ -22,6 +23,8 @@ const Command kCommands[] = {
      &veltrane_cli::runInteract},
     {"bench", "measure milliseconds per frame across frame sizes and cut counts",
      &veltrane_cli::runBench},
+    {"soak", "render a scene's frames many times over and watch resident memory",
+     &veltrane_cli::runSoak},
 };
 
 void printUsage(std::FILE* out) {
@@ -71,6 +74,9 @@ int main(int argc, char** argv) {
   } catch (const veltrane_cli::Stopped& stop) {
     std::fprintf(stderr, "veltrane %s: %s\n", chosen->name, stop.what());
     return 128 + stop.signal();  // as a shell reports a process ended by the signal
+  } catch (const std::bad_alloc&) {
+    std::fprintf(stderr, "veltrane %s: out of memory\n", chosen->name);
+    return 1;
   } catch (const std::exception& error) {
     std::fprintf(stderr, "veltrane %s: %s\n", chosen->name, error.what());
     return 1;

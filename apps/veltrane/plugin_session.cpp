@@ -33,10 +33,15 @@ PluginSession::~PluginSession() {
 int32_t PluginSession::send(int32_t message, std::initializer_list<int32_t> expected) {
   refhost::GlContext* gl = host_->gl();
   if (gl) gl->clearErrors();
+  // The log then holds this message's calls only: what a caller may inspect, and never more
+  // than one message's worth over a long render.
+  host_->clearCallLog();
   int32_t result = host_->send(message);
   reportHostProblems();
-  // Nothing here reads the call log; a long render would only pile it up.
-  host_->clearCallLog();
+  // Nothing here reads the host's message history or frame requests; over a long render they
+  // would grow by every message.
+  host_->clearMessageHistory();
+  host_->clearFrameRequests();
   std::string what = "message " + std::to_string(message);
   bool accepted = expected.size() == 0;
   for (int32_t value : expected) accepted = accepted || value == result;

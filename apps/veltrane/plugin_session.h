@@ -29,7 +29,8 @@ class PluginSession {
   // Sends the message and checks afterwards that it answered one of `expected` (any answer
   // when empty), that no texture or buffer handed to the plug-in is outstanding and that GL
   // recorded no error. Throws std::runtime_error saying which message broke which rule. The
-  // host's own complaints about the plug-in's calls are printed to stderr once each.
+  // host's own complaints about the plug-in's calls are printed to stderr once each; its call
+  // log holds the calls of this message only.
   int32_t send(int32_t message, std::initializer_list<int32_t> expected = {1});
 
   // 0 (load) and 2 (declare the parameters).

@@ -5,6 +5,7 @@
 #include <filesystem>
 
 #include "json_fields.h"
+#include "json_file.h"
 #include "refhost/params.h"
 
 namespace veltrane_cli {
@@ -23,6 +24,17 @@ std::string patternList() {
   for (const std::string& name : refhost::patternNames())
     list += (list.empty() ? "\"" : ", \"") + name + "\"";
   return list;
+}
+
+// Why the path cannot be a media file, in words that follow the path; empty when it can.
+std::string mediaFileProblem(const std::filesystem::path& path) {
+  std::error_code error;
+  std::filesystem::file_status status = std::filesystem::status(path, error);
+  if (status.type() == std::filesystem::file_type::not_found) return "does not exist";
+  if (error) return "cannot be opened: " + error.message();
+  if (std::filesystem::is_directory(status)) return "is a directory";
+  if (!std::filesystem::is_regular_file(status)) return "is not a regular file";
+  return "";
 }
 
 MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
@@ -44,12 +56,11 @@ MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
     return MediaSpec::ofColour(rgba);
   }
   JsonField file = field.member("file");
-  std::filesystem::path path(file.string("a file name"));
-  if (path.empty()) file.fail("a file name");
+  std::filesystem::path path(file.fileName("a file name"));
   if (path.is_relative()) path = std::filesystem::path(baseDirectory) / path;
-  if (!std::filesystem::is_regular_file(path))
-    file.fail("an image or video file (relative to the scene file; " + path.string() +
-              " does not exist)");
+  if (std::string problem = mediaFileProblem(path); !problem.empty())
+    file.fail("an image or video file (relative to the scene file; " + path.string() + " " +
+              problem + ")");
   MediaSpec spec = MediaSpec::ofFile(path.lexically_normal().string());
   try {
     refhost::openMediaSource(spec);

@@ -28,7 +28,7 @@ ParamValue readChoice(const JsonField& field, const Param& param) {
     }
     field.fail(expected);
   }
-  if (!field.present() || !field.json().is_number_integer()) field.fail(expected);
+  if (!field.isWholeNumber()) field.fail(expected);
   return ParamValue::ofInt(field.integerIn(0, count - 1));
 }
 

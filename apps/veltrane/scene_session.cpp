@@ -8,7 +8,9 @@ namespace veltrane_cli {
 
 SceneSession::SceneSession(const Scene& scene, const std::string& modulePath,
                            refhost::GlProfile profile, int32_t hostId)
-    : plugin_(modulePath, profile) {
+    : plugin_(modulePath, profile),
+      file_(scene.file),
+      layerCount_(scene.composition.layers.size()) {
   refhost::Host& host = plugin_.host();
   host.setHostId(hostId);
   refhost::InstalledComposition installed = refhost::installComposition(host, scene.composition);
@@ -56,18 +58,32 @@ void SceneSession::setParams(const std::vector<ParamSetting>& settings) {
   }
 }
 
+std::runtime_error SceneSession::memoryError() const {
+  std::string layers = layerCount_ == 0   ? ""
+                       : layerCount_ == 1 ? " and 1 layer"
+                                          : " and " + std::to_string(layerCount_) + " layers";
+  return std::runtime_error(file_ + ": width, height: not enough memory for frames of " +
+                            std::to_string(settings_.width) + "x" +
+                            std::to_string(settings_.height) + layers +
+                            "; expected a smaller frame size");
+}
+
 refhost::RgbaImage SceneSession::render(int32_t frame) {
-  refhost::RenderFrame context(host(), settings_, frame);
-  host().setRenderContext(&context.context());
   try {
-    plugin_.send(12);
-    plugin_.send(10);
-  } catch (...) {
+    refhost::RenderFrame context(host(), settings_, frame);
+    host().setRenderContext(&context.context());
+    try {
+      plugin_.send(12);
+      plugin_.send(10);
+    } catch (...) {
+      host().setRenderContext(nullptr);
+      throw;
+    }
     host().setRenderContext(nullptr);
-    throw;
+    return context.readOutput();
+  } catch (const std::bad_alloc&) {
+    throw memoryError();
   }
-  host().setRenderContext(nullptr);
-  return context.readOutput();
 }
 
 }  // namespace veltrane_cli

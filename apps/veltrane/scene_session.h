@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <stdexcept>
 #include <string>
 
 #include "plugin_session.h"
@@ -31,7 +32,12 @@ class SceneSession {
   void applyParams(const nlohmann::json& params, const std::string& file);
 
   // Messages 12 and 10 with the frame's render context; the output read back, top row first.
+  // Running out of memory on the way is reported as the scene's frame size being too large.
   refhost::RgbaImage render(int32_t frame);
+
+  // The error for an allocation that failed while this scene ran: it names the scene file and
+  // the frame size, the one thing a user can change about it.
+  std::runtime_error memoryError() const;
 
   // Messages 4 and 1.
   void finish() { plugin_.finish(); }
@@ -40,6 +46,8 @@ class SceneSession {
   void setParams(const std::vector<ParamSetting>& settings);
 
   PluginSession plugin_;
+  std::string file_;
+  std::size_t layerCount_ = 0;
   refhost::FrameSettings settings_;
   std::set<std::string> layerGuids_;
 };

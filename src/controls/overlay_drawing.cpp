@@ -14,6 +14,7 @@
 #include "gl/draws.h"
 #include "gl/effect_data.h"
 #include "gl/textured_quad.h"
+#include "render/gl_startup.h"
 #include "shaders/program_names.h"
 #include "shaders/shader_identifiers.h"
 
@@ -265,7 +266,8 @@ void drawPointerMarker(const OverlayDraw& draw, const char* program) {
 int drawOverlay(WispHost* host, tagWispAPI* api) {
   EffectInstance* instance = instanceOf(api);
   const auto* context = static_cast<const WispViewerContext*>(api ? api->renderContext : nullptr);
-  if (!instance || !context || !api->pluginData) return 1;
+  if (!instance || !context || !programsBuilt(static_cast<const EffectData*>(api->pluginData)))
+    return 1;
   // A named context is a secondary view of the host's; handles belong to the main viewer only.
   if (context->name && context->name[0] != '\0') return 1;
 

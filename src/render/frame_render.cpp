@@ -18,6 +18,7 @@
 #include "gl/render_target.h"
 #include "gl/texture_units.h"
 #include "gl/textured_quad.h"
+#include "render/gl_startup.h"
 #include "render/input_capture.h"
 #include "shaders/program_names.h"
 #include "shaders/shader_identifiers.h"
@@ -121,8 +122,12 @@ void drawRegions(const RegionList& regions, WispHost* host, tagWispAPI* api,
 }  // namespace
 
 int renderFrame(WispHost* host, tagWispAPI* api) {
-  if (!api->renderContext || !api->pluginData) return 1;
+  if (!api->renderContext || !programsBuilt(static_cast<const EffectData*>(api->pluginData)))
+    return 1;
   const WispRenderContext& context = *static_cast<const WispRenderContext*>(api->renderContext);
+  // A frame without pixels has nothing to show, and a target of its size could not even be
+  // drawn into: an empty texture leaves the framebuffer incomplete.
+  if (context.width <= 0 || context.height <= 0) return 1;
   const EffectData& registry = *static_cast<const EffectData*>(api->pluginData);
   const genVec2 frameSize{static_cast<float>(context.width), static_cast<float>(context.height)};
 

@@ -79,4 +79,16 @@ int prepareGl(WispHost* /*host*/, tagWispAPI* api) {
   return 1;
 }
 
+bool programsBuilt(const EffectData* registry) {
+  if (registry == nullptr) return false;
+  for (const char* name :
+       {programs::kSplitScreen, programs::kCombineBorder, programs::kDistanceField,
+        programs::kLayerAlignment, programs::kClear, programs::kCopy, programs::kCutPositionControl,
+        programs::kCutMoveHandle, programs::kRotationControl, programs::kMoveHandle,
+        programs::kCutHandle, programs::kQuadControl, programs::kDirectionScaleControl}) {
+    if (registry->programIndex(name) < 0) return false;
+  }
+  return true;
+}
+
 }  // namespace veltrane
