@@ -76,18 +76,35 @@ GlContext::GlContext(GlProfile profile) : profile_(profile) {
   }
   context_ = context;
   makeCurrent();
+  watchDebugOutput();
+}
+
+GlContext::GlContext(GlProfile profile, std::function<void()> makeCurrent)
+    : profile_(profile), adoptedMakeCurrent_(std::move(makeCurrent)) {
+  watchDebugOutput();
+}
+
+std::unique_ptr<GlContext> GlContext::adoptCurrent(GlProfile profile,
+                                                   std::function<void()> makeCurrent) {
+  return std::unique_ptr<GlContext>(new GlContext(profile, std::move(makeCurrent)));
+}
+
+void GlContext::watchDebugOutput() {
   glewExperimental = GL_TRUE;
   glewInit();  // answers "no GLX display" headless but loads every entry point
   glGetError();
-  if (!glDebugMessageCallback) {
-    throw std::runtime_error("cannot create a headless OpenGL context: no glDebugMessageCallback");
-  }
+  if (!glDebugMessageCallback)
+    throw std::runtime_error("the OpenGL context offers no glDebugMessageCallback");
   glEnable(GL_DEBUG_OUTPUT);
   glEnable(GL_DEBUG_OUTPUT_SYNCHRONOUS);
   glDebugMessageCallback(reinterpret_cast<GLDEBUGPROC>(&GlContext::debugCallback), this);
 }
 
 GlContext::~GlContext() {
+  if (adoptedMakeCurrent_) {
+    glDebugMessageCallback(nullptr, nullptr);
+    return;
+  }
   if (context_) {
     glDebugMessageCallback(nullptr, nullptr);
     eglMakeCurrent(display_, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
@@ -98,6 +115,7 @@ GlContext::~GlContext() {
 }
 
 void GlContext::makeCurrent() {
+  if (adoptedMakeCurrent_) return adoptedMakeCurrent_();
   if (!eglMakeCurrent(display_, EGL_NO_SURFACE, EGL_NO_SURFACE, context_))
     throw std::runtime_error(eglErrorText("eglMakeCurrent"));
 }

@@ -1,7 +1,8 @@
-// A headless OpenGL context made through EGL without a display, with a debug callback that
-// records every GL error so tests can assert there were none.
+// A headless OpenGL context made through EGL without a display (or one adopted from a window),
+// with a debug callback that records every GL error so tests can assert there were none.
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -22,6 +23,11 @@ class GlContext {
   // Creates a 4.1+ context of the given profile and makes it current. Throws std::runtime_error
   // naming the step that failed when no context can be made.
   explicit GlContext(GlProfile profile = GlProfile::Core);
+  // Adopts the context current on this thread (a window's) instead of making one: entry points
+  // and the debug callback are set up as for an own context; `makeCurrent` is how its owner
+  // makes it current again. The owner destroys the context, after this object is gone.
+  static std::unique_ptr<GlContext> adoptCurrent(GlProfile profile,
+                                                 std::function<void()> makeCurrent);
   ~GlContext();
   GlContext(const GlContext&) = delete;
   GlContext& operator=(const GlContext&) = delete;
@@ -40,12 +46,16 @@ class GlContext {
   const std::vector<GlDebugMessage>& messages() const { return messages_; }
 
  private:
+  GlContext(GlProfile profile, std::function<void()> makeCurrent);
+  // Loads the entry points through GLEW and installs the debug callback in the current context.
+  void watchDebugOutput();
   static void debugCallback(unsigned source, unsigned type, unsigned id, unsigned severity,
                             int length, const char* message, const void* user);
 
   GlProfile profile_;
   void* display_ = nullptr;
   void* context_ = nullptr;
+  std::function<void()> adoptedMakeCurrent_;  // set only for an adopted context
   std::vector<GlDebugMessage> errors_;
   std::vector<GlDebugMessage> messages_;
 };

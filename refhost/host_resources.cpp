@@ -53,6 +53,12 @@ GlContext& Host::attachGl(GlProfile profile) {
   return *gl_;
 }
 
+GlContext& Host::attachGl(std::unique_ptr<GlContext> context) {
+  releaseGl();
+  gl_ = std::move(context);
+  return *gl_;
+}
+
 bool Host::requireGl(const char* operation) {
   if (gl_) return true;
   problem(std::string(operation) + ": no GL context attached");
