@@ -25,19 +25,7 @@ EventReplay::EventReplay(SceneSession& session, const EventScript& script)
 
 int32_t EventReplay::send(int32_t message, void* context, void* event,
                           std::initializer_list<int32_t> expected) {
-  refhost::Host& host = session_.host();
-  host.setRenderContext(context);
-  host.setEvent(event);
-  int32_t result = 0;
-  try {
-    result = session_.plugin().send(message, expected);
-  } catch (...) {
-    host.setRenderContext(nullptr);
-    host.setEvent(nullptr);
-    throw;
-  }
-  host.setRenderContext(nullptr);
-  host.setEvent(nullptr);
+  int32_t result = session_.plugin().send(message, context, event, expected);
   sent_.push_back({{"message", message}, {"result", result}});
   return result;
 }
