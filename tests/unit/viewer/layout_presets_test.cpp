@@ -1,0 +1,105 @@
+// Each layout preset, read back through the plug-in's own cut model and partition, divides the
+// frame into the regions it promises, each showing a different picture.
+#include "layout_presets.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <map>
+#include <set>
+
+#include "geometry/cut_model.h"
+#include "geometry/region_partition.h"
+#include "support/param_host.h"
+
+namespace veltrane_viewer {
+namespace {
+
+constexpr float kWidth = 1920;
+constexpr float kHeight = 1080;
+
+void write(testsupport::ParamHost& host, const ParamEdit& edit) {
+  const std::string& id = edit.id;
+  const refhost::ParamValue& v = edit.value;
+  auto startsWith = [&](const char* prefix) { return id.rfind(prefix, 0) == 0; };
+  if (startsWith("inputLayer"))
+    host.setLayer(id, v.layer);
+  else if (startsWith("cutPosition") || startsWith("inputFrameTranslation"))
+    host.setPoint(id, v.number[0], v.number[1]);
+  else if (id == "numberOfCuts" || id == "cutType" || startsWith("inputFrameShift"))
+    host.setInt(id, v.integer);
+  else
+    host.setFloat(id, v.number[0]);
+}
+
+// Area of each input's region as a fraction of the frame.
+std::map<int32_t, double> regionAreas(testsupport::ParamHost& host) {
+  plugin_glsl_types::genVec2 frame{kWidth, kHeight};
+  veltrane::CutList cuts = veltrane::readCutList(host.handle(), host.api(), 0, frame, false, 1);
+  std::map<int32_t, double> areas;
+  for (const veltrane::Region& region :
+       veltrane::partitionFrame(cuts, frame, host.intValue("cutType"))) {
+    for (const veltrane::RegionTriangle& t : region.triangles) {
+      const auto& [a, b, c] = t.vertices;
+      double area = ((b.x - a.x) * (c.y - a.y) - (b.y - a.y) * (c.x - a.x)) / 2;
+      areas[region.id] += area / (kWidth * kHeight);
+    }
+  }
+  for (auto it = areas.begin(); it != areas.end();) it = it->second > 1e-6 ? ++it : areas.erase(it);
+  return areas;
+}
+
+TEST(LayoutPresets, EachDividesTheFrameAsNamedWithADifferentPictureInEveryRegion) {
+  constexpr double kAny = -1;  // a region of its own, of whatever size its angle gives it
+  const std::map<std::string, std::map<int32_t, double>> expected = {
+      {"diagonal-2", {{0, 0.5}, {1, 0.5}}},
+      {"comic-3", {{0, kAny}, {1, kAny}, {2, kAny}}},
+      {"grid-2x2", {{0, 0.25}, {1, 0.25}, {2, 0.25}, {3, 0.25}}},
+      {"grid-3x3",
+       {{0, 1. / 9},
+        {1, 1. / 9},
+        {2, 1. / 9},
+        {3, 1. / 9},
+        {4, 1. / 9},
+        {5, 1. / 9},
+        {6, 1. / 9},
+        {7, 1. / 9},
+        {8, 1. / 9}}},
+      {"radial-3", {{1, kAny}, {2, kAny}, {3, kAny}}},
+      {"radial-4", {{1, kAny}, {2, kAny}, {3, kAny}, {4, kAny}}},
+      {"radial-6", {{1, kAny}, {2, kAny}, {3, kAny}, {4, kAny}, {5, kAny}, {6, kAny}}},
+      {"picture-in-picture", {{1, 8. / 9}, {2, 1. / 9}}},
+  };
+  std::vector<std::string> sources{refhost::kNoLayer};
+  for (int i = 1; i <= 8; ++i)
+    sources.push_back("d3e00000-0000-4000-8000-00000000000" + std::to_string(i));
+  ASSERT_EQ(layoutPresets().size(), expected.size());
+  for (std::size_t index = 0; index < layoutPresets().size(); ++index) {
+    const std::string stem = layoutPresets()[index].fileStem;
+    testsupport::ParamHost host;
+    for (const ParamEdit& edit : presetEdits(index, kWidth, kHeight, sources)) write(host, edit);
+    std::map<int32_t, double> areas = regionAreas(host);
+    const std::map<int32_t, double>& want = expected.at(stem);
+    std::set<std::string> shown;
+    ASSERT_EQ(areas.size(), want.size()) << stem;
+    for (const auto& [input, area] : want) {
+      ASSERT_TRUE(areas.count(input)) << stem << " shows no input " << input;
+      double tolerance = area == kAny ? 1 : 1e-4;  // any share of the frame, or this one
+      EXPECT_NEAR(areas[input], area == kAny ? 0.5 : area, tolerance) << stem << " " << input;
+      EXPECT_GT(areas[input], 0.05) << stem << " input " << input;
+      shown.insert(host.layerValue("inputLayer" + std::to_string(input)));
+    }
+    EXPECT_EQ(shown.size(), want.size()) << stem << ": two regions show the same picture";
+  }
+  // The inset's picture, scaled and moved, covers exactly its corner region.
+  testsupport::ParamHost pip;
+  for (const ParamEdit& edit : presetEdits(7, kWidth, kHeight, sources)) write(pip, edit);
+  auto centre = pip.pointValue("inputFrameTranslation2");
+  float half = pip.floatValue("inputFrameScale2") / 100 / 2;
+  EXPECT_NEAR(centre[0] - half * kWidth, kWidth / 6, 0.01);
+  EXPECT_NEAR(centre[1] + half * kHeight, kHeight / 2, 0.01);
+  EXPECT_THROW(presetEdits(layoutPresets().size(), kWidth, kHeight, sources), std::out_of_range);
+}
+
+}  // namespace
+}  // namespace veltrane_viewer
