@@ -17,5 +17,6 @@ int runInfo(const std::vector<std::string>& args);
 int runRender(const std::vector<std::string>& args);
 int runInteract(const std::vector<std::string>& args);
 int runBench(const std::vector<std::string>& args);
+int runView(const std::vector<std::string>& args);
 
 }  // namespace veltrane_cli

@@ -21,6 +21,8 @@ const Command kCommands[] = {
      &veltrane_cli::runInteract},
     {"bench", "measure milliseconds per frame across frame sizes and cut counts",
      &veltrane_cli::runBench},
+    {"view", "open a scene in a window: picture, handles, parameter panel, timeline, undo",
+     &veltrane_cli::runView},
 };
 
 void printUsage(std::FILE* out) {
