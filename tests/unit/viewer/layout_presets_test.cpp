@@ -10,6 +10,8 @@
 
 #include "geometry/cut_model.h"
 #include "geometry/region_partition.h"
+#include "scene_file.h"
+#include "scene_session.h"
 #include "support/param_host.h"
 
 namespace veltrane_viewer {
@@ -99,6 +101,23 @@ TEST(LayoutPresets, EachDividesTheFrameAsNamedWithADifferentPictureInEveryRegion
   EXPECT_NEAR(centre[0] - half * kWidth, kWidth / 6, 0.01);
   EXPECT_NEAR(centre[1] + half * kHeight, kHeight / 2, 0.01);
   EXPECT_THROW(presetEdits(layoutPresets().size(), kWidth, kHeight, sources), std::out_of_range);
+}
+
+// The example scenes are what the Presets menu makes of their composition.
+TEST(LayoutPresets, ExampleScenesHoldThePresets) {
+  for (std::size_t index = 0; index < layoutPresets().size(); ++index) {
+    std::string path = std::string(VELTRANE_SOURCE_DIR) + "/docs/examples/presets/" +
+                       layoutPresets()[index].fileStem + ".json";
+    veltrane_cli::Scene scene = veltrane_cli::loadScene(path);
+    std::vector<std::string> sources{refhost::kNoLayer};
+    for (const refhost::CompositionLayer& layer : scene.composition.layers)
+      sources.push_back(layer.layer.guid);
+    veltrane_cli::SceneSession session(scene, VELTRANE_MODULE_PATH, refhost::GlProfile::Core);
+    for (const ParamEdit& edit :
+         presetEdits(index, scene.composition.width, scene.composition.height, sources))
+      EXPECT_TRUE(session.host().valueAt(edit.id, 0) == edit.value) << path << ": " << edit.id;
+    session.finish();
+  }
 }
 
 }  // namespace
