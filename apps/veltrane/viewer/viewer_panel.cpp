@@ -141,10 +141,10 @@ void drawParam(ViewerSession& session, const Param& param, const std::vector<Lay
   ImGui::PushID(param.id.c_str());
   int32_t frame = session.frame();
   KeyState state = keyState(param, frame);
+  // Disabled as the plug-in set it: greyed, still showing its value, its keys untouchable.
+  ImGui::BeginDisabled(!param.enabled);
   if (keyToggle(state, frame)) session.toggleKey(param.id);
   ImGui::SameLine();
-  // Disabled as the plug-in set it: greyed, still showing its value.
-  ImGui::BeginDisabled(!param.enabled);
   if (state != KeyState::Static) ImGui::PushStyleColor(ImGuiCol_Text, kAnimatedText);
   std::string label = param.displayName + "##value";
   valueWidget(session, param, param.valueAt(frame), layers, label.c_str());
