@@ -440,14 +440,14 @@ void ViewerWindow::save() {
   }
   session_->setStatus("saved " + path, false);
   // What was saved and the edits that led to it, for the terminal the viewer runs in.
-  std::string history;
-  for (const std::string& step : session_->host().undoStepNames())
-    history += (history.empty() ? "\"" : ", \"") + step + "\"";
-  std::string undone;
-  for (const std::string& step : session_->host().redoStepNames())
-    undone += (undone.empty() ? "\"" : ", \"") + step + "\"";
-  std::printf("saved %s; undo history: %s; undone: %s\n", path.c_str(), history.c_str(),
-              undone.c_str());
+  auto quotedList = [](const std::vector<std::string>& steps) {
+    std::string list;
+    for (const std::string& step : steps) list += (list.empty() ? "\"" : ", \"") + step + "\"";
+    return list.empty() ? std::string("none") : list;
+  };
+  std::printf("saved %s; undo history: %s; undone: %s\n", path.c_str(),
+              quotedList(session_->host().undoStepNames()).c_str(),
+              quotedList(session_->host().redoStepNames()).c_str());
   std::fflush(stdout);
 }
 

@@ -14,13 +14,13 @@ namespace {
 constexpr int kFbWidth = 1000;
 constexpr int kFbHeight = 700;
 
-struct ViewCase {
-  const char* name;
-  std::function<void(ViewMapping&)> arrange;
-};
+void expectSame(Point2 a, Point2 b, double tolerance, const char* what) {
+  EXPECT_NEAR(a.x, b.x, tolerance) << what;
+  EXPECT_NEAR(a.y, b.y, tolerance) << what;
+}
 
 TEST(ViewMapping, ProjectionAndPointerConversionAgree) {
-  const ViewCase cases[] = {
+  const std::pair<const char*, std::function<void(ViewMapping&)>> cases[] = {
       {"fitted", [](ViewMapping&) {}},
       {"actual pixels", [](ViewMapping& v) { v.showActualPixels(); }},
       {"zoomed in about a point",
@@ -33,23 +33,21 @@ TEST(ViewMapping, ProjectionAndPointerConversionAgree) {
          v.panBy(-41.5, 17);
        }},
   };
-  for (const ViewCase& c : cases) {
+  for (const auto& [name, arrange] : cases) {
     ViewMapping view(640, 360);
     view.setArea({0, 20, 600, 640});
-    c.arrange(view);
+    arrange(view);
     refhost::Matrix4 m = view.projection(kFbWidth, kFbHeight);
     for (Point2 corner : {Point2{0, 0}, Point2{640, 360}, Point2{211.25, 97.5}}) {
       Point2 pixel = view.toPixel(corner);
-      Point2 back = view.toCorner(pixel);
-      EXPECT_NEAR(back.x, corner.x, 1e-9) << c.name;
-      EXPECT_NEAR(back.y, corner.y, 1e-9) << c.name;
+      expectSame(view.toCorner(pixel), corner, 1e-9, name);
       // Column-major: clip = m * (x, y, 0, 1); GL rows count from the bottom.
-      double clipX = m[0] * corner.x + m[4] * corner.y + m[12];
-      double clipY = m[1] * corner.x + m[5] * corner.y + m[13];
-      EXPECT_NEAR((clipX + 1) / 2 * kFbWidth, pixel.x, 1e-3) << c.name;
-      EXPECT_NEAR(kFbHeight - (clipY + 1) / 2 * kFbHeight, pixel.y, 1e-3) << c.name;
+      Point2 clip{m[0] * corner.x + m[4] * corner.y + m[12],
+                  m[1] * corner.x + m[5] * corner.y + m[13]};
+      expectSame({(clip.x + 1) / 2 * kFbWidth, kFbHeight - (clip.y + 1) / 2 * kFbHeight}, pixel,
+                 1e-3, name);
     }
-    EXPECT_DOUBLE_EQ(view.viewScale(), 1 / view.zoom()) << c.name;
+    EXPECT_DOUBLE_EQ(view.viewScale(), 1 / view.zoom()) << name;
   }
 }
 
@@ -63,63 +61,38 @@ TEST(ViewMapping, FitShowsTheWholeFrameCentredAndRefitsWithTheArea) {
     view.setArea(c.area);
     PixelRect frame = view.frameRect();
     EXPECT_DOUBLE_EQ(view.zoom(), c.zoom);
-    EXPECT_NEAR(frame.x + frame.width / 2, c.area.x + c.area.width / 2, 1e-9);
-    EXPECT_NEAR(frame.y + frame.height / 2, c.area.y + c.area.height / 2, 1e-9);
+    expectSame({frame.x + frame.width / 2, frame.y + frame.height / 2},
+               {c.area.x + c.area.width / 2, c.area.y + c.area.height / 2}, 1e-9, "centred");
     // The corner-space origin is the frame's bottom-left corner, y up.
-    Point2 bottomLeft = view.toCorner({frame.x, frame.y + frame.height});
-    EXPECT_NEAR(bottomLeft.x, 0, 1e-9);
-    EXPECT_NEAR(bottomLeft.y, 0, 1e-9);
+    expectSame(view.toCorner({frame.x, frame.y + frame.height}), {0, 0}, 1e-9, "origin");
   }
   ViewMapping view(640, 360);
   view.setArea({0, 0, 640, 360});
   view.setArea({0, 0, 1280, 720});
-  EXPECT_TRUE(view.fitted());
   EXPECT_DOUBLE_EQ(view.zoom(), 2);
+  view.showActualPixels();
+  EXPECT_EQ(view.frameRect().x, 320);  // whole pixels, one frame pixel each
+  EXPECT_EQ(view.frameRect().y, 180);
 }
 
-TEST(ViewMapping, ZoomKeepsThePivotAndItsLimitsAndResizingKeepsTheCentre) {
+TEST(ViewMapping, ZoomKeepsThePivotResizingKeepsTheCentreEventsRound) {
   ViewMapping view(320, 180);
   view.setArea({0, 0, 800, 600});
   Point2 pivot{123, 456};
   Point2 under = view.toCorner(pivot);
   view.zoomAbout(pivot, 1e6);
   EXPECT_DOUBLE_EQ(view.zoom(), ViewMapping::kLargestZoom);
-  Point2 after = view.toCorner(pivot);
-  EXPECT_NEAR(after.x, under.x, 1e-9);
-  EXPECT_NEAR(after.y, under.y, 1e-9);
+  expectSame(view.toCorner(pivot), under, 1e-9, "pivot");
   view.zoomAbout(pivot, std::numeric_limits<double>::quiet_NaN());
   view.zoomAbout(pivot, 1e-9);
   EXPECT_DOUBLE_EQ(view.zoom(), ViewMapping::kSmallestZoom);
-  EXPECT_FALSE(view.fitted());
-
   Point2 centre = view.toCorner({400, 300});
   view.setArea({100, 50, 400, 200});
-  Point2 moved = view.toCorner({300, 150});
-  EXPECT_NEAR(moved.x, centre.x, 1e-9);
-  EXPECT_NEAR(moved.y, centre.y, 1e-9);
-}
-
-TEST(ViewMapping, ActualPixelsSitOnWholePixelsAndEventsRoundToFramePixels) {
-  ViewMapping view(321, 181);
-  view.setArea({0, 19, 881, 733});
-  view.showActualPixels();
-  PixelRect frame = view.frameRect();
-  EXPECT_EQ(view.zoom(), 1);
-  EXPECT_EQ(frame.x, std::floor(frame.x));
-  EXPECT_EQ(frame.y, std::floor(frame.y));
-
-  struct Case {
-    Point2 corner;
-    int32_t x, y;
-  } cases[] = {{{10.4, -3.6}, 10, -4},
-               {{0.5, -0.5}, 1, -1},
-               {{1e30, -1e30}, 1000000000, -1000000000},
-               {{std::nan(""), 7}, 0, 7}};
-  for (const Case& c : cases) {
-    EventPosition p = eventPosition(c.corner);
-    EXPECT_EQ(p.x, c.x);
-    EXPECT_EQ(p.y, c.y);
-  }
+  expectSame(view.toCorner({300, 150}), centre, 1e-9, "centre");
+  // Events carry the nearest whole frame pixel, whatever the pointer's position.
+  EventPosition near = eventPosition({10.5, -3.6}), far = eventPosition({1e30, std::nan("")});
+  EXPECT_EQ(std::make_pair(near.x, near.y), std::make_pair(11, -4));
+  EXPECT_EQ(std::make_pair(far.x, far.y), std::make_pair(1000000000, 0));
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 // render of what it saves with the handles drawn where they are.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <filesystem>
@@ -18,7 +19,6 @@ namespace {
 
 constexpr int kWidth = 320;
 constexpr int kHeight = 180;
-const char kBars[] = "d3e00000-0000-4000-8000-000000000001";
 
 std::string text(const std::string& path) {
   std::ifstream in(path);
@@ -71,15 +71,14 @@ class ViewerWindow : public ::testing::Test {
   // Screen coordinates of a corner-space point (origin at the frame's bottom-left, y up).
   std::string sx(double x) const { return std::to_string(x0_ + static_cast<int>(x)); }
   std::string sy(double y) const { return std::to_string(y0_ + kHeight - static_cast<int>(y)); }
+  // xdotool: `before`, a drag between two corner-space points through their middle, `after`.
   void drag(const std::vector<std::string>& before, double x, double y, double toX, double toY,
             const std::vector<std::string>& after = {}) {
     std::vector<std::string> args{"xdotool"};
     args.insert(args.end(), before.begin(), before.end());
-    for (const std::string& a :
-         {std::string("mousemove"), sx(x), sy(y), std::string("mousedown"), std::string("1"),
-          std::string("mousemove"), sx((x + toX) / 2), sy((y + toY) / 2), std::string("mousemove"),
-          sx(toX), sy(toY), std::string("mouseup"), std::string("1")})
-      args.push_back(a);
+    args.insert(args.end(),
+                {"mousemove", sx(x), sy(y), "mousedown", "1", "mousemove", sx((x + toX) / 2),
+                 sy((y + toY) / 2), "mousemove", sx(toX), sy(toY), "mouseup", "1"});
     args.insert(args.end(), after.begin(), after.end());
     x_.run(args);
   }
@@ -133,37 +132,26 @@ TEST_F(ViewerWindow, ShowsTheRenderOfWhatItSavesWithTheHandlesOverIt) {
           std::to_string(x0_ - 40), sy(90)});
   saveAndWait();
   refhost::RgbaImage expected = render(saved_);
-  struct Zone {
-    double x, y, radius;  // corner space
-    int differing = 0;
-  } handles[] = {{200, 60, 18}, {160, 190, 18}};
-  int edges = 0;
-  int elsewhere = 0;
-  auto countDifferences = [&](const refhost::RgbaImage& screen) {
-    edges = elsewhere = 0;
-    for (Zone& zone : handles) zone.differing = 0;
+  // Differing pixels by where they lie: at the cut's direction handle, at the input's rotation
+  // handle (above the frame), along the frame's edges (the input's rectangle), elsewhere.
+  int counts[4] = {};
+  auto handlesWhereTheyAre = [&](const refhost::RgbaImage& screen) {
+    std::fill(counts, counts + 4, 0);
     for (int y = 0; y < kHeight; ++y) {
       for (int x = 0; x < kWidth; ++x) {
         if (std::memcmp(screen.at(x0_ + x, y0_ + y), expected.at(x, y), 3) == 0) continue;
         double cx = x + 0.5, cy = kHeight - y - 0.5;
-        bool explained = false;
-        for (Zone& zone : handles) {
-          if (std::hypot(cx - zone.x, cy - zone.y) > zone.radius) continue;
-          ++zone.differing;
-          explained = true;
-        }
-        if (std::min({x, y, kWidth - 1 - x, kHeight - 1 - y}) < 5) {
-          ++edges;
-          explained = true;
-        }
-        if (!explained) ++elsewhere;
+        ++counts[std::hypot(cx - 200, cy - 60) < 18                      ? 0
+                 : std::hypot(cx - 160, cy - 190) < 18                   ? 1
+                 : std::min({x, y, kWidth - 1 - x, kHeight - 1 - y}) < 5 ? 2
+                                                                         : 3];
       }
     }
-    return elsewhere == 0 && handles[0].differing > 20 && edges > 200;
+    return counts[3] == 0 && counts[0] > 20 && counts[2] > 200;
   };
-  EXPECT_TRUE(waitUntil([&] { return countDifferences(x_.screenshot(dir_)); }, 30))
-      << "direction handle " << handles[0].differing << ", rectangle edges " << edges
-      << ", rotation handle " << handles[1].differing << ", elsewhere " << elsewhere;
+  EXPECT_TRUE(waitUntil([&] { return handlesWhereTheyAre(x_.screenshot(dir_)); }, 30))
+      << "direction handle " << counts[0] << ", rotation handle " << counts[1]
+      << ", rectangle edges " << counts[2] << ", elsewhere " << counts[3];
 }
 
 // A scene error reads as `veltrane render` words it; no display says so and what to do.

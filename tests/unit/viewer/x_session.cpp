@@ -7,6 +7,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstring>
 #include <memory>
@@ -17,30 +18,32 @@
 
 extern char** environ;
 
+namespace {
+
+// The null-terminated array of pointers posix_spawn takes.
+std::vector<char*> pointers(std::vector<std::string>& texts) {
+  std::vector<char*> out;
+  for (std::string& text : texts) out.push_back(text.data());
+  out.push_back(nullptr);
+  return out;
+}
+
+}  // namespace
+
 ChildProcess::ChildProcess(const std::vector<std::string>& argv,
                            const std::vector<std::string>& environment, const std::string& outPath,
                            const std::string& errPath) {
-  std::vector<std::string> entries;
-  auto overridden = [&](const std::string& entry) {
-    for (const std::string& change : environment) {
-      std::string name = change.substr(0, change.find('=') + 1);
-      if (entry.compare(0, name.size(), name) == 0) return true;
-    }
-    return false;
-  };
+  std::vector<std::string> entries, args = argv;
   for (char** entry = environ; *entry; ++entry) {
-    if (!overridden(*entry)) entries.push_back(*entry);
+    std::string name = std::string(*entry).substr(0, std::string(*entry).find('=') + 1);
+    if (std::none_of(environment.begin(), environment.end(),
+                     [&](const std::string& change) { return change.rfind(name, 0) == 0; }))
+      entries.push_back(*entry);
   }
   for (const std::string& change : environment) {
     if (change.back() != '=') entries.push_back(change);
   }
-  std::vector<char*> envp;
-  for (std::string& entry : entries) envp.push_back(entry.data());
-  envp.push_back(nullptr);
-  std::vector<std::string> args = argv;
-  std::vector<char*> argp;
-  for (std::string& arg : args) argp.push_back(arg.data());
-  argp.push_back(nullptr);
+  std::vector<char*> argp = pointers(args), envp = pointers(entries);
   posix_spawn_file_actions_t actions;
   posix_spawn_file_actions_init(&actions);
   posix_spawn_file_actions_addopen(&actions, 1, outPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC,
