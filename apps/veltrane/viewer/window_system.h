@@ -24,7 +24,7 @@ constexpr int kInitialHeight = 800;
 class GlfwLibrary {
  public:
   GlfwLibrary();
-  ~GlfwLibrary() { glfwTerminate(); }
+  ~GlfwLibrary();
   GlfwLibrary(const GlfwLibrary&) = delete;
   GlfwLibrary& operator=(const GlfwLibrary&) = delete;
 };
