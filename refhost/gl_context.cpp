@@ -10,22 +10,44 @@ namespace refhost {
 
 GlContext::GlContext(GlProfile profile) : profile_(profile) {
   createPlatformContext();
+  watchDebugOutput();
+}
+
+GlContext::GlContext(GlProfile profile, std::function<void()> makeCurrent)
+    : profile_(profile), adoptedMakeCurrent_(std::move(makeCurrent)) {
+  watchDebugOutput();
+}
+
+std::unique_ptr<GlContext> GlContext::adoptCurrent(GlProfile profile,
+                                                   std::function<void()> makeCurrent) {
+  return std::unique_ptr<GlContext>(new GlContext(profile, std::move(makeCurrent)));
+}
+
+void GlContext::watchDebugOutput() {
   glewExperimental = GL_TRUE;
   glewInit();  // headless EGL answers "no GLX display" here but every entry point is loaded
   glGetError();
-  if (!glDebugMessageCallback) {
-    throw std::runtime_error("cannot create an OpenGL context: no glDebugMessageCallback");
-  }
+  if (!glDebugMessageCallback)
+    throw std::runtime_error("the OpenGL context offers no glDebugMessageCallback");
   glEnable(GL_DEBUG_OUTPUT);
   glEnable(GL_DEBUG_OUTPUT_SYNCHRONOUS);
   glDebugMessageCallback(reinterpret_cast<GLDEBUGPROC>(&GlContext::debugCallback), this);
 }
 
 GlContext::~GlContext() {
+  if (adoptedMakeCurrent_) {
+    glDebugMessageCallback(nullptr, nullptr);
+    return;
+  }
   if (context_) {
     glDebugMessageCallback(nullptr, nullptr);
     destroyPlatformContext();
   }
+}
+
+void GlContext::makeCurrent() {
+  if (adoptedMakeCurrent_) return adoptedMakeCurrent_();
+  makePlatformContextCurrent();
 }
 
 void GlContext::finish() {

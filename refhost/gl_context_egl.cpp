@@ -84,7 +84,7 @@ void GlContext::destroyPlatformContext() {
   // other live context, so it is left initialised.
 }
 
-void GlContext::makeCurrent() {
+void GlContext::makePlatformContextCurrent() {
   if (!eglMakeCurrent(display_, EGL_NO_SURFACE, EGL_NO_SURFACE, context_))
     throw std::runtime_error(eglErrorText("eglMakeCurrent"));
 }

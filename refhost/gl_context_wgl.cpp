@@ -113,7 +113,7 @@ void GlContext::destroyPlatformContext() {
   window_ = nullptr;
 }
 
-void GlContext::makeCurrent() {
+void GlContext::makePlatformContextCurrent() {
   if (!wglMakeCurrent(static_cast<HDC>(display_), static_cast<HGLRC>(context_)))
     throw wglError("wglMakeCurrent");
 }

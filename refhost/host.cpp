@@ -97,6 +97,12 @@ void Host::setKeyframe(const std::string& id, int32_t time, const ParamValue& va
 
 void Host::clearKeyframes(const std::string& id) { mutableParam(id).state.keyframes.clear(); }
 
+void Host::editState(const std::string& id, const ParamState& state) {
+  Param& target = mutableParam(id);
+  undo_.noteBefore(target);
+  target.state = state;
+}
+
 ParamValue Host::valueAt(const std::string& id, int32_t time) const {
   return param(id).valueAt(time);
 }

@@ -107,6 +107,8 @@ class Host {
   // Creates the host's context (and makes it current). Throws std::runtime_error with the
   // reason when none can be made.
   GlContext& attachGl(GlProfile profile = GlProfile::Core);
+  // Draws in the given context (a window's, adopted) instead of one of the host's own.
+  GlContext& attachGl(std::unique_ptr<GlContext> context);
   // Uses a context another host made, so that hosts in turn can drive one plug-in whose GL
   // programs live in it; each host's own GL objects still go with the host.
   GlContext& shareGl(std::shared_ptr<GlContext> context);
@@ -134,6 +136,14 @@ class Host {
   void clearKeyframes(const std::string& id);
   ParamValue valueAt(const std::string& id, int32_t time) const;
   bool isEnabled(const std::string& id) const { return param(id).enabled; }
+
+  // ---- Edits from the host's own panel ----------------------------------------------------
+  // A person's edits, grouped into one named undo step by beginEdit/endEdit as the plug-in's
+  // BeginUndo/EndUndo group its edits; they are not plug-in calls, so the call log omits them.
+  void beginEdit(const std::string& stepName) { undo_.begin(stepName); }
+  void endEdit() { undo_.end(panel_); }
+  // Replaces the parameter's whole state (static value or keyframes), noted in the open step.
+  void editState(const std::string& id, const ParamState& state);
 
   // ---- Undo ------------------------------------------------------------------------------
   bool undo() { return undo_.undo(panel_); }
@@ -192,6 +202,11 @@ class Host {
   // Answers for the next ShowPopupMenu calls, in order; an empty queue answers -1.
   void queuePopupAnswer(int32_t index) { popupAnswers_.push_back(index); }
   const std::vector<std::string>& popupMenus() const { return popupMenus_; }
+  // When set, every ShowPopupMenu is answered by `chooser` (a viewer shows the menu and waits
+  // for the choice) instead of the queued answers; an empty function turns it off.
+  void setPopupMenuChooser(std::function<int32_t(const std::string& items)> chooser) {
+    popupChooser_ = std::move(chooser);
+  }
   const std::vector<FrameRequest>& frameRequests() const { return frameRequests_; }
   void clearFrameRequests() { frameRequests_.clear(); }
   void clearViewerRecords();
@@ -336,6 +351,7 @@ class Host {
   int redraws_ = 0;
   std::deque<int32_t> popupAnswers_;
   std::vector<std::string> popupMenus_;
+  std::function<int32_t(const std::string&)> popupChooser_;
   std::vector<FrameRequest> frameRequests_;
 };
 

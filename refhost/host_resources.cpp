@@ -60,6 +60,12 @@ GlContext& Host::shareGl(std::shared_ptr<GlContext> context) {
   return *gl_;
 }
 
+GlContext& Host::attachGl(std::unique_ptr<GlContext> context) {
+  releaseGl();
+  gl_ = std::move(context);
+  return *gl_;
+}
+
 bool Host::requireGl(const char* operation) {
   if (gl_) return true;
   problem(std::string(operation) + ": no GL context attached");

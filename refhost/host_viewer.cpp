@@ -28,6 +28,7 @@ void Host::setCursor(int32_t shape) {
 int32_t Host::showPopupMenu(const char* items) {
   log("ShowPopupMenu " + logText(items));
   popupMenus_.push_back(items ? items : "");
+  if (popupChooser_) return popupChooser_(popupMenus_.back());
   if (popupAnswers_.empty()) return -1;  // the user dismissed the menu
   int32_t answer = popupAnswers_.front();
   popupAnswers_.pop_front();

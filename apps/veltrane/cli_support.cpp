@@ -1,6 +1,7 @@
 // Option parsing and module lookup shared by the subcommands.
 #include "cli_support.h"
 
+#include <CLI/CLI.hpp>
 #include <cctype>
 #include <cerrno>
 #include <climits>
@@ -19,32 +20,58 @@ std::map<std::string, std::string> parseOptions(const std::vector<std::string>& 
   return parsed.options;
 }
 
+namespace {
+
+// The option of `definitions` a CLI11 message is about: the longest name it mentions, with or
+// without its dashes (CLI11 names a flag without them).
+std::string optionNamedIn(const std::string& message,
+                          const std::vector<OptionDefinition>& definitions) {
+  std::string found;
+  for (const OptionDefinition& definition : definitions) {
+    std::string bare = definition.name.substr(definition.name.find_first_not_of('-'));
+    if (message.find(bare) != std::string::npos && definition.name.size() > found.size())
+      found = definition.name;
+  }
+  return found;
+}
+
+}  // namespace
+
 Arguments parseArguments(const std::vector<std::string>& args,
                          const std::vector<OptionDefinition>& definitions) {
+  CLI::App app;
+  app.set_help_flag();  // each command prints its own help text
+  app.allow_extras();   // unknown options are reported below, in the command line's words
+  // Options are spelled the same everywhere: on Windows, "/path/file" is a path, not an option.
+  app.allow_windows_style_options(false);
   Arguments parsed;
-  std::map<std::string, std::string>& seen = parsed.options;
-  for (std::size_t i = 0; i < args.size(); ++i) {
-    const std::string& arg = args[i];
-    if (arg.size() < 2 || arg[0] != '-') {
-      parsed.positional.push_back(arg);
-      continue;
-    }
-    std::string name = arg.substr(0, arg.find('='));
-    const OptionDefinition* definition = nullptr;
-    for (const OptionDefinition& candidate : definitions) {
-      if (candidate.name == name) definition = &candidate;
-    }
-    if (!definition) throw UsageError("unknown option '" + name + "'");
-    bool inlineValue = name.size() < arg.size();
-    if (!definition->takesValue) {
-      if (inlineValue) throw UsageError("option '" + name + "' takes no value");
-      seen[name] = "";
-    } else if (inlineValue) {
-      seen[name] = arg.substr(name.size() + 1);
-    } else {
-      if (i + 1 >= args.size()) throw UsageError("option '" + name + "' needs a value");
-      seen[name] = args[++i];
-    }
+  std::vector<std::string> values(definitions.size());  // sized once: CLI11 keeps references
+  std::vector<CLI::Option*> declared;
+  for (std::size_t i = 0; i < definitions.size(); ++i) {
+    const OptionDefinition& definition = definitions[i];
+    declared.push_back(definition.takesValue
+                           ? app.add_option(definition.name, values[i])
+                                 ->multi_option_policy(CLI::MultiOptionPolicy::TakeLast)
+                           : app.add_flag(definition.name)->disable_flag_override());
+  }
+  app.add_option("arguments", parsed.positional);
+  std::vector<std::string> reversed(args.rbegin(), args.rend());  // CLI11 takes them last first
+  try {
+    app.parse(reversed);
+  } catch (const CLI::ArgumentMismatch& error) {
+    // A flag given a value ("--json=1") or an option given none ("--frame" at the end).
+    bool flag = std::string(error.what()).find("flag override") != std::string::npos;
+    throw UsageError("option '" + optionNamedIn(error.what(), definitions) +
+                     (flag ? "' takes no value" : "' needs a value"));
+  } catch (const CLI::ParseError& error) {
+    throw UsageError(error.what());
+  }
+  for (const std::string& extra : app.remaining()) {
+    if (extra.size() > 1 && extra[0] == '-')
+      throw UsageError("unknown option '" + extra.substr(0, extra.find('=')) + "'");
+  }
+  for (std::size_t i = 0; i < definitions.size(); ++i) {
+    if (declared[i]->count() > 0) parsed.options[definitions[i].name] = values[i];
   }
   return parsed;
 }

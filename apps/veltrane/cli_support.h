@@ -1,5 +1,5 @@
-// Shared pieces of the command line's subcommands: option parsing, number parsing, finding the
-// plug-in module, and the error type that becomes one line on stderr.
+// Shared pieces of the command line's subcommands: option parsing (on CLI11), number parsing,
+// finding the plug-in module, and the error type that becomes one line on stderr.
 #pragma once
 
 #include <cstdint>

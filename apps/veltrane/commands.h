@@ -18,5 +18,6 @@ int runRender(const std::vector<std::string>& args);
 int runInteract(const std::vector<std::string>& args);
 int runBench(const std::vector<std::string>& args);
 int runSoak(const std::vector<std::string>& args);
+int runView(const std::vector<std::string>& args);
 
 }  // namespace veltrane_cli

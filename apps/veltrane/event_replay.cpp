@@ -31,20 +31,7 @@ EventReplay::~EventReplay() { session_.host().deleteTexture(probeTarget_); }
 
 int32_t EventReplay::sendUnrecorded(int32_t message, void* context, void* event,
                                     std::initializer_list<int32_t> expected) {
-  refhost::Host& host = session_.host();
-  host.setRenderContext(context);
-  host.setEvent(event);
-  int32_t result = 0;
-  try {
-    result = session_.plugin().send(message, expected);
-  } catch (...) {
-    host.setRenderContext(nullptr);
-    host.setEvent(nullptr);
-    throw;
-  }
-  host.setRenderContext(nullptr);
-  host.setEvent(nullptr);
-  return result;
+  return session_.plugin().send(message, context, event, expected);
 }
 
 int32_t EventReplay::send(int32_t message, void* context, void* event,

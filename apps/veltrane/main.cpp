@@ -25,6 +25,8 @@ const Command kCommands[] = {
      &veltrane_cli::runBench},
     {"soak", "render a scene's frames many times over and watch resident memory",
      &veltrane_cli::runSoak},
+    {"view", "open a scene in a window: picture, handles, parameter panel, timeline, undo",
+     &veltrane_cli::runView},
 };
 
 void printUsage(std::FILE* out) {

@@ -15,9 +15,13 @@ std::string expectedText(std::initializer_list<int32_t> expected) {
 
 }  // namespace
 
-PluginSession::PluginSession(const std::string& modulePath, refhost::GlProfile profile)
+PluginSession::PluginSession(const std::string& modulePath, refhost::GlProfile profile,
+                             std::unique_ptr<refhost::GlContext> context)
     : module_(modulePath), host_(std::make_unique<refhost::Host>(module_)) {
-  host_->attachGl(profile);
+  if (context)
+    host_->attachGl(std::move(context));
+  else
+    host_->attachGl(profile);
 }
 
 PluginSession::~PluginSession() {
@@ -55,6 +59,23 @@ int32_t PluginSession::send(int32_t message, std::initializer_list<int32_t> expe
   if (gl && !gl->errors().empty())
     throw std::runtime_error(what + " caused " + std::to_string(gl->errors().size()) +
                              " GL error(s), the first: " + gl->errors().front().text);
+  return result;
+}
+
+int32_t PluginSession::send(int32_t message, void* context, void* event,
+                            std::initializer_list<int32_t> expected) {
+  host_->setRenderContext(context);
+  host_->setEvent(event);
+  int32_t result = 0;
+  try {
+    result = send(message, expected);
+  } catch (...) {
+    host_->setRenderContext(nullptr);
+    host_->setEvent(nullptr);
+    throw;
+  }
+  host_->setRenderContext(nullptr);
+  host_->setEvent(nullptr);
   return result;
 }
 

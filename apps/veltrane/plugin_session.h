@@ -15,9 +15,10 @@ namespace veltrane_cli {
 
 class PluginSession {
  public:
-  // Loads the module and creates the host's GL context. Throws std::runtime_error naming the
-  // module or the GL step that failed.
-  PluginSession(const std::string& modulePath, refhost::GlProfile profile);
+  // Loads the module and creates the host's GL context, or adopts `context` (a window's) when
+  // given. Throws std::runtime_error naming the module or the GL step that failed.
+  PluginSession(const std::string& modulePath, refhost::GlProfile profile,
+                std::unique_ptr<refhost::GlContext> context = nullptr);
   // Destroys a live instance and unloads the plug-in (unchecked) when finish() was not reached.
   ~PluginSession();
   PluginSession(const PluginSession&) = delete;
@@ -32,6 +33,10 @@ class PluginSession {
   // host's own complaints about the plug-in's calls are printed to stderr once each; its call
   // log holds the calls of this message only.
   int32_t send(int32_t message, std::initializer_list<int32_t> expected = {1});
+  // The same with the message's context and event records, handed to the host for this message
+  // only.
+  int32_t send(int32_t message, void* context, void* event,
+               std::initializer_list<int32_t> expected);
 
   // 0 (load) and 2 (declare the parameters).
   void load();

@@ -7,8 +7,9 @@
 namespace veltrane_cli {
 
 SceneSession::SceneSession(const Scene& scene, const std::string& modulePath,
-                           refhost::GlProfile profile, int32_t hostId)
-    : plugin_(modulePath, profile),
+                           refhost::GlProfile profile, int32_t hostId,
+                           std::unique_ptr<refhost::GlContext> context)
+    : plugin_(modulePath, profile, std::move(context)),
       file_(scene.file),
       layerCount_(scene.composition.layers.size()) {
   refhost::Host& host = plugin_.host();
@@ -70,20 +71,17 @@ std::runtime_error SceneSession::memoryError() const {
 
 refhost::RgbaImage SceneSession::render(int32_t frame) {
   try {
-    refhost::RenderFrame context(host(), settings_, frame);
-    host().setRenderContext(&context.context());
-    try {
-      plugin_.send(12);
-      plugin_.send(10);
-    } catch (...) {
-      host().setRenderContext(nullptr);
-      throw;
-    }
-    host().setRenderContext(nullptr);
-    return context.readOutput();
+    return renderFrame(frame)->readOutput();
   } catch (const std::bad_alloc&) {
     throw memoryError();
   }
+}
+
+std::unique_ptr<refhost::RenderFrame> SceneSession::renderFrame(int32_t frame) {
+  auto context = std::make_unique<refhost::RenderFrame>(host(), settings_, frame);
+  plugin_.send(12, &context->context(), nullptr, {1});
+  plugin_.send(10, &context->context(), nullptr, {1});
+  return context;
 }
 
 }  // namespace veltrane_cli

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <stdexcept>
 #include <string>
 
@@ -19,9 +20,9 @@ class SceneSession {
  public:
   // Sends 0 and 2, checks the scene's parameters (FieldError on a bad one), sends 3 and 8,
   // sets the parameters and reports each change with message 7. The host reports `hostId` as
-  // its product code from the start.
+  // its product code from the start; it draws in `context` (a window's) when one is given.
   SceneSession(const Scene& scene, const std::string& modulePath, refhost::GlProfile profile,
-               int32_t hostId = 0);
+               int32_t hostId = 0, std::unique_ptr<refhost::GlContext> context = nullptr);
 
   PluginSession& plugin() { return plugin_; }
   refhost::Host& host() { return plugin_.host(); }
@@ -34,6 +35,8 @@ class SceneSession {
   // Messages 12 and 10 with the frame's render context; the output read back, top row first.
   // Running out of memory on the way is reported as the scene's frame size being too large.
   refhost::RgbaImage render(int32_t frame);
+  // The same, keeping the rendered frame's textures for whoever shows them.
+  std::unique_ptr<refhost::RenderFrame> renderFrame(int32_t frame);
 
   // The error for an allocation that failed while this scene ran: it names the scene file and
   // the frame size, the one thing a user can change about it.

@@ -1,0 +1,127 @@
+// A scene running in the plug-in as a host's viewer drives it: pointer and key events become
+// messages 1004 to 1008 in the frame's corner space, every parameter change is reported with
+// message 7, the frame is rendered (12, 10) only when a parameter or the frame number changed,
+// and the overlay (1003) is drawn over the picture with the viewer's projection. Panel edits,
+// keyframe toggles and presets are undo steps of the host. A message the plug-in fails becomes
+// the status text and leaves the session usable.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <nlohmann/json.hpp>
+#include <string>
+#include <vector>
+
+#include "refhost/render_frame.h"
+#include "scene_file.h"
+#include "scene_session.h"
+#include "view_mapping.h"
+
+namespace veltrane_viewer {
+
+struct ViewerStats {
+  int renders = 0;  // message 10
+  double renderSeconds = 0;
+  int overlays = 0;  // message 1003
+  double overlaySeconds = 0;
+};
+
+class ViewerSession {
+ public:
+  // Sets the scene up in the plug-in (as `veltrane render` does) drawing in `context`, the
+  // window's. Throws what SceneSession throws: FieldError for a bad parameter value, a runtime
+  // error naming the module or the message that failed.
+  ViewerSession(const veltrane_cli::Scene& scene, const std::string& modulePath,
+                refhost::GlProfile profile, std::unique_ptr<refhost::GlContext> context,
+                int32_t frame);
+  ViewerSession(const ViewerSession&) = delete;
+  ViewerSession& operator=(const ViewerSession&) = delete;
+
+  refhost::Host& host() { return session_.host(); }
+  const refhost::Composition& composition() const { return scene_.composition; }
+
+  int32_t frame() const { return frame_; }
+  // Moves to the frame, kept within the scene's frames.
+  void setFrame(int32_t frame);
+
+  // The viewer's geometry handed with the pointer and overlay messages.
+  void setView(double viewScale, double uiScale, const refhost::Matrix4& projection);
+
+  // Pointer and key messages; each reports the parameter changes it caused.
+  void pointerMove(EventPosition position, bool held);
+  // True when the plug-in took the press (a drag is under way until the release).
+  bool pointerPress(EventPosition position);
+  void pointerRelease(EventPosition position);
+  // The key as an X11 keysym; true when the plug-in took it.
+  bool key(uint32_t keysym, bool down);
+  // Asks whether the pointer is over the selected input (1012) and if so opens the plug-in's
+  // layer menu (1013); the host's popup menu chooser answers it.
+  void openLayerMenu();
+
+  // Panel edits at the current frame. Consecutive edits of one parameter form one undo step
+  // until finishEdit(), so that a slider drag is one step.
+  void editValue(const std::string& id, const refhost::ParamValue& value);
+  void finishEdit();
+  void toggleKey(const std::string& id);
+  void applyPreset(std::size_t index);
+  bool undo();
+  bool redo();
+
+  // Renders (12, 10) when a parameter or the frame number changed since the last render; true
+  // when it did. The picture stays until the next render.
+  bool renderIfChanged();
+  // The rendered frame's texture (frame-sized, RGBA8), 0 before the first render succeeded.
+  uint32_t pictureTexture() const { return picture_ ? picture_->context().output.id : 0; }
+  // Draws the overlay (1003) into the texture, which has the given size.
+  void drawOverlay(uint32_t texture, int32_t width, int32_t height);
+
+  // The cursor number the plug-in asked for last.
+  int32_t cursor() const { return cursor_; }
+  // True once after the plug-in asked for a redraw.
+  bool takeRedrawRequest();
+  // What the status line shows: the last failure, or a note such as where the scene was saved.
+  const std::string& status() const { return status_; }
+  bool statusIsFailure() const { return statusIsFailure_; }
+  void setStatus(const std::string& text, bool failure) {
+    status_ = text;
+    statusIsFailure_ = failure;
+  }
+  const ViewerStats& stats() const { return stats_; }
+
+  // True when the parameters differ from what was loaded or last saved.
+  bool modified();
+  // Writes the scene with the current values to `path` (staged, then renamed).
+  void save(const std::string& path);
+
+  // Messages 4 and 1.
+  void finish() { session_.finish(); }
+
+ private:
+  template <typename Action>
+  void attempt(const std::string& what, Action&& action);
+  int32_t send(int32_t message, void* context, void* event,
+               std::initializer_list<int32_t> expected);
+  int32_t sendPointer(int32_t message, EventPosition position, double button);
+  void reportChanges();
+  void collectViewerRecords();
+  std::vector<refhost::ParamState> snapshot();
+
+  veltrane_cli::Scene scene_;
+  nlohmann::ordered_json document_;  // the scene file as written, for saving
+  veltrane_cli::SceneSession session_;
+  WispViewerContext viewer_{};
+  int32_t frame_ = 0;
+  int32_t renderedFrame_ = -1;
+  bool changedSinceRender_ = true;
+  std::unique_ptr<refhost::RenderFrame> picture_;
+  std::vector<refhost::ParamState> reported_;
+  std::vector<refhost::ParamState> saved_;
+  std::string editing_;  // the parameter whose edit step is open
+  int32_t cursor_ = 0;
+  bool redrawRequested_ = false;
+  std::string status_;
+  bool statusIsFailure_ = false;
+  ViewerStats stats_;
+};
+
+}  // namespace veltrane_viewer

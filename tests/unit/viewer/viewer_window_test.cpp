@@ -1,0 +1,188 @@
+// `veltrane view` in a real window under Xvfb, driven by real X input through xdotool: the
+// gestures edit the scene as a viewer's would, Ctrl+S saves it, and the window shows the
+// render of what it saves with the handles drawn where they are.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <nlohmann/json.hpp>
+#include <sstream>
+
+#include "refhost/image_files.h"
+#include "support/temp_paths.h"
+#include "x_session.h"
+
+namespace {
+
+constexpr int kWidth = 320;
+constexpr int kHeight = 180;
+
+std::string text(const std::string& path) {
+  std::ifstream in(path);
+  std::stringstream all;
+  all << in.rdbuf();
+  return all.str();
+}
+
+// The gradient makes every frame pixel different, so the frame is found on screen unambiguously.
+const char kScene[] = R"({
+  "width": 320, "height": 180, "fps": 25, "duration": 10,
+  "source": {"pattern": "gradient"},
+  "layers": [{"guid": "d3e00000-0000-4000-8000-000000000001", "name": "Bars",
+              "source": {"pattern": "bars"}}],
+  "params": {"cutDirection_0": 0}
+})";
+
+class ViewerWindow : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    std::filesystem::create_directories(dir_);
+    std::ofstream(scene_) << kScene;
+    viewer_ = std::make_unique<ChildProcess>(
+        std::vector<std::string>{VELTRANE_CLI_PATH, "view", scene_, "--save-as", saved_, "--plugin",
+                                 VELTRANE_MODULE_PATH},
+        std::vector<std::string>{x_.environment()}, out_, dir_ + "/err.txt");
+    x_.run({"xdotool", "search", "--sync", "--onlyvisible", "--name", "veltrane view"});
+    // One frame pixel per screen pixel, so screen and render compare exactly.
+    x_.run({"xdotool", "mousemove", "20", "10", "key", "1"});
+    refhost::RgbaImage frame = render(scene_);
+    ASSERT_TRUE(
+        waitUntil([&] { return findPicture(x_.screenshot(dir_), frame, 12, x0_, y0_); }, 60))
+        << "the frame never showed at one pixel per pixel: " << text(dir_ + "/err.txt");
+  }
+  void TearDown() override {
+    if (viewer_) {
+      x_.run({"xdotool", "key", "ctrl+q"});
+      EXPECT_EQ(viewer_->wait(30), 0) << text(dir_ + "/err.txt");
+    }
+    std::filesystem::remove_all(dir_);
+  }
+
+  refhost::RgbaImage render(const std::string& scene) {
+    std::string png = dir_ + "/render.png";
+    ChildProcess cli(
+        {VELTRANE_CLI_PATH, "render", scene, "-o", png, "--plugin", VELTRANE_MODULE_PATH}, {});
+    EXPECT_EQ(cli.wait(60), 0);
+    return refhost::readImageFile(png);
+  }
+  // Screen coordinates of a corner-space point (origin at the frame's bottom-left, y up).
+  std::string sx(double x) const { return std::to_string(x0_ + static_cast<int>(x)); }
+  std::string sy(double y) const { return std::to_string(y0_ + kHeight - static_cast<int>(y)); }
+  // xdotool: `before`, a drag between two corner-space points through their middle, `after`.
+  void drag(const std::vector<std::string>& before, double x, double y, double toX, double toY,
+            const std::vector<std::string>& after = {}) {
+    std::vector<std::string> args{"xdotool"};
+    args.insert(args.end(), before.begin(), before.end());
+    args.insert(args.end(),
+                {"mousemove", sx(x), sy(y), "mousedown", "1", "mousemove", sx((x + toX) / 2),
+                 sy((y + toY) / 2), "mousemove", sx(toX), sy(toY), "mouseup", "1"});
+    args.insert(args.end(), after.begin(), after.end());
+    x_.run(args);
+  }
+  void saveAndWait() {
+    x_.run({"xdotool", "key", "ctrl+s"});
+    ASSERT_TRUE(waitUntil([&] { return text(out_).find("saved") != std::string::npos; }, 30))
+        << text(dir_ + "/err.txt");
+  }
+
+  std::string dir_ = testsupport::makeTempDirectory("veltrane_view_");
+  std::string scene_ = dir_ + "/scene.json";
+  std::string saved_ = dir_ + "/saved.json";
+  std::string out_ = dir_ + "/out.txt";
+  XSession x_;
+  std::unique_ptr<ChildProcess> viewer_;
+  int x0_ = 0;  // the frame's top-left corner on screen
+  int y0_ = 0;
+};
+
+TEST_F(ViewerWindow, GesturesEditTheSceneAndCtrlSSavesItWithItsUndoHistory) {
+  drag({}, 160, 60, 200, 60);                                            // the cut's line, sideways
+  drag({"keydown", "Shift_L"}, 80, 150, 40, 150, {"keyup", "Shift_L"});  // insert a cut
+  drag({}, 260, 120, 280, 100);                                          // input 0's picture
+  // The layer picker: the menu opens at the pointer; its second item is the Bars layer.
+  x_.run({"xdotool", "mousemove", sx(270), sy(40), "click", "3"});
+  ASSERT_TRUE(waitUntil(
+      [&] {
+        refhost::Rgba8 p = x_.screenshot(dir_).pixel(x0_ + 275, y0_ + kHeight - 40 + 5);
+        return p[0] < 60 && p[1] < 60 && p[2] < 60;  // the menu's dark background
+      },
+      30));
+  x_.run({"xdotool", "mousemove", sx(290), sy(40 - 31), "mousedown", "1", "sleep", "0.2", "mouseup",
+          "1", "sleep", "0.2", "key", "ctrl+z"});
+  saveAndWait();
+
+  nlohmann::json params = nlohmann::json::parse(text(saved_))["params"];
+  EXPECT_EQ(params, nlohmann::json::parse(R"({
+      "numberOfCuts": 2, "cutPosition_0": [40, -30], "cutDirection_0": 0,
+      "cutPosition_1": [-80, 60], "cutDirection_1": -90,
+      "inputLayer0": "d3e00000-0000-4000-8000-000000000001"})"));
+  EXPECT_NE(text(out_).find("undo history: \"Split Screen Cut 1 Position\", \"Inserting Cut\"; "
+                            "undone: \"Moved Split Screen Input 0\""),
+            std::string::npos)
+      << text(out_);
+}
+
+TEST_F(ViewerWindow, ShowsTheRenderOfWhatItSavesWithTheHandlesOverIt) {
+  drag({}, 160, 60, 200, 60);
+  // Selecting input 0 shows its rectangle (the frame's edges) and its rotation handle above.
+  x_.run({"xdotool", "mousemove", sx(260), sy(120), "click", "1", "mousemove",
+          std::to_string(x0_ - 40), sy(90)});
+  saveAndWait();
+  refhost::RgbaImage expected = render(saved_);
+  // Differing pixels by where they lie: at the cut's direction handle, at the input's rotation
+  // handle (above the frame), along the frame's edges (the input's rectangle), elsewhere.
+  int counts[4] = {};
+  auto handlesWhereTheyAre = [&](const refhost::RgbaImage& screen) {
+    std::fill(counts, counts + 4, 0);
+    for (int y = 0; y < kHeight; ++y) {
+      for (int x = 0; x < kWidth; ++x) {
+        if (std::memcmp(screen.at(x0_ + x, y0_ + y), expected.at(x, y), 3) == 0) continue;
+        double cx = x + 0.5, cy = kHeight - y - 0.5;
+        ++counts[std::hypot(cx - 200, cy - 60) < 18                      ? 0
+                 : std::hypot(cx - 160, cy - 190) < 18                   ? 1
+                 : std::min({x, y, kWidth - 1 - x, kHeight - 1 - y}) < 5 ? 2
+                                                                         : 3];
+      }
+    }
+    return counts[3] == 0 && counts[0] > 20 && counts[2] > 200;
+  };
+  EXPECT_TRUE(waitUntil([&] { return handlesWhereTheyAre(x_.screenshot(dir_)); }, 30))
+      << "direction handle " << counts[0] << ", rotation handle " << counts[1]
+      << ", rectangle edges " << counts[2] << ", elsewhere " << counts[3];
+}
+
+// A scene error reads as `veltrane render` words it; no display says so and what to do.
+TEST(ViewerCommand, FailsWithOneLineWithoutADisplayOrWithABadScene) {
+  std::string dir = testsupport::makeTempDirectory("veltrane_view_");
+  std::ofstream(dir + "/good.json") << kScene;
+  std::ofstream(dir + "/bad.json") << R"({"width": 320, "height": 180, "fps": 25,
+      "duration": 10, "source": {"pattern": "zebra"}})";
+  ChildProcess render({VELTRANE_CLI_PATH, "render", dir + "/bad.json", "-o", dir + "/x.png"}, {},
+                      "/dev/null", dir + "/render.txt");
+  ASSERT_EQ(render.wait(60), 1);
+  std::string renderMessage = text(dir + "/render.txt");
+  ASSERT_EQ(renderMessage.rfind("veltrane render: ", 0), 0u) << renderMessage;
+  struct Case {
+    std::string scene;
+    std::vector<std::string> environment;
+    std::string message;
+  } cases[] = {
+      {dir + "/good.json",
+       {"DISPLAY=", "WAYLAND_DISPLAY="},
+       "veltrane view: cannot open a window: no display (DISPLAY is not set); run it under a "
+       "virtual X server, e.g. xvfb-run -a veltrane view SCENE.json\n"},
+      {dir + "/bad.json", {}, "veltrane view: " + renderMessage.substr(17)},
+  };
+  for (const Case& c : cases) {
+    ChildProcess viewer({VELTRANE_CLI_PATH, "view", c.scene, "--plugin", VELTRANE_MODULE_PATH},
+                        c.environment, "/dev/null", dir + "/err.txt");
+    EXPECT_EQ(viewer.wait(60), 1) << c.scene;
+    EXPECT_EQ(text(dir + "/err.txt"), c.message);
+  }
+  std::filesystem::remove_all(dir);
+}
+
+}  // namespace
