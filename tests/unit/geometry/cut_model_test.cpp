@@ -164,15 +164,5 @@ TEST_F(CutModel, ListKeepsAtMostEightCutsAndDropsRepeatsThatSortTogether) {
   EXPECT_EQ(removeRepeatedCuts({Cut{}, radial}).size(), 2u);  // types never repeat each other
 }
 
-TEST_F(CutModel, ControlAccessorsReadRawParameters) {
-  addCut(4, -960, 540, 0);
-  EXPECT_EQ(cutControlPosition(host.handle(), host.record(), 0, 4, kHd).y, 1080);
-  addCut(4, 5000, -5000, 720);  // neither clamped nor wrapped
-  EXPECT_EQ(cutControlPosition(host.handle(), host.record(), 0, 4, kHd).x, 5960);
-  EXPECT_FLOAT_EQ(cutControlAngle(host.handle(), host.record(), 0, 4), 2 * kTwoPi + kHalfPi);
-  host.setInt(param::kCutType, kCutTypeRadial);
-  EXPECT_FLOAT_EQ(cutControlAngle(host.handle(), host.record(), 0, 4), 2 * kTwoPi);
-}
-
 }  // namespace
 }  // namespace veltrane

@@ -61,25 +61,5 @@ TEST_F(InputTransform, QuarterTurnPointsThePictureUpAlongPlusX) {
   EXPECT_NEAR(picture.y, 1.0f, 1e-6f);
 }
 
-TEST_F(InputTransform, ControlRectangleAndRotation) {
-  const struct {
-    float tx, ty, scale, x0, y0, x1, y1;
-  } cases[] = {
-      {0, 0, 50, 480, 270, 1440, 810},
-      {0, 0, 200, -960, -540, 2880, 1620},
-      {100, -40, 0, 1060, 500, 1060, 500},
-  };
-  for (const auto& c : cases) {
-    place(8, c.tx, c.ty, c.scale, 0);
-    const auto rect = inputControlRect(host.handle(), host.record(), 0, {1920, 1080}, 8);
-    EXPECT_FLOAT_EQ(rect.x, c.x0);
-    EXPECT_FLOAT_EQ(rect.y, c.y0);
-    EXPECT_FLOAT_EQ(rect.z, c.x1);
-    EXPECT_FLOAT_EQ(rect.w, c.y1);
-  }
-  place(8, 0, 0, 100, 450);
-  EXPECT_FLOAT_EQ(inputRotationRadians(host.handle(), host.record(), 0, 8), 2.5f * kPi);
-}
-
 }  // namespace
 }  // namespace veltrane

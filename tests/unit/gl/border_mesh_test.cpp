@@ -87,39 +87,6 @@ TEST(BorderMesh, SizesGrowBySegmentAndZeroLengthSegmentsKeepOnlyTheirCaps) {
   EXPECT_EQ(mesh.indices, std::vector<uint32_t>{0});
 }
 
-TEST(MeshDrawRuns, RunsMatchWhatARestartDrawWouldMake) {
-  struct Case {
-    std::vector<uint32_t> indices;
-    GLenum mode;
-    std::vector<std::pair<size_t, size_t>> runs;  // first, count
-  };
-  const Case cases[] = {
-      {{0, 11, 12, 13, 14, 0, 15, 16, 0}, GL_TRIANGLE_STRIP, {{1, 4}}},
-      {{0, 1, 2, 3, 4, 5, 6, 7, 0}, GL_TRIANGLES, {{1, 6}}},
-      {{0, 1, 2, 0, 3, 4, 5, 0}, GL_TRIANGLES, {{4, 3}}},
-      {{1, 2, 3}, GL_TRIANGLE_FAN, {{0, 3}}},
-      {{0, 0, 1, 2, 3, 0, 0, 4, 5, 6}, GL_TRIANGLE_FAN, {{2, 3}, {7, 3}}},
-      {{0, 0, 0}, GL_TRIANGLE_STRIP, {}},
-      {{}, GL_TRIANGLES, {}},
-  };
-  for (const Case& c : cases) {
-    std::vector<std::pair<size_t, size_t>> runs;
-    for (const IndexRun& run : indexRuns(c.indices, c.mode))
-      runs.emplace_back(run.first, run.count);
-    EXPECT_EQ(runs, c.runs) << "case with " << c.indices.size() << " indices, mode " << c.mode;
-  }
-
-  const struct {
-    size_t indices;
-    GLenum mode;
-    size_t drawn;
-  } restartCases[] = {
-      {9, GL_TRIANGLE_STRIP, 9}, {2, GL_TRIANGLE_FAN, 0}, {7, GL_TRIANGLES, 6},
-      {2, GL_TRIANGLES, 0},      {3, GL_TRIANGLES, 3},
-  };
-  for (const auto& c : restartCases) EXPECT_EQ(restartDrawCount(c.indices, c.mode), c.drawn);
-}
-
 TEST(PrimitiveRestartDecision, IntelHd4000IsRecognisedFromVendorOrRenderer) {
   const struct {
     const char* vendor;

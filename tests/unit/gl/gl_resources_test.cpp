@@ -1,12 +1,10 @@
-// Render targets and the textured draw on Mesa through the reference host, and
-// the shared matrix product.
+// Render targets and the textured draw on Mesa through the reference host.
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <vector>
 
 #include "gl/draws.h"
-#include "gl/matrix4.h"
 #include "gl/render_target.h"
 #include "gl/texture_units.h"
 #include "gl/textured_quad.h"
@@ -57,25 +55,6 @@ TEST_F(RenderTargets, TemplateFollowsTheTextureFormatMode) {
   }  // each target gives its texture back as it goes
 }
 
-TEST_F(RenderTargets, AttachingALevelSetsTheViewportToItsSize) {
-  RenderTarget target = createRenderTarget(handle(), api(), false);
-  TextureRecord large = target.texture;
-  large.imageWidth = 1920;
-  large.imageHeight = 1080;
-  for (const auto& [level, width, height] :
-       {std::tuple{0, 1920, 1080}, std::tuple{1, 960, 540}, std::tuple{3, 240, 135}}) {
-    attachRenderTarget(large, level, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
-    GLint viewport[4] = {};
-    glGetIntegerv(GL_VIEWPORT, viewport);
-    EXPECT_EQ(viewport[2], width) << "level " << level;
-    EXPECT_EQ(viewport[3], height);
-  }
-  GLint attached = 0;
-  glGetFramebufferAttachmentParameteriv(GL_FRAMEBUFFER, GL_COLOR_ATTACHMENT0,
-                                        GL_FRAMEBUFFER_ATTACHMENT_OBJECT_NAME, &attached);
-  EXPECT_EQ(static_cast<GLuint>(attached), target.texture.id);
-}
-
 using TexturedDraw = testsupport::GlHostTest;
 
 // The frame quad over the image part of a larger source texture, drawn through the copy
@@ -115,21 +94,6 @@ TEST_F(TexturedDraw, FrameQuadCopiesTheImagePartExactly) {
       }
     }
   }
-}
-
-TEST(Matrix4, ProductIsRowByRowAndMayOverwriteAFactor) {
-  const float translate[16] = {1, 0, 0, 5, 0, 1, 0, 7, 0, 0, 1, 0, 0, 0, 0, 1};
-  const float scale[16] = {2, 0, 0, 0, 0, 3, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1};
-  float product[16];
-  multiplyMatrix4(translate, product, scale);  // scale first: the translation stays
-  const float expected[16] = {2, 0, 0, 5, 0, 3, 0, 7, 0, 0, 1, 0, 0, 0, 0, 1};
-  EXPECT_TRUE(std::equal(product, product + 16, expected));
-
-  float inPlace[16];
-  std::copy(scale, scale + 16, inPlace);
-  multiplyMatrix4(inPlace, inPlace, translate);  // translate first: the translation is scaled
-  const float scaled[16] = {2, 0, 0, 10, 0, 3, 0, 21, 0, 0, 1, 0, 0, 0, 0, 1};
-  EXPECT_TRUE(std::equal(inPlace, inPlace + 16, scaled));
 }
 
 }  // namespace

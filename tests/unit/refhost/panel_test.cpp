@@ -35,37 +35,9 @@ class HostPanel : public ::testing::Test {
     for (int32_t result : results) ASSERT_EQ(result, 0);
   }
 
-  // Reads a parameter through the operation the plug-in would use for its kind, as text.
-  std::string read(const std::string& id, int32_t time) {
-    const char* name = id.c_str();
-    switch (host.param(id).kind) {
-      case ParamKind::Float:
-        return formatValue(ParamKind::Float, ParamValue::ofFloat(api.GetFloatParam(h, name, time)));
-      case ParamKind::Angle:
-        return formatValue(ParamKind::Angle, ParamValue::ofFloat(api.GetAngleParam(h, name, time)));
-      case ParamKind::Int:
-        return std::to_string(api.GetIntParam(h, name, time));
-      case ParamKind::Bool:
-        return std::to_string(api.GetBoolParam(h, name, time));
-      case ParamKind::Choice:
-        return std::to_string(api.GetChoiceParam(h, name, time));
-      case ParamKind::Point: {
-        float x = -1, y = -1;
-        api.GetPointParam(h, name, time, &x, &y);
-        return formatValue(ParamKind::Point, ParamValue::ofPoint(x, y));
-      }
-      case ParamKind::Color: {
-        float r = -1, g = -1, b = -1;
-        api.GetColorParam(h, name, time, &r, &g, &b);
-        return formatValue(ParamKind::Color, ParamValue::ofColor(r, g, b));
-      }
-      case ParamKind::Layer: {
-        char buffer[40] = "garbage";
-        api.GetLayerParam(h, name, time, buffer);
-        return buffer;
-      }
-    }
-    return "";
+  // The value at the time as the panel formats it (the plug-in's getters read the same value).
+  std::string read(const std::string& id, int32_t time) const {
+    return formatValue(host.param(id).kind, host.valueAt(id, time));
   }
   std::vector<ParamState> snapshot() const {
     std::vector<ParamState> states;
