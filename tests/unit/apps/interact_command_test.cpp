@@ -95,6 +95,8 @@ TEST(InteractCommand, DraggingACutLineMovesItInOneUndoStep) {
   EXPECT_EQ(back.result["results"][5], json::array({changed}));
 }
 
+// Also what the result says of the viewer after each event: the selected input, whether the
+// pointer hovers over its region, and the undo step a script leaves open.
 TEST(InteractCommand, LayerMenuAssignsThePickedLayerToTheSelectedInput) {
   const json events = json::array({{{"press", {40, 150}}},
                                    {{"release", {40, 150}}},
@@ -102,7 +104,9 @@ TEST(InteractCommand, LayerMenuAssignsThePickedLayerToTheSelectedInput) {
                                    {{"layerMenu", true}},
                                    {{"keyDown", "Escape"}},
                                    {{"keyUp", "Escape"}},
-                                   {{"layerMenu", true}}});
+                                   {{"layerMenu", true}},
+                                   {{"move", {-50, -50}}},
+                                   {{"press", {40, 150}}}});
   ScratchDirectory folder;
   Interaction done = interact(folder, {{"events", events}});
   ASSERT_EQ(done.run.status, 0) << done.run.err;
@@ -125,6 +129,11 @@ TEST(InteractCommand, LayerMenuAssignsThePickedLayerToTheSelectedInput) {
   EXPECT_EQ(result["results"][5], json::array({message(1008, 1)}));
   // Escape deselected the input: the host no longer offers the menu.
   EXPECT_EQ(result["results"][6], json::array({message(1012, 0)}));
+  const int n = std::stoi(input);
+  EXPECT_EQ(result["selectedInputs"], json::array({n, n, n, n, n, nullptr, nullptr, nullptr, n}));
+  EXPECT_EQ(result["hover"],
+            json::array({true, true, true, true, true, false, false, false, true}));
+  EXPECT_EQ(result["openUndoStep"], moved) << "the last press was never released";
 }
 
 TEST(InteractCommand, BadScriptsNameTheField) {
