@@ -21,19 +21,6 @@ void setLocalCut(refhost::Host& host, int index, float x, float y, float degrees
   host.setValue("cutDirection_" + std::to_string(index), ParamValue::ofFloat(degrees));
 }
 
-TEST(FrameRender, OneLocalCutShowsInputOneLeftAndInputZeroRight) {
-  RenderFixture fixture;
-  refhost::Host& host = fixture.host();
-  fixture.addSolidLayer(kLayerGreen, kGreen);
-  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);  // a vertical line through the centre
-  host.setValue("inputLayer1", ParamValue::ofLayer(kLayerGreen));
-  const std::vector<uint8_t> pixels = fixture.render(kRed);
-  for (int y : {2, 18, 33}) {
-    EXPECT_EQ(fixture.pixel(pixels, 5, y), kGreen) << y;
-    EXPECT_EQ(fixture.pixel(pixels, 58, y), kRed) << y;
-  }
-}
-
 TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();

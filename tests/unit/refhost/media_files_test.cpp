@@ -1,5 +1,6 @@
 // Media on disk: stills written and read back exactly, small videos encoded and decoded frame
-// by frame by index, and output files that appear only when complete.
+// by frame by index, and the kinds of output their names choose. (What appears on disk, and
+// when, is checked through the command line.)
 #include <gtest/gtest.h>
 
 #include <fstream>
@@ -113,38 +114,6 @@ TEST(OutputTarget, NamesChooseTheKindOfOutput) {
   EXPECT_EQ(parseOutputTarget("a/f_%04d.png").frameName(7), "a/f_0007.png");
   EXPECT_EQ(parseOutputTarget("f%d.exr").frameName(12345), "f12345.exr");
   EXPECT_EQ(parseOutputTarget("f%03d.exr").frameName(-2), "f-002.exr");
-}
-
-TEST(FrameSink, NothingAppearsUnderTheNameUntilCommitted) {
-  const RgbaImage picture = generatePattern(Pattern::Counter, 1, 64, 36);
-  for (const char* name : {"still.png", "seq_%02d.exr", "clip.mkv"}) {
-    ScratchDirectory folder;
-    const OutputTarget target = parseOutputTarget(folder.file(name));
-    {
-      // Dropped half-way, as on an error: everything written so far goes.
-      auto sink = openFrameSink(target, 64, 36, 25.0);
-      sink->write(0, picture);
-      EXPECT_EQ(folder.entries().size(), 1u) << name;  // the temporary, hidden
-      EXPECT_EQ(folder.entries().front()[0], '.') << name;
-    }
-    EXPECT_TRUE(folder.entries().empty()) << name;
-
-    auto sink = openFrameSink(target, 64, 36, 25.0);
-    sink->write(0, picture);
-    if (target.kind != OutputKind::Still) sink->write(1, picture);
-    const std::vector<std::string> expected =
-        target.kind == OutputKind::Sequence
-            ? std::vector<std::string>{folder.file("seq_00.exr"), folder.file("seq_01.exr")}
-            : std::vector<std::string>{folder.file(name)};
-    EXPECT_EQ(sink->commit(), expected) << name;
-    EXPECT_EQ(folder.entries().size(), expected.size()) << name;  // no temporaries left
-  }
-  // A still takes exactly one frame.
-  ScratchDirectory folder;
-  auto sink = openFrameSink(parseOutputTarget(folder.file("one.png")), 4, 4, 25.0);
-  EXPECT_THROW(sink->commit(), std::runtime_error);
-  sink->write(0, RgbaImage(4, 4));
-  EXPECT_THROW(sink->write(1, RgbaImage(4, 4)), std::runtime_error);
 }
 
 }  // namespace
