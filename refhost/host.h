@@ -179,6 +179,8 @@ class Host {
   // Wall-clock seconds spent so far producing and uploading frames for GetSourceFrame and
   // RenderLayerFrame: the host's share of a render message's time.
   double frameDeliverySeconds() const { return frameDeliverySeconds_; }
+  // The same in CPU seconds of the thread that delivered them.
+  double frameDeliveryCpuSeconds() const { return frameDeliveryCpuSeconds_; }
   // The one vertex array the host hands out on every CreateVertexArray (0 before the first).
   uint32_t vertexArray() const { return vertexArray_; }
 
@@ -324,6 +326,7 @@ class Host {
   std::set<uint32_t> frames_;
   TexturePool texturePool_;
   double frameDeliverySeconds_ = 0;
+  double frameDeliveryCpuSeconds_ = 0;
 
   std::vector<int32_t> cursorShapes_;
   int redraws_ = 0;
