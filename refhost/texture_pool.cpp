@@ -4,6 +4,9 @@
 
 #include <GL/glew.h>
 
+#include <algorithm>
+#include <iterator>
+
 namespace refhost {
 namespace {
 
@@ -22,16 +25,20 @@ void forget(GLuint id, GLsync fence) {
 
 TexturePool::~TexturePool() = default;
 
+// An upload takes the oldest texture GL is done with. Drawing, which GL orders after earlier
+// use by itself, takes the newest, so that those finished stay for the uploads.
 uint32_t TexturePool::reuse(std::deque<Waiting>& waiting, bool forUpload) {
-  for (auto it = waiting.begin(); it != waiting.end(); ++it) {
-    auto fence = static_cast<GLsync>(it->fence);
-    if (forUpload && !finished(fence)) continue;
-    if (fence) glDeleteSync(fence);
-    uint32_t id = it->id;
-    waiting.erase(it);
-    return id;
+  if (waiting.empty()) return 0;
+  auto chosen = std::prev(waiting.end());
+  if (forUpload) {
+    chosen = std::find_if(waiting.begin(), waiting.end(),
+                          [](const Waiting& w) { return finished(static_cast<GLsync>(w.fence)); });
+    if (chosen == waiting.end()) return 0;
   }
-  return 0;
+  if (chosen->fence) glDeleteSync(static_cast<GLsync>(chosen->fence));
+  const uint32_t id = chosen->id;
+  waiting.erase(chosen);
+  return id;
 }
 
 uint32_t TexturePool::acquire(const TextureKey& key, bool forUpload) {
@@ -42,8 +49,8 @@ uint32_t TexturePool::acquire(const TextureKey& key, bool forUpload) {
   if (id == 0) {
     glGenTextures(1, &id);
     glBindTexture(GL_TEXTURE_2D, id);
-    glTexImage2D(GL_TEXTURE_2D, 0, static_cast<GLint>(key.internalFormat), key.width, key.height,
-                 0, key.pixelFormat, key.pixelType, nullptr);
+    glTexImage2D(GL_TEXTURE_2D, 0, static_cast<GLint>(key.internalFormat), key.width, key.height, 0,
+                 key.pixelFormat, key.pixelType, nullptr);
     ++created_;
   } else {
     glBindTexture(GL_TEXTURE_2D, id);

@@ -25,8 +25,9 @@ struct TextureKey {
 
 class TexturePool {
  public:
-  // At most this many textures of one key wait for reuse; more given back are deleted.
-  static constexpr std::size_t kKeptPerKey = 6;
+  // At most this many textures of one key wait for reuse; more given back are deleted. A
+  // render with two frames in flight, each with a few inputs, needs about this many.
+  static constexpr std::size_t kKeptPerKey = 8;
 
   TexturePool() = default;
   ~TexturePool();  // deletes nothing: GL may be gone by then; call clear() while it is not
