@@ -3,6 +3,8 @@
 
 #include <algorithm>
 #include <cctype>
+#include <map>
+#include <mutex>
 #include <stdexcept>
 
 #include "refhost/staged_file.h"
@@ -70,21 +72,28 @@ class SequenceSink : public FrameSink {
  public:
   explicit SequenceSink(const OutputTarget& target) : target_(target) {}
   void write(int32_t frame, const RgbaImage& picture) override {
-    files_.emplace_back(target_.frameName(frame));
-    writeImageFile(picture, files_.back().temporaryPath(), target_.imageFormat);
+    std::string temporary;
+    {
+      // Frames may come from several writers at once; each takes its file under the lock.
+      std::lock_guard<std::mutex> lock(mutex_);
+      temporary = files_.emplace(frame, target_.frameName(frame)).first->second.temporaryPath();
+    }
+    writeImageFile(picture, temporary, target_.imageFormat);
   }
+  bool concurrentWrites() const override { return true; }
   std::vector<std::string> commit() override {
     std::vector<std::string> names;
-    for (StagedFile& file : files_) {
-      file.commit();
-      names.push_back(file.finalPath());
+    for (auto& entry : files_) {
+      entry.second.commit();
+      names.push_back(entry.second.finalPath());
     }
     return names;
   }
 
  private:
   OutputTarget target_;
-  std::vector<StagedFile> files_;
+  std::mutex mutex_;
+  std::map<int32_t, StagedFile> files_;  // by frame, so the names come out in frame order
 };
 
 class VideoSink : public FrameSink {

@@ -40,6 +40,8 @@ class FrameSink {
   virtual std::vector<std::string> commit() = 0;
   // Empty, or something the user should know about how the frames were written.
   virtual std::string note() const { return ""; }
+  // True when write() may run on several threads at once (for different frames).
+  virtual bool concurrentWrites() const { return false; }
 };
 
 // Throws std::runtime_error naming the file when it cannot be created.

@@ -1,12 +1,20 @@
 // `veltrane render`: renders frames of a scene through the plug-in and writes them as a still
 // image, an image sequence or a video.
+#ifdef __linux__
+#include <malloc.h>
+#endif
+
+#include <algorithm>
 #include <cstdio>
 #include <stdexcept>
+#include <thread>
 
 #include "cli_support.h"
 #include "commands.h"
 #include "progress_bar.h"
+#include "refhost/async_frame_sink.h"
 #include "refhost/frame_output.h"
+#include "refhost/frame_pipeline.h"
 #include "scene_file.h"
 #include "scene_session.h"
 
@@ -36,6 +44,25 @@ const char kRenderHelp[] =
     "  --plugin PATH      the module to load (default: $VELTRANE_PLUGIN when set, else\n"
     "                     <dir of veltrane>/../lib/veltrane.so)\n"
     "  -h, --help         show this help\n";
+
+// Rendered frames waiting for the writer: enough to ride over a slow frame, few enough to keep
+// memory low (a 1080p frame is 8 MB).
+constexpr std::size_t kQueuedFrames = 4;
+
+// Frames are blocks of megabytes that one thread allocates and another frees, many times a
+// second; glibc hands blocks that large back to the kernel and faults them in anew each time.
+// Kept in the heap instead, they are reused.
+void keepFrameMemory() {
+#ifdef __linux__
+  mallopt(M_MMAP_THRESHOLD, 32 << 20);
+  mallopt(M_TRIM_THRESHOLD, 512 << 20);
+#endif
+}
+
+// Image sequences are written by a worker per core, up to four.
+int imageWriters() {
+  return static_cast<int>(std::clamp(std::thread::hardware_concurrency(), 1u, 4u));
+}
 
 struct FrameRange {
   int32_t first = 0;
@@ -104,24 +131,26 @@ int runRender(const std::vector<std::string>& args) {
   refhost::GlProfile profile = glProfile(options);
   std::string module = pluginPath(options);
 
+  keepFrameMemory();
   Scene scene = loadScene(parsed.positional.front());
   FrameRange frames = chooseFrames(options, target, scene);
   const refhost::Composition& composition = scene.composition;
   // The output is opened first so that a name that cannot be written fails before any render.
   // Until commit() it exists only under a temporary name, deleted if anything below throws.
-  auto sink =
-      refhost::openFrameSink(target, composition.width, composition.height, composition.frameRate);
+  refhost::AsyncFrameSink sink(
+      refhost::openFrameSink(target, composition.width, composition.height, composition.frameRate),
+      imageWriters(), kQueuedFrames);
   SceneSession session(scene, module, profile);
   {
     ProgressBar progress("rendering", frames.count());
-    for (int32_t frame = frames.first; frame <= frames.last; ++frame) {
-      sink->write(frame, session.render(frame));
-      progress.update(frame - frames.first + 1);
-    }
+    refhost::renderFrames(
+        session.host(), session.frameSettings(), frames.first, frames.last,
+        [&](refhost::RenderFrame& frame) { session.draw(frame); }, sink,
+        [&](int32_t done) { progress.update(done); });
   }
   session.finish();
-  std::string note = sink->note();
-  std::vector<std::string> written = sink->commit();
+  std::string note = sink.note();
+  std::vector<std::string> written = sink.commit();
   if (!note.empty()) std::fprintf(stderr, "veltrane render: note: %s\n", note.c_str());
   std::string where =
       written.size() == 1 ? written.front() : written.front() + " ... " + written.back();

@@ -58,7 +58,12 @@ void SceneSession::setParams(const std::vector<ParamSetting>& settings) {
 
 refhost::RgbaImage SceneSession::render(int32_t frame) {
   refhost::RenderFrame context(host(), settings_, frame);
-  host().setRenderContext(&context.context());
+  draw(context);
+  return context.readOutput();
+}
+
+void SceneSession::draw(refhost::RenderFrame& frame) {
+  host().setRenderContext(&frame.context());
   try {
     plugin_.send(12);
     plugin_.send(10);
@@ -67,7 +72,6 @@ refhost::RgbaImage SceneSession::render(int32_t frame) {
     throw;
   }
   host().setRenderContext(nullptr);
-  return context.readOutput();
 }
 
 }  // namespace veltrane_cli

@@ -32,6 +32,8 @@ class SceneSession {
 
   // Messages 12 and 10 with the frame's render context; the output read back, top row first.
   refhost::RgbaImage render(int32_t frame);
+  // Messages 12 and 10 with a render context made for the frame; its output stays in GL.
+  void draw(refhost::RenderFrame& frame);
 
   // Messages 4 and 1.
   void finish() { plugin_.finish(); }
