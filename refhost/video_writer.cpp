@@ -92,7 +92,9 @@ struct VideoWriter::Encoder {
     codec->height = (height + 1) & ~1;
     codec->time_base = av_inv_q(rate);
     codec->framerate = rate;
-    codec->gop_size = 12;
+    // The encoder's own keyframe interval, and as many threads as it wants: the settings the
+    // ffmpeg command line uses, so files and speed compare with its.
+    codec->thread_count = 0;
     codec->pix_fmt = encoder->pix_fmts ? encoder->pix_fmts[0] : AV_PIX_FMT_YUV420P;
     if (std::strcmp(encoder->name, "libx264") == 0) codec->pix_fmt = AV_PIX_FMT_YUV420P;
     // BT.601 with limited range is what the RGBA conversion below produces.
@@ -125,8 +127,9 @@ struct VideoWriter::Encoder {
     scaler = sws_getContext(codec->width, codec->height, AV_PIX_FMT_RGBA, codec->width,
                             codec->height, codec->pix_fmt, SWS_BILINEAR, nullptr, nullptr, nullptr);
     if (!scaler) fail("no conversion from RGBA");
-    padded.resize(static_cast<std::size_t>(codec->width) * static_cast<std::size_t>(codec->height) *
-                  4);
+    if (codec->width != width || codec->height != height)
+      padded.resize(static_cast<std::size_t>(codec->width) *
+                    static_cast<std::size_t>(codec->height) * 4);
   }
 
   // Sends a frame (or, with null, the end) and writes every packet the encoder has ready.
@@ -175,10 +178,13 @@ void VideoWriter::write(const RgbaImage& picture) {
   if (picture.width != e.width || picture.height != e.height)
     e.fail("a frame of " + std::to_string(picture.width) + "x" + std::to_string(picture.height) +
            " in a video of " + std::to_string(e.width) + "x" + std::to_string(e.height));
-  e.padPicture(picture);
+  // An even-sized picture is converted as it is; only an odd one is padded first.
+  const bool even = e.codec->width == e.width && e.codec->height == e.height;
+  if (!even) e.padPicture(picture);
   int result = av_frame_make_writable(e.frame);
   if (result < 0) e.fail("out of memory", result);
-  const uint8_t* planes[4] = {e.padded.data(), nullptr, nullptr, nullptr};
+  const uint8_t* planes[4] = {even ? picture.pixels.data() : e.padded.data(), nullptr, nullptr,
+                              nullptr};
   int strides[4] = {e.codec->width * 4, 0, 0, 0};
   sws_scale(e.scaler, planes, strides, 0, e.codec->height, e.frame->data, e.frame->linesize);
   e.frame->pts = e.nextPts++;
