@@ -98,11 +98,12 @@ class SequenceSink : public FrameSink {
 
 class VideoSink : public FrameSink {
  public:
-  VideoSink(const OutputTarget& target, int32_t width, int32_t height, double frameRate)
+  VideoSink(const OutputTarget& target, int32_t width, int32_t height, double frameRate,
+            const AudioClip& audio)
       : target_(target),
         file_(target.path),
         writer_(std::make_unique<VideoWriter>(file_.temporaryPath(), target.container, width,
-                                              height, frameRate)) {}
+                                              height, frameRate, audio)) {}
   ~VideoSink() override { writer_.reset(); }  // closes the file before the temporary goes
   void write(int32_t, const RgbaImage& picture) override { writer_->write(picture); }
   std::vector<std::string> commit() override {
@@ -159,14 +160,14 @@ OutputTarget parseOutputTarget(const std::string& path) {
 }
 
 std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
-                                         double frameRate) {
+                                         double frameRate, const AudioClip& audio) {
   switch (target.kind) {
     case OutputKind::Still:
       return std::make_unique<StillSink>(target);
     case OutputKind::Sequence:
       return std::make_unique<SequenceSink>(target);
     case OutputKind::Video:
-      return std::make_unique<VideoSink>(target, width, height, frameRate);
+      return std::make_unique<VideoSink>(target, width, height, frameRate, audio);
   }
   return nullptr;
 }

@@ -44,8 +44,9 @@ class FrameSink {
   virtual bool concurrentWrites() const { return false; }
 };
 
-// Throws std::runtime_error naming the file when it cannot be created.
+// Throws std::runtime_error naming the file when it cannot be created. A video carries the
+// audio clip's sound, if it has any.
 std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
-                                         double frameRate);
+                                         double frameRate, const AudioClip& audio = {});
 
 }  // namespace refhost

@@ -50,6 +50,7 @@ struct VideoWriter::Encoder {
   bool finished = false;
   std::string codecName;
   std::string note;
+  std::unique_ptr<AudioTrack> audio;  // reads its own input; never touches `format` when freed
 
   ~Encoder() {
     if (headerWritten && !finished) av_write_trailer(format);
@@ -75,7 +76,7 @@ struct VideoWriter::Encoder {
     return chosen;
   }
 
-  void open(VideoContainer container, double frameRate) {
+  void open(VideoContainer container, double frameRate, const AudioClip& audioClip) {
     int result =
         avformat_alloc_output_context2(&format, nullptr, muxerName(container), path.c_str());
     if (result < 0 || !format) fail("no muxer", result);
@@ -113,6 +114,7 @@ struct VideoWriter::Encoder {
       fail("codec data", result);
     stream->time_base = codec->time_base;
     stream->avg_frame_rate = rate;
+    if (!audioClip.path.empty()) audio = AudioTrack::open(audioClip, format);
 
     if ((result = avio_open(&format->pb, path.c_str(), AVIO_FLAG_WRITE)) < 0)
       fail("cannot create the file", result);
@@ -137,11 +139,15 @@ struct VideoWriter::Encoder {
     int result = avcodec_send_frame(codec, input);
     if (result < 0) fail("encoding failed", result);
     while ((result = avcodec_receive_packet(codec, packet)) == 0) {
+      const double end =
+          static_cast<double>(packet->pts + packet->duration) * av_q2d(codec->time_base);
       av_packet_rescale_ts(packet, codec->time_base, stream->time_base);
       packet->stream_index = stream->index;
       result = av_interleaved_write_frame(format, packet);
       av_packet_unref(packet);
       if (result < 0) fail("writing a packet failed", result);
+      // The sound goes along with the pictures, so the muxer interleaves without piling up.
+      if (audio) audio->writeUntil(end);
     }
     if (result != AVERROR(EAGAIN) && result != AVERROR_EOF) fail("encoding failed", result);
   }
@@ -160,7 +166,7 @@ struct VideoWriter::Encoder {
 };
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int32_t width,
-                         int32_t height, double frameRate)
+                         int32_t height, double frameRate, const AudioClip& audio)
     : encoder_(std::make_unique<Encoder>()) {
   encoder_->path = path;
   // The libraries' progress chatter would bury the command line's own output.
@@ -168,7 +174,7 @@ VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int3
   encoder_->width = width;
   encoder_->height = height;
   if (width <= 0 || height <= 0) encoder_->fail("a video needs a frame of at least 1x1");
-  encoder_->open(container, frameRate);
+  encoder_->open(container, frameRate, audio);
 }
 
 VideoWriter::~VideoWriter() = default;
@@ -195,6 +201,7 @@ void VideoWriter::finish() {
   Encoder& e = *encoder_;
   if (e.finished) return;
   e.encode(nullptr);
+  if (e.audio) e.audio->finish();
   int result = av_write_trailer(e.format);
   e.finished = true;
   if (result < 0) e.fail("cannot complete the file", result);

@@ -22,7 +22,7 @@ namespace veltrane_cli {
 namespace {
 
 const char kRenderHelp[] =
-    "Usage: veltrane render SCENE.json -o OUT [--frame N | --frames A-B]\n"
+    "Usage: veltrane render SCENE.json -o OUT [--frame N | --frames A-B] [--no-audio]\n"
     "                       [--profile core|compat] [--plugin PATH]\n"
     "\n"
     "Loads the plug-in into the reference host with a headless GL context, sets up the scene\n"
@@ -33,13 +33,16 @@ const char kRenderHelp[] =
     "OUT by its name:\n"
     "  NAME.png, NAME.exr        one frame (frame 0 unless --frame N)\n"
     "  NAME_%04d.png (or .exr)   an image sequence, one file per frame\n"
-    "  NAME.mp4, .mov, .mkv      H.264 video at the scene's rate\n"
+    "  NAME.mp4, .mov, .mkv      H.264 video at the scene's rate; when the effect's own source is\n"
+    "                            a video with sound, it carries the sound of the frames\n"
+    "                            rendered (copied, or as AAC where the container needs it)\n"
     "Files appear under their names only when complete.\n"
     "\n"
     "Options:\n"
     "  -o, --output OUT   where the frames go (required)\n"
     "  --frame N          render only frame N\n"
     "  --frames A-B       render frames A to B (default: every frame of the scene)\n"
+    "  --no-audio         leave the sound out of a video\n"
     "  --profile P        GL profile: core (default) or compat\n"
     "  --plugin PATH      the module to load (default: $VELTRANE_PLUGIN when set, else\n"
     "                     <dir of veltrane>/../lib/veltrane.so)\n"
@@ -115,6 +118,7 @@ int runRender(const std::vector<std::string>& args) {
                                            {"--output", true},
                                            {"--frame", true},
                                            {"--frames", true},
+                                           {"--no-audio", false},
                                            {"--profile", true},
                                            {"--plugin", true}});
   auto& options = parsed.options;
@@ -137,9 +141,13 @@ int runRender(const std::vector<std::string>& args) {
   const refhost::Composition& composition = scene.composition;
   // The output is opened first so that a name that cannot be written fails before any render.
   // Until commit() it exists only under a temporary name, deleted if anything below throws.
-  refhost::AsyncFrameSink sink(
-      refhost::openFrameSink(target, composition.width, composition.height, composition.frameRate),
-      imageWriters(), kQueuedFrames);
+  refhost::AudioClip audio;
+  if (!options.count("--no-audio") && composition.source.kind == refhost::MediaSpec::Kind::File &&
+      refhost::isVideoPath(composition.source.path))
+    audio = {composition.source.path, frames.first, frames.count(), composition.frameRate};
+  refhost::AsyncFrameSink sink(refhost::openFrameSink(target, composition.width, composition.height,
+                                                      composition.frameRate, audio),
+                               imageWriters(), kQueuedFrames);
   SceneSession session(scene, module, profile);
   {
     ProgressBar progress("rendering", frames.count());
