@@ -50,7 +50,6 @@ struct AudioTrack::State {
   double start = 0, end = 0;  // the clip in the source's seconds
   double written = 0;         // seconds of output audio handed to the muxer
   bool ended = false;
-  std::string how;
 
   // Stream copy: the shift that puts the clip's first packet at or just after 0.
   int64_t shift = AV_NOPTS_VALUE;
@@ -112,7 +111,6 @@ struct AudioTrack::State {
     check(avcodec_parameters_copy(target->codecpar, source->codecpar), "codec data");
     target->codecpar->codec_tag = 0;
     target->time_base = source->time_base;
-    how = std::string("copied (") + avcodec_get_name(source->codecpar->codec_id) + ")";
   }
 
   void openEncode() {
@@ -154,7 +152,6 @@ struct AudioTrack::State {
     fifo = av_audio_fifo_alloc(encoder->sample_fmt, encoder->ch_layout.nb_channels, 4096);
     if (!fifo) fail("out of memory");
     total = std::llround((end - start) * encoder->sample_rate);
-    how = std::string("encoded as AAC from ") + avcodec_get_name(source->codecpar->codec_id);
   }
 
   // Sends the samples waiting, whole encoder frames only unless `all`.
@@ -330,7 +327,5 @@ void AudioTrack::finish() {
   s.encodeWaiting(true);
   s.encode(nullptr);
 }
-
-const std::string& AudioTrack::how() const { return state_->how; }
 
 }  // namespace refhost

@@ -34,8 +34,6 @@ class AudioTrack {
   void writeUntil(double seconds);
   // Writes the rest of the clip, the encoder's last packets included.
   void finish();
-  // "copied (aac)" or "encoded as AAC from pcm_s16le", for the user.
-  const std::string& how() const;
 
  private:
   struct State;

@@ -1,5 +1,5 @@
 // The effect's passes in bare GL: its shader computations written out again, static geometry
-// uploaded once, and nothing between the draws but the state the passes need.
+// uploaded once, and between the draws the effect's own state changes, nothing of a host's.
 #include "floor_replica.h"
 
 #include <GL/glew.h>

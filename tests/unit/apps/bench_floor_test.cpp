@@ -19,7 +19,9 @@ TEST(BenchFloor, ReplicaDrawsTheRendersPictureForEveryLayout) {
     EXPECT_GT(row["floorCpuMs"].get<double>(), 0.0) << row;
     // Layer rows show other pictures than the replica's own source; only own rows compare.
     EXPECT_EQ(row.contains("floorDifference"), row["inputs"] == "own") << row;
-    if (row["inputs"] == "own") EXPECT_LE(row["floorDifference"].get<int>(), 8) << row;
+    if (row["inputs"] == "own") {
+      EXPECT_LE(row["floorDifference"].get<int>(), 8) << row;
+    }
   }
 }
 
