@@ -16,14 +16,10 @@ extern "C" {
 #include <stdexcept>
 #include <vector>
 
+#include "refhost/av_error.h"
+
 namespace refhost {
 namespace {
-
-std::string errorText(int code) {
-  char buffer[AV_ERROR_MAX_STRING_SIZE] = {};
-  av_strerror(code, buffer, sizeof buffer);
-  return buffer;
-}
 
 double seconds(int64_t timestamp, AVRational base) {
   return static_cast<double>(timestamp) * av_q2d(base);
@@ -78,7 +74,7 @@ struct AudioTrack::State {
 
   [[noreturn]] void fail(const std::string& what, int code = 0) const {
     throw std::runtime_error(path + ": cannot carry the audio: " + what +
-                             (code ? " (" + errorText(code) + ")" : ""));
+                             (code ? " (" + avErrorText(code) + ")" : ""));
   }
 
   void check(int result, const char* what) const {
