@@ -3,6 +3,8 @@
 
 #include <algorithm>
 #include <cctype>
+#include <map>
+#include <mutex>
 #include <stdexcept>
 
 #include "refhost/staged_file.h"
@@ -73,24 +75,37 @@ class SequenceSink : public FrameSink {
  public:
   explicit SequenceSink(const OutputTarget& target) : target_(target), files_(target.path) {}
   void write(int32_t frame, const RgbaImage& picture) override {
-    std::string name = target_.frameName(frame);
-    std::vector<uint8_t> bytes = encodeImage(picture, target_.imageFormat, name);
+    const std::string name = target_.frameName(frame);
+    // Frames may come from several writers at once: each encodes its own and hands the bytes
+    // over under the lock.
+    const std::vector<uint8_t> bytes = encodeImage(picture, target_.imageFormat, name);
+    std::lock_guard<std::mutex> lock(mutex_);
     files_.write(name, bytes.data(), bytes.size());
+    names_[frame] = name;
   }
-  std::vector<std::string> commit() override { return files_.commit(); }
+  bool concurrentWrites() const override { return true; }
+  std::vector<std::string> commit() override {
+    files_.commit();
+    std::vector<std::string> names;
+    for (const auto& entry : names_) names.push_back(entry.second);
+    return names;
+  }
 
  private:
   OutputTarget target_;
+  std::mutex mutex_;
   StagedFileSet files_;
+  std::map<int32_t, std::string> names_;  // by frame, so the names come out in frame order
 };
 
 class VideoSink : public FrameSink {
  public:
-  VideoSink(const OutputTarget& target, int32_t width, int32_t height, double frameRate)
+  VideoSink(const OutputTarget& target, int32_t width, int32_t height, double frameRate,
+            const AudioClip& audio)
       : target_(target),
         file_(target.path),
         writer_(std::make_unique<VideoWriter>(file_.temporaryPath(), target.container, width,
-                                              height, frameRate, target.path)) {}
+                                              height, frameRate, target.path, audio)) {}
   ~VideoSink() override { writer_.reset(); }  // closes the file before the temporary goes
   void write(int32_t, const RgbaImage& picture) override { writer_->write(picture); }
   std::vector<std::string> commit() override {
@@ -151,14 +166,14 @@ OutputTarget parseOutputTarget(const std::string& path) {
 }
 
 std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
-                                         double frameRate) {
+                                         double frameRate, const AudioClip& audio) {
   switch (target.kind) {
     case OutputKind::Still:
       return std::make_unique<StillSink>(target);
     case OutputKind::Sequence:
       return std::make_unique<SequenceSink>(target);
     case OutputKind::Video:
-      return std::make_unique<VideoSink>(target, width, height, frameRate);
+      return std::make_unique<VideoSink>(target, width, height, frameRate, audio);
   }
   return nullptr;
 }

@@ -41,10 +41,13 @@ class FrameSink {
   virtual std::vector<std::string> commit() = 0;
   // Empty, or something the user should know about how the frames were written.
   virtual std::string note() const { return ""; }
+  // True when write() may run on several threads at once (for different frames).
+  virtual bool concurrentWrites() const { return false; }
 };
 
-// Throws std::runtime_error naming the file when it cannot be created.
+// Throws std::runtime_error naming the file when it cannot be created. A video carries the
+// audio clip's sound, if it has any.
 std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
-                                         double frameRate);
+                                         double frameRate, const AudioClip& audio = {});
 
 }  // namespace refhost

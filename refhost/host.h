@@ -17,6 +17,7 @@
 #include "refhost/gl_context.h"
 #include "refhost/module.h"
 #include "refhost/params.h"
+#include "refhost/texture_pool.h"
 #include "refhost/undo.h"
 
 namespace refhost {
@@ -121,9 +122,11 @@ class Host {
   void setDrawTarget(uint32_t textureId, int32_t width, int32_t height);
   // Host-owned textures for render contexts (not counted as the plug-in's): RGBA8 pixels, or
   // uninitialised storage when `pixels` is null. The record has s1 = t1 = 1 and scales of 1.
+  // They come from the same pool as the plug-in's, and deleteTexture gives them back to it.
   TextureRecord createTexture(int32_t width, int32_t height, const void* pixels = nullptr,
                               uint32_t internalFormat = 0x1908 /* GL_RGBA */);
   void deleteTexture(uint32_t id);
+  const TexturePool& texturePool() const { return texturePool_; }
   std::vector<uint8_t> readTexture(uint32_t id, int32_t width, int32_t height);  // RGBA8
 
   // ---- Parameters ------------------------------------------------------------------------
@@ -193,6 +196,8 @@ class Host {
   // Wall-clock seconds spent so far producing and uploading frames for GetSourceFrame and
   // RenderLayerFrame: the host's share of a render message's time.
   double frameDeliverySeconds() const { return frameDeliverySeconds_; }
+  // The same in CPU seconds of the thread that delivered them.
+  double frameDeliveryCpuSeconds() const { return frameDeliveryCpuSeconds_; }
   // The one vertex array the host hands out on every CreateVertexArray (0 before the first).
   uint32_t vertexArray() const { return vertexArray_; }
 
@@ -302,6 +307,8 @@ class Host {
                        TextureRecord* out);
 
   // Resources (host_resources.cpp).
+  // A texture from the pool holding the pixels (given in the key's format and type) if any.
+  uint32_t texture(const TextureKey& key, const void* pixels);
   uint32_t allocateTexture(int32_t width, int32_t height, uint32_t internalFormat,
                            uint32_t pixelFormat, uint32_t pixelType, const void* data,
                            int32_t* allocatedWidth, int32_t* allocatedHeight);
@@ -345,7 +352,9 @@ class Host {
   std::set<uint32_t> textures_;
   std::set<uint32_t> buffers_;
   std::set<uint32_t> frames_;
+  TexturePool texturePool_;
   double frameDeliverySeconds_ = 0;
+  double frameDeliveryCpuSeconds_ = 0;
 
   std::vector<int32_t> cursorShapes_;
   int redraws_ = 0;

@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cstring>
+#include <ctime>
 
 #include "refhost/host.h"
 #include "refhost/text.h"
@@ -13,6 +14,12 @@ constexpr uint32_t kGlRgba = 0x1908;
 constexpr uint32_t kGlUnsignedByte = 0x1401;
 
 std::string guidText(const char* guid) { return guid ? std::string(guid, strnlen(guid, 64)) : ""; }
+
+double threadCpuSeconds() {
+  timespec now{};
+  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
+  return static_cast<double>(now.tv_sec) + static_cast<double>(now.tv_nsec) * 1e-9;
+}
 
 }  // namespace
 
@@ -115,6 +122,7 @@ int32_t Host::deliverFrame(const FrameSource& source, int32_t frame, int32_t wid
     return 1;
   }
   auto started = std::chrono::steady_clock::now();
+  double startedCpu = threadCpuSeconds();
   std::vector<uint8_t> pixels = source(frame, width, height);
   if (pixels.size() != static_cast<std::size_t>(width) * static_cast<std::size_t>(height) * 4) {
     problem("a frame source gave " + std::to_string(pixels.size()) + " bytes for a " +
@@ -127,6 +135,7 @@ int32_t Host::deliverFrame(const FrameSource& source, int32_t frame, int32_t wid
   frames_.insert(out->id);
   frameDeliverySeconds_ +=
       std::chrono::duration<double>(std::chrono::steady_clock::now() - started).count();
+  frameDeliveryCpuSeconds_ += threadCpuSeconds() - startedCpu;
   return 0;
 }
 

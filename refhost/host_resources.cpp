@@ -1,6 +1,9 @@
 // GL resources the host hands the plug-in (textures, buffers, the vertex array), their
 // accounting, and the host's own framebuffer and textures.
 //
+// Textures: every one, the plug-in's and the host's own, comes from one pool keyed by size and
+// format and goes back to it, so rendering frame after frame allocates no texture storage.
+//
 // Vertex arrays: the host keeps one vertex array for its whole life and answers every
 // CreateVertexArray with it; the plug-in never deletes it, so nothing about it needs balancing.
 #include <GL/glew.h>
@@ -25,23 +28,13 @@ class TextureBindingGuard {
   GLint previous_ = 0;
 };
 
-GLuint makeTexture(GLsizei width, GLsizei height, GLenum internalFormat, GLenum pixelFormat,
-                   GLenum pixelType, const void* data) {
-  TextureBindingGuard guard;
-  GLuint id = 0;
-  glGenTextures(1, &id);
-  glBindTexture(GL_TEXTURE_2D, id);
-  glTexImage2D(GL_TEXTURE_2D, 0, static_cast<GLint>(internalFormat), width, height, 0, pixelFormat,
-               pixelType, data);
-  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MIN_FILTER, GL_LINEAR);
-  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MAG_FILTER, GL_LINEAR);
-  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_WRAP_S, GL_CLAMP_TO_EDGE);
-  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_WRAP_T, GL_CLAMP_TO_EDGE);
-  return id;
+// Gives a texture back to the pool, or deletes one the pool did not make.
+void dropTexture(TexturePool& pool, uint32_t id) {
+  if (!pool.giveBack(id)) glDeleteTextures(1, &id);
 }
 
-void deleteTextures(std::set<uint32_t>& names) {
-  for (uint32_t id : names) glDeleteTextures(1, &id);
+void dropTextures(TexturePool& pool, std::set<uint32_t>& names) {
+  for (uint32_t id : names) dropTexture(pool, id);
   names.clear();
 }
 
@@ -89,14 +82,15 @@ void Host::setDrawTarget(uint32_t textureId, int32_t width, int32_t height) {
 void Host::reclaimFrames() {
   if (frames_.empty() || !gl_) return;
   gl_->makeCurrent();
-  deleteTextures(frames_);
+  dropTextures(texturePool_, frames_);
 }
 
 void Host::releaseGl() {
   if (!gl_) return;
   gl_->makeCurrent();
-  deleteTextures(textures_);
-  deleteTextures(frames_);
+  dropTextures(texturePool_, textures_);
+  dropTextures(texturePool_, frames_);
+  texturePool_.clear();
   for (uint32_t id : buffers_) glDeleteBuffers(1, &id);
   buffers_.clear();
   if (vertexArray_) glDeleteVertexArrays(1, &vertexArray_);
@@ -111,7 +105,7 @@ TextureRecord Host::createTexture(int32_t width, int32_t height, const void* pix
   if (!gl_) throw std::logic_error("refhost::Host::createTexture: no GL context attached");
   gl_->makeCurrent();
   TextureRecord record{};
-  record.id = makeTexture(width, height, internalFormat, GL_RGBA, GL_UNSIGNED_BYTE, pixels);
+  record.id = texture(TextureKey{width, height, internalFormat, GL_RGBA, GL_UNSIGNED_BYTE}, pixels);
   record.pixelType = GL_UNSIGNED_BYTE;
   record.format = internalFormat;
   record.allocatedWidth = record.imageWidth = width;
@@ -124,7 +118,18 @@ TextureRecord Host::createTexture(int32_t width, int32_t height, const void* pix
 void Host::deleteTexture(uint32_t id) {
   if (!gl_) return;
   gl_->makeCurrent();
-  glDeleteTextures(1, &id);
+  dropTexture(texturePool_, id);
+}
+
+uint32_t Host::texture(const TextureKey& key, const void* pixels) {
+  uint32_t id = texturePool_.acquire(key, pixels != nullptr);
+  if (pixels) {
+    TextureBindingGuard guard;
+    glBindTexture(GL_TEXTURE_2D, id);
+    glTexSubImage2D(GL_TEXTURE_2D, 0, 0, 0, key.width, key.height, key.pixelFormat, key.pixelType,
+                    pixels);
+  }
+  return id;
 }
 
 std::vector<uint8_t> Host::readTexture(uint32_t id, int32_t width, int32_t height) {
@@ -161,7 +166,7 @@ uint32_t Host::allocateTexture(int32_t width, int32_t height, uint32_t internalF
     return 0;
   }
   // This host allocates exactly the size asked for, so the image fills its texture.
-  GLuint id = makeTexture(width, height, internalFormat, pixelFormat, pixelType, data);
+  uint32_t id = texture(TextureKey{width, height, internalFormat, pixelFormat, pixelType}, data);
   textures_.insert(id);
   if (allocatedWidth) *allocatedWidth = width;
   if (allocatedHeight) *allocatedHeight = height;
@@ -180,7 +185,7 @@ void Host::releaseTexture(uint32_t id) {
     return;
   }
   owner->erase(id);
-  if (gl_) glDeleteTextures(1, &id);
+  if (gl_) dropTexture(texturePool_, id);
 }
 
 uint32_t Host::createVertexArray() {

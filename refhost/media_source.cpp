@@ -4,11 +4,16 @@
 #include <algorithm>
 #include <cctype>
 
+#include "refhost/frame_prefetch.h"
 #include "refhost/image_files.h"
 #include "refhost/video_reader.h"
 
 namespace refhost {
 namespace {
+
+// Frames a source decodes ahead of the render: enough to cover a slow frame, few enough that
+// four 1080p sources hold under 100 MB.
+constexpr int32_t kDecodeAhead = 3;
 
 class PatternSource : public MediaSource {
  public:
@@ -57,13 +62,25 @@ class VideoSource : public MediaSource {
   RgbaImage frame(int32_t index, int32_t width, int32_t height) override {
     return reader_.frame(index, width, height);
   }
+  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height) override {
+    return reader_.glRows(index, width, height);
+  }
   int32_t frameCount() const override { return reader_.frameCount(); }
 
  private:
   VideoReader reader_;
 };
 
+std::shared_ptr<MediaSource> decodingAhead(std::shared_ptr<MediaSource> source) {
+  return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead);
+}
+
 }  // namespace
+
+std::vector<uint8_t> MediaSource::glRows(int32_t index, int32_t width, int32_t height) {
+  RgbaImage image = frame(index, width, height);
+  return flipRows(image.pixels, image.width, image.height);
+}
 
 MediaSpec MediaSpec::ofPattern(Pattern pattern) {
   MediaSpec spec;
@@ -102,11 +119,13 @@ bool isVideoPath(const std::string& path) {
 std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec) {
   switch (spec.kind) {
     case MediaSpec::Kind::Pattern:
+      if (spec.pattern == Pattern::Counter)
+        return decodingAhead(std::make_shared<PatternSource>(spec.pattern));
       return std::make_shared<PatternSource>(spec.pattern);
     case MediaSpec::Kind::Colour:
       return std::make_shared<ColourSource>(spec.colour);
     case MediaSpec::Kind::File:
-      if (isVideoPath(spec.path)) return std::make_shared<VideoSource>(spec.path);
+      if (isVideoPath(spec.path)) return decodingAhead(std::make_shared<VideoSource>(spec.path));
       return std::make_shared<StillImageSource>(spec.path);
   }
   return nullptr;
@@ -121,8 +140,7 @@ FrameSource frameSourceOf(std::shared_ptr<MediaSource> source) {
   return [source, kept](int32_t frame, int32_t width, int32_t height) {
     bool still = !source->changesOverTime();
     if (still && kept->width == width && kept->height == height) return kept->rows;
-    RgbaImage image = source->frame(frame, width, height);
-    std::vector<uint8_t> rows = flipRows(image.pixels, image.width, image.height);
+    std::vector<uint8_t> rows = source->glRows(frame, width, height);
     if (still) *kept = Kept{width, height, rows};
     return rows;
   };

@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "refhost/host.h"
 #include "refhost/rgba_image.h"
@@ -32,13 +33,16 @@ class MediaSource {
   // Frame `index` stretched to the size, top row first. Frames outside a video hold its first
   // or last frame.
   virtual RgbaImage frame(int32_t index, int32_t width, int32_t height) = 0;
+  // The same picture in GL's row order, bottom row first, as the host uploads it.
+  virtual std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height);
   // How many frames the media holds; 0 when it looks the same at every frame or never ends.
   virtual int32_t frameCount() const { return 0; }
   // False when every frame is the same picture, which lets a caller keep the last one.
   virtual bool changesOverTime() const { return true; }
 };
 
-// Throws std::runtime_error naming the file when a file cannot be opened or decoded.
+// Throws std::runtime_error naming the file when a file cannot be opened or decoded. Sources
+// that change over time (videos, the counter) decode ahead on a worker thread of their own.
 std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec);
 
 // The host's frame callback over a media source: the same pictures in GL's bottom-up rows. A

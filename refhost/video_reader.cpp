@@ -88,6 +88,10 @@ struct VideoReader::Decoder {
     AVStream* video = format->streams[stream];
     codec = avcodec_alloc_context3(decoderCodec);
     if (!codec || avcodec_parameters_to_context(codec, video->codecpar) < 0) fail("bad codec data");
+    // Frame and slice threads as the machine has cores: decoding keeps up with the render
+    // instead of running on the caller's thread alone.
+    codec->thread_count = 0;
+    codec->thread_type = FF_THREAD_FRAME | FF_THREAD_SLICE;
     if ((result = avcodec_open2(codec, decoderCodec, nullptr)) < 0) fail("decoder refused", result);
     packet = av_packet_alloc();
     decoded = av_frame_alloc();
@@ -171,17 +175,23 @@ struct VideoReader::Decoder {
     if (currentIndex < 0) fail("frame " + std::to_string(index) + ": no picture decodes");
   }
 
-  RgbaImage convert(int32_t width, int32_t height) {
-    RgbaImage image(width, height);
-    if (width == 0 || height == 0) return image;
+  // Scales the current frame into RGBA rows `stride` bytes apart starting at `first` (a
+  // negative stride with the last row's address writes the picture bottom row first).
+  void convert(int32_t width, int32_t height, uint8_t* first, int stride) {
+    if (width == 0 || height == 0) return;
     scaler = sws_getCachedContext(scaler, current->width, current->height,
                                   static_cast<AVPixelFormat>(current->format), width, height,
                                   AV_PIX_FMT_RGBA, SWS_BILINEAR, nullptr, nullptr, nullptr);
     if (!scaler) fail("no conversion to RGBA");
-    uint8_t* planes[4] = {image.pixels.data(), nullptr, nullptr, nullptr};
-    int strides[4] = {width * 4, 0, 0, 0};
+    uint8_t* planes[4] = {first, nullptr, nullptr, nullptr};
+    int strides[4] = {stride, 0, 0, 0};
     sws_scale(scaler, current->data, current->linesize, 0, current->height, planes, strides);
-    return image;
+  }
+
+  void seekTo(int32_t index) {
+    index = std::max(index, 0);
+    if (frameCount > 0) index = std::min(index, frameCount - 1);
+    if (index != currentIndex) decodeTo(index);
   }
 };
 
@@ -203,10 +213,21 @@ int32_t VideoReader::frameCount() const { return decoder_->frameCount; }
 
 RgbaImage VideoReader::frame(int32_t index, int32_t width, int32_t height) {
   lastLibraryError.clear();
-  index = std::max(index, 0);
-  if (decoder_->frameCount > 0) index = std::min(index, decoder_->frameCount - 1);
-  if (index != decoder_->currentIndex) decoder_->decodeTo(index);
-  return decoder_->convert(width, height);
+  decoder_->seekTo(index);
+  RgbaImage image(width, height);
+  decoder_->convert(image.width, image.height, image.pixels.data(), image.width * 4);
+  return image;
+}
+
+std::vector<uint8_t> VideoReader::glRows(int32_t index, int32_t width, int32_t height) {
+  lastLibraryError.clear();
+  decoder_->seekTo(index);
+  width = std::max(width, 0);
+  height = std::max(height, 0);
+  const std::size_t row = static_cast<std::size_t>(width) * 4;
+  std::vector<uint8_t> rows(row * static_cast<std::size_t>(height));
+  if (!rows.empty()) decoder_->convert(width, height, &rows[row * (height - 1)], -width * 4);
+  return rows;
 }
 
 }  // namespace refhost

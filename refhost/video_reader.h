@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "refhost/rgba_image.h"
 
@@ -27,6 +28,8 @@ class VideoReader {
   // Frame `index` counted from 0 at the stream's rate, scaled to the size, top row first.
   // Indexes before the first frame give the first, after the last the last.
   RgbaImage frame(int32_t index, int32_t width, int32_t height);
+  // The same picture in GL's row order (bottom row first), converted straight into it.
+  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height);
 
  private:
   struct Decoder;

@@ -26,9 +26,10 @@ int32_t VideoReader::height() const { return 0; }
 double VideoReader::frameRate() const { return 0; }
 int32_t VideoReader::frameCount() const { return 0; }
 RgbaImage VideoReader::frame(int32_t, int32_t, int32_t) { return {}; }
+std::vector<uint8_t> VideoReader::glRows(int32_t, int32_t, int32_t) { return {}; }
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer, int32_t, int32_t, double,
-                         const std::string&) {
+                         const std::string&, const AudioClip&) {
   unavailable(path);
 }
 VideoWriter::~VideoWriter() = default;

@@ -51,6 +51,7 @@ struct VideoWriter::Encoder {
   bool finished = false;
   std::string codecName;
   std::string note;
+  std::unique_ptr<AudioTrack> audio;  // reads its own input; never touches `format` when freed
 
   ~Encoder() {
     if (headerWritten && !finished) av_write_trailer(format);
@@ -76,7 +77,7 @@ struct VideoWriter::Encoder {
     return chosen;
   }
 
-  void open(VideoContainer container, double frameRate) {
+  void open(VideoContainer container, double frameRate, const AudioClip& audioClip) {
     int result =
         avformat_alloc_output_context2(&format, nullptr, muxerName(container), path.c_str());
     if (result < 0 || !format) fail("no muxer", result);
@@ -93,7 +94,9 @@ struct VideoWriter::Encoder {
     codec->height = (height + 1) & ~1;
     codec->time_base = av_inv_q(rate);
     codec->framerate = rate;
-    codec->gop_size = 12;
+    // The encoder's own keyframe interval, and as many threads as it wants: the settings the
+    // ffmpeg command line uses, so files and speed compare with its.
+    codec->thread_count = 0;
     codec->pix_fmt = encoder->pix_fmts ? encoder->pix_fmts[0] : AV_PIX_FMT_YUV420P;
     if (std::strcmp(encoder->name, "libx264") == 0) codec->pix_fmt = AV_PIX_FMT_YUV420P;
     // BT.601 with limited range is what the RGBA conversion below produces.
@@ -112,6 +115,7 @@ struct VideoWriter::Encoder {
       fail("codec data", result);
     stream->time_base = codec->time_base;
     stream->avg_frame_rate = rate;
+    if (!audioClip.path.empty()) audio = AudioTrack::open(audioClip, format);
 
     if ((result = avio_open(&format->pb, path.c_str(), AVIO_FLAG_WRITE)) < 0)
       fail("cannot create the file", result);
@@ -126,8 +130,9 @@ struct VideoWriter::Encoder {
     scaler = sws_getContext(codec->width, codec->height, AV_PIX_FMT_RGBA, codec->width,
                             codec->height, codec->pix_fmt, SWS_BILINEAR, nullptr, nullptr, nullptr);
     if (!scaler) fail("no conversion from RGBA");
-    padded.resize(static_cast<std::size_t>(codec->width) * static_cast<std::size_t>(codec->height) *
-                  4);
+    if (codec->width != width || codec->height != height)
+      padded.resize(static_cast<std::size_t>(codec->width) *
+                    static_cast<std::size_t>(codec->height) * 4);
   }
 
   // Sends a frame (or, with null, the end) and writes every packet the encoder has ready.
@@ -135,11 +140,15 @@ struct VideoWriter::Encoder {
     int result = avcodec_send_frame(codec, input);
     if (result < 0) fail("encoding failed", result);
     while ((result = avcodec_receive_packet(codec, packet)) == 0) {
+      const double end =
+          static_cast<double>(packet->pts + packet->duration) * av_q2d(codec->time_base);
       av_packet_rescale_ts(packet, codec->time_base, stream->time_base);
       packet->stream_index = stream->index;
       result = av_interleaved_write_frame(format, packet);
       av_packet_unref(packet);
       if (result < 0) fail("writing a packet failed", result);
+      // The sound goes along with the pictures, so the muxer interleaves without piling up.
+      if (audio) audio->writeUntil(end);
     }
     if (result != AVERROR(EAGAIN) && result != AVERROR_EOF) fail("encoding failed", result);
   }
@@ -158,7 +167,8 @@ struct VideoWriter::Encoder {
 };
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int32_t width,
-                         int32_t height, double frameRate, const std::string& shownName)
+                         int32_t height, double frameRate, const std::string& shownName,
+                         const AudioClip& audio)
     : encoder_(std::make_unique<Encoder>()) {
   encoder_->path = path;
   encoder_->shownName = shownName.empty() ? path : shownName;
@@ -167,7 +177,7 @@ VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int3
   encoder_->width = width;
   encoder_->height = height;
   if (width <= 0 || height <= 0) encoder_->fail("a video needs a frame of at least 1x1");
-  encoder_->open(container, frameRate);
+  encoder_->open(container, frameRate, audio);
 }
 
 VideoWriter::~VideoWriter() = default;
@@ -177,10 +187,13 @@ void VideoWriter::write(const RgbaImage& picture) {
   if (picture.width != e.width || picture.height != e.height)
     e.fail("a frame of " + std::to_string(picture.width) + "x" + std::to_string(picture.height) +
            " in a video of " + std::to_string(e.width) + "x" + std::to_string(e.height));
-  e.padPicture(picture);
+  // An even-sized picture is converted as it is; only an odd one is padded first.
+  const bool even = e.codec->width == e.width && e.codec->height == e.height;
+  if (!even) e.padPicture(picture);
   int result = av_frame_make_writable(e.frame);
   if (result < 0) e.fail("out of memory", result);
-  const uint8_t* planes[4] = {e.padded.data(), nullptr, nullptr, nullptr};
+  const uint8_t* planes[4] = {even ? picture.pixels.data() : e.padded.data(), nullptr, nullptr,
+                              nullptr};
   int strides[4] = {e.codec->width * 4, 0, 0, 0};
   sws_scale(e.scaler, planes, strides, 0, e.codec->height, e.frame->data, e.frame->linesize);
   e.frame->pts = e.nextPts++;
@@ -191,6 +204,7 @@ void VideoWriter::finish() {
   Encoder& e = *encoder_;
   if (e.finished) return;
   e.encode(nullptr);
+  if (e.audio) e.audio->finish();
   int result = av_write_trailer(e.format);
   e.finished = true;
   if (result < 0) e.fail("cannot complete the file", result);

@@ -6,6 +6,7 @@
 #include <memory>
 #include <string>
 
+#include "refhost/audio_track.h"
 #include "refhost/rgba_image.h"
 
 namespace refhost {
@@ -18,9 +19,9 @@ class VideoWriter {
   // container whatever the path's name. 4:2:0 video needs even sizes: an odd width or height
   // is padded by repeating the last column or row. Throws std::runtime_error naming the file
   // by `shownName` when given (the user's name for a file written under a temporary one), else
-  // by the path.
+  // by the path. With an audio clip, the file carries its sound too (see AudioClip).
   VideoWriter(const std::string& path, VideoContainer container, int32_t width, int32_t height,
-              double frameRate, const std::string& shownName = "");
+              double frameRate, const std::string& shownName = "", const AudioClip& audio = {});
   // Without finish() the file is closed as it is (unplayable); the caller deletes it.
   ~VideoWriter();
   VideoWriter(const VideoWriter&) = delete;

@@ -1,6 +1,8 @@
-// A one-line progress bar on stderr for work of several steps, redrawn in place.
+// A one-line progress bar on stderr for work of several steps, redrawn in place, with the
+// rate so far and the time it leaves to go.
 #pragma once
 
+#include <chrono>
 #include <cstdio>
 #include <string>
 
@@ -18,8 +20,10 @@ class ProgressBar {
   // `done` steps of `total` are complete.
   void update(int done);
 
-  // "label [#####-----]  5/10" for a bar of `width` cells.
-  static std::string line(const std::string& label, int done, int total, int width);
+  // "label [#####-----]  5/10" for a bar of `width` cells; after `seconds` of work (when
+  // positive and something is done) followed by "     2.5 fps      2 s left".
+  static std::string line(const std::string& label, int done, int total, int width,
+                          double seconds = 0);
 
  private:
   std::string label_;
@@ -27,6 +31,8 @@ class ProgressBar {
   std::FILE* out_;
   int shownCells_ = -1;
   bool drawn_ = false;
+  std::chrono::steady_clock::time_point started_ = std::chrono::steady_clock::now();
+  std::chrono::steady_clock::time_point shownAt_ = started_;
 };
 
 }  // namespace veltrane_cli

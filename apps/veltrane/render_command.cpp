@@ -1,12 +1,20 @@
 // `veltrane render`: renders frames of a scene through the plug-in and writes them as a still
 // image, an image sequence or a video.
+#ifdef __linux__
+#include <malloc.h>
+#endif
+
+#include <algorithm>
 #include <cstdio>
 #include <stdexcept>
+#include <thread>
 
 #include "cli_support.h"
 #include "commands.h"
 #include "progress_bar.h"
+#include "refhost/async_frame_sink.h"
 #include "refhost/frame_output.h"
+#include "refhost/frame_pipeline.h"
 #include "scene_file.h"
 #include "scene_session.h"
 #include "stop_signals.h"
@@ -15,7 +23,7 @@ namespace veltrane_cli {
 namespace {
 
 const char kRenderHelp[] =
-    "Usage: veltrane render SCENE.json -o OUT [--frame N | --frames A-B]\n"
+    "Usage: veltrane render SCENE.json -o OUT [--frame N | --frames A-B] [--no-audio]\n"
     "                       [--profile core|compat] [--plugin PATH]\n"
     "\n"
     "Loads the plug-in into the reference host with a headless GL context, sets up the scene\n"
@@ -26,7 +34,9 @@ const char kRenderHelp[] =
     "OUT by its name:\n"
     "  NAME.png, NAME.exr        one frame (frame 0 unless --frame N)\n"
     "  NAME_%04d.png (or .exr)   an image sequence, one file per frame\n"
-    "  NAME.mp4, .mov, .mkv      H.264 video at the scene's rate\n"
+    "  NAME.mp4, .mov, .mkv      H.264 video at the scene's rate; when the effect's own source is\n"
+    "                            a video with sound, it carries the sound of the frames\n"
+    "                            rendered (copied, or as AAC where the container needs it)\n"
     "Files appear under their names only when complete, a sequence's all at once; on any\n"
     "failure, or when stopped by SIGINT, SIGTERM or SIGHUP (exit status 128 + the signal's\n"
     "number), nothing new is left and a file that had the name keeps its contents.\n"
@@ -35,10 +45,30 @@ const char kRenderHelp[] =
     "  -o, --output OUT   where the frames go (required)\n"
     "  --frame N          render only frame N\n"
     "  --frames A-B       render frames A to B (default: every frame of the scene)\n"
+    "  --no-audio         leave the sound out of a video\n"
     "  --profile P        GL profile: core (default) or compat\n"
     "  --plugin PATH      the module to load (default: $VELTRANE_PLUGIN when set, else\n"
     "                     <dir of veltrane>/../lib/veltrane.so)\n"
     "  -h, --help         show this help\n";
+
+// Rendered frames waiting for the writer: enough to ride over a slow frame, few enough to keep
+// memory low (a 1080p frame is 8 MB).
+constexpr std::size_t kQueuedFrames = 4;
+
+// Frames are blocks of megabytes that one thread allocates and another frees, many times a
+// second; glibc hands blocks that large back to the kernel and faults them in anew each time.
+// Kept in the heap instead, they are reused.
+void keepFrameMemory() {
+#ifdef __linux__
+  mallopt(M_MMAP_THRESHOLD, 32 << 20);
+  mallopt(M_TRIM_THRESHOLD, 512 << 20);
+#endif
+}
+
+// Image sequences are written by a worker per core, up to four.
+int imageWriters() {
+  return static_cast<int>(std::clamp(std::thread::hardware_concurrency(), 1u, 4u));
+}
 
 struct FrameRange {
   int32_t first = 0;
@@ -91,6 +121,7 @@ int runRender(const std::vector<std::string>& args) {
                                            {"--output", true},
                                            {"--frame", true},
                                            {"--frames", true},
+                                           {"--no-audio", false},
                                            {"--profile", true},
                                            {"--plugin", true}});
   auto& options = parsed.options;
@@ -108,26 +139,38 @@ int runRender(const std::vector<std::string>& args) {
   std::string module = pluginPath(options);
 
   noteStopSignals();
+  keepFrameMemory();
   Scene scene = loadScene(parsed.positional.front());
   FrameRange frames = chooseFrames(options, target, scene);
   const refhost::Composition& composition = scene.composition;
   // The output is opened first so that a name that cannot be written fails before any render.
   // Until commit() it exists only under a temporary name, deleted if anything below throws.
-  auto sink =
-      refhost::openFrameSink(target, composition.width, composition.height, composition.frameRate);
+  refhost::AudioClip audio;
+  if (!options.count("--no-audio") && composition.source.kind == refhost::MediaSpec::Kind::File &&
+      refhost::isVideoPath(composition.source.path))
+    audio = {composition.source.path, frames.first, frames.count(), composition.frameRate};
+  refhost::AsyncFrameSink sink(refhost::openFrameSink(target, composition.width, composition.height,
+                                                      composition.frameRate, audio),
+                               imageWriters(), kQueuedFrames);
   SceneSession session(scene, module, profile);
   {
     ProgressBar progress("rendering", frames.count());
-    for (int32_t frame = frames.first; frame <= frames.last; ++frame) {
-      throwIfStopped();
-      sink->write(frame, session.render(frame));
-      progress.update(frame - frames.first + 1);
+    try {
+      refhost::renderFrames(
+          session.host(), session.frameSettings(), frames.first, frames.last,
+          [&](refhost::RenderFrame& frame) {
+            throwIfStopped();
+            session.draw(frame);
+          },
+          sink, [&](int32_t done) { progress.update(done); });
+    } catch (const std::bad_alloc&) {
+      throw session.memoryError();
     }
   }
   session.finish();
   throwIfStopped();
-  std::string note = sink->note();
-  std::vector<std::string> written = sink->commit();
+  std::string note = sink.note();
+  std::vector<std::string> written = sink.commit();
   if (!note.empty()) std::fprintf(stderr, "veltrane render: note: %s\n", note.c_str());
   std::string where =
       written.size() == 1 ? written.front() : written.front() + " ... " + written.back();

@@ -79,9 +79,17 @@ refhost::RgbaImage SceneSession::render(int32_t frame) {
 
 std::unique_ptr<refhost::RenderFrame> SceneSession::renderFrame(int32_t frame) {
   auto context = std::make_unique<refhost::RenderFrame>(host(), settings_, frame);
-  plugin_.send(12, &context->context(), nullptr, {1});
-  plugin_.send(10, &context->context(), nullptr, {1});
+  draw(*context);
   return context;
+}
+
+void SceneSession::draw(refhost::RenderFrame& frame) {
+  try {
+    plugin_.send(12, &frame.context(), nullptr, {1});
+    plugin_.send(10, &frame.context(), nullptr, {1});
+  } catch (const std::bad_alloc&) {
+    throw memoryError();
+  }
 }
 
 }  // namespace veltrane_cli

@@ -37,6 +37,8 @@ class SceneSession {
   refhost::RgbaImage render(int32_t frame);
   // The same, keeping the rendered frame's textures for whoever shows them.
   std::unique_ptr<refhost::RenderFrame> renderFrame(int32_t frame);
+  // Messages 12 and 10 with a render context made for the frame; its output stays in GL.
+  void draw(refhost::RenderFrame& frame);
 
   // The error for an allocation that failed while this scene ran: it names the scene file and
   // the frame size, the one thing a user can change about it.

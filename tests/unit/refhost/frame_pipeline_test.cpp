@@ -1,0 +1,114 @@
+// The overlapped render loop and its stages: decoding ahead gives exactly the wrapped source's
+// frames in any order of asking, and a failure in decoding, drawing or writing stops the run
+// with that failure's own message and leaves no file behind.
+#include "refhost/frame_pipeline.h"
+
+#include <GL/glew.h>
+#include <gtest/gtest.h>
+
+#include <filesystem>
+
+#include "refhost/frame_prefetch.h"
+#include "refhost/image_files.h"
+#include "support/gl_host.h"
+#include "support/temp_paths.h"
+
+namespace refhost {
+namespace {
+
+// Frame i at width w is w * 1000 + i in every byte's place; fails at `failAt`.
+class NumberedSource : public MediaSource {
+ public:
+  explicit NumberedSource(int32_t failAt = -1) : failAt_(failAt) {}
+  RgbaImage frame(int32_t index, int32_t width, int32_t height) override {
+    if (index == failAt_)
+      throw std::runtime_error("clip.mp4: cannot decode video: frame " + std::to_string(index));
+    return RgbaImage(width, height,
+                     {static_cast<uint8_t>(index), static_cast<uint8_t>(width), 0, 1});
+  }
+
+ private:
+  int32_t failAt_;
+};
+
+TEST(PrefetchingSource, GivesTheWrappedSourcesFramesWhateverTheOrder) {
+  NumberedSource direct(7);
+  PrefetchingSource ahead(std::make_shared<NumberedSource>(7), 3);
+  const int32_t requests[][2] = {{0, 4}, {1, 4},  {2, 4},  {2, 4}, {1, 4}, {5, 4},
+                                 {6, 4}, {12, 4}, {13, 2}, {3, 2}, {6, 2}, {8, 2}};
+  for (const auto& r : requests)
+    EXPECT_EQ(ahead.glRows(r[0], r[1], 2), direct.glRows(r[0], r[1], 2)) << r[0] << " " << r[1];
+  // The worker has met the failing frame by now; it surfaces when asked for, and again.
+  for (int attempt = 0; attempt < 2; ++attempt)
+    EXPECT_THROW(ahead.glRows(7, 2, 2), std::runtime_error);
+  EXPECT_EQ(ahead.glRows(8, 2, 2), direct.glRows(8, 2, 2));
+}
+
+// Passes frames on to a real sink, failing at one.
+class FailingSink : public FrameSink {
+ public:
+  FailingSink(std::unique_ptr<FrameSink> inner, int32_t failAt)
+      : inner_(std::move(inner)), failAt_(failAt) {}
+  void write(int32_t frame, const RgbaImage& picture) override {
+    if (frame == failAt_) throw std::runtime_error("out_0005.png: cannot write image: disk full");
+    inner_->write(frame, picture);
+  }
+  std::vector<std::string> commit() override { return inner_->commit(); }
+  bool concurrentWrites() const override { return inner_->concurrentWrites(); }
+
+ private:
+  std::unique_ptr<FrameSink> inner_;
+  int32_t failAt_;
+};
+
+using FramePipeline = testsupport::GlHostTest;
+
+TEST_F(FramePipeline, AFailureInAnyStageStopsTheRunWithItsMessageAndLeavesNothing) {
+  enum class Stage { None, Decoding, Drawing, Writing };
+  const FrameSettings settings{32, 18, 25.0, 1.0f, 12, ""};
+  for (Stage stage : {Stage::None, Stage::Decoding, Stage::Drawing, Stage::Writing}) {
+    const std::string folder = testsupport::makeTempDirectory("pipeline");
+    host().setSourceFrames(frameSourceOf(std::make_shared<PrefetchingSource>(
+        std::make_shared<NumberedSource>(stage == Stage::Decoding ? 5 : -1), 3)));
+    auto sequence = openFrameSink(parseOutputTarget(folder + "/out_%04d.png"), 32, 18, 25.0);
+    auto sink = std::make_unique<AsyncFrameSink>(
+        std::make_unique<FailingSink>(std::move(sequence), stage == Stage::Writing ? 5 : -1), 2, 3);
+    std::vector<int32_t> written;
+    auto draw = [&](RenderFrame& frame) {
+      if (stage == Stage::Drawing && frame.context().time == 5)
+        throw std::runtime_error("message 10 answered 5, expected 1");
+      const WispRenderContext& c = frame.context();
+      glCopyImageSubData(c.source.id, GL_TEXTURE_2D, 0, 0, 0, 0, c.output.id, GL_TEXTURE_2D, 0, 0,
+                         0, 0, 32, 18, 1);
+    };
+    std::string error;
+    try {
+      renderFrames(host(), settings, 0, 11, draw, *sink, [&](int32_t n) { written.push_back(n); });
+      std::vector<std::string> names = sink->commit();
+      ASSERT_EQ(names.size(), 12u);
+      for (int32_t frame = 0; frame < 12; ++frame) {
+        RgbaImage picture = readImageFile(names[static_cast<std::size_t>(frame)]);
+        EXPECT_EQ(picture.pixel(31, 0), (Rgba8{static_cast<uint8_t>(frame), 32, 0, 1})) << frame;
+      }
+    } catch (const std::runtime_error& failure) {
+      error = failure.what();
+    }
+    const char* expected[] = {"", "clip.mp4: cannot decode video: frame 5",
+                              "message 10 answered 5, expected 1",
+                              "out_0005.png: cannot write image: disk full"};
+    EXPECT_EQ(error, expected[static_cast<int>(stage)]);
+    if (stage == Stage::None) {
+      EXPECT_EQ(written.size(), 12u);
+      EXPECT_EQ(written.back(), 12);
+      // Three textures a frame, two frames in flight: the pool stops growing after the start.
+      EXPECT_LE(host().texturePool().created(), 9u);
+    } else {
+      sink.reset();  // as the command line's unwinding does
+      EXPECT_TRUE(std::filesystem::is_empty(folder)) << expected[static_cast<int>(stage)];
+    }
+    std::filesystem::remove_all(folder);
+  }
+}
+
+}  // namespace
+}  // namespace refhost
