@@ -16,11 +16,6 @@ const Rgba kClear{0, 0, 0, 0};
 const std::string kLayerGreen = "22222222-0000-4000-8000-000000000002";
 const std::string kLayerBlue = "33333333-0000-4000-8000-000000000003";
 
-void setLocalCut(refhost::Host& host, int index, float x, float y, float degrees) {
-  host.setValue("cutPosition_" + std::to_string(index), ParamValue::ofPoint(x, y));
-  host.setValue("cutDirection_" + std::to_string(index), ParamValue::ofFloat(degrees));
-}
-
 TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();
@@ -33,8 +28,8 @@ TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
   // Cut 1 vertical at x = 0 (left half becomes input 1), cut 2 horizontal at y = 0 splitting
   // the left half (direction +x: its left side, y > 0, becomes input 2).
   host.setValue("numberOfCuts", ParamValue::ofInt(2));
-  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);
-  setLocalCut(host, 1, -16.0f, 0.0f, 90.0f);
+  setCut(host, 0, 0.0f, 0.0f, 0.0f);
+  setCut(host, 1, -16.0f, 0.0f, 90.0f);
   std::vector<uint8_t> pixels = fixture.render(kRed);
   EXPECT_EQ(fixture.pixel(pixels, 8, 30), kBlue);  // left, top
   EXPECT_EQ(fixture.pixel(pixels, 8, 4), kGreen);  // left, bottom
@@ -45,7 +40,7 @@ TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
   // by the cut at its end in the direction of increasing angle.
   host.setValue("cutType", ParamValue::ofInt(1));
   host.setValue("numberOfCuts", ParamValue::ofInt(4));
-  for (int i = 0; i < 4; ++i) setLocalCut(host, i, 0.0f, 0.0f, 90.0f * static_cast<float>(i));
+  for (int i = 0; i < 4; ++i) setCut(host, i, 0.0f, 0.0f, 90.0f * static_cast<float>(i));
   fixture.addSolidLayer("44444444-0000-4000-8000-000000000004", {255, 255, 0, 255});
   host.setValue("inputLayer3", ParamValue::ofLayer("44444444-0000-4000-8000-000000000004"));
   host.setValue("inputLayer4", ParamValue::ofLayer(kLayerGreen));
@@ -64,7 +59,7 @@ TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
 TEST(FrameRender, BorderCoverageFollowsTheDistanceToTheCut) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();
-  setLocalCut(host, 0, 0.5f, 0.0f, 0.0f);  // x = 0.5: pixel centres at whole distances from it
+  setCut(host, 0, 0.5f, 0.0f, 0.0f);  // x = 0.5: pixel centres at whole distances from it
   host.setValue("borderColor", ParamValue::ofColor(1.0f, 0.0f, 0.0f));
   const Rgba picture{100, 100, 100, 255};
   const struct { float width, alpha; } borders[] = {{6, 1}, {6, 0.5f}, {1, 1}, {0, 1}};
@@ -92,7 +87,7 @@ TEST(FrameRender, ViewCutRegionsTintsARampOfGreys) {
   refhost::Host& host = fixture.host();
   host.setValue("viewCutRegions", ParamValue::ofInt(1));
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
-  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);
+  setCut(host, 0, 0.0f, 0.0f, 0.0f);
   const std::vector<uint8_t> pixels = fixture.render({255, 255, 255, 255});
   // Region 0 (right) is drawn first at 1/2, region 1 (left) at 2/2.
   EXPECT_NEAR(fixture.pixel(pixels, 50, 18)[0], 128, 1);
@@ -103,7 +98,7 @@ TEST(FrameRender, ShiftedInputsShowTheirFrameOrTransparentBlack) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
-  setLocalCut(host, 0, 0.0f, 0.0f, 0.0f);
+  setCut(host, 0, 0.0f, 0.0f, 0.0f);
   const refhost::FrameSource counter = [](int32_t frame, int32_t width, int32_t height) {
     return solidSource({static_cast<uint8_t>(frame), 0, 0, 255})(frame, width, height);
   };
@@ -122,7 +117,7 @@ TEST(FrameRender, InputPlacementMovesAndScalesThePicture) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
-  setLocalCut(host, 0, -31.0f, 0.0f, 0.0f);  // nearly the whole frame is input 0
+  setCut(host, 0, -31.0f, 0.0f, 0.0f);  // nearly the whole frame is input 0
   host.setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
   host.setValue("inputFrameTranslation0", ParamValue::ofPoint(16.0f, 0.0f));
   const std::vector<uint8_t> pixels = fixture.render(kRed);
@@ -141,7 +136,7 @@ TEST(FrameRender, InputRotationTurnsThePictureAboutItsCentre) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
-  setLocalCut(host, 0, -31.0f, 0.0f, 0.0f);
+  setCut(host, 0, -31.0f, 0.0f, 0.0f);
   host.setValue("inputFrameRotation0", ParamValue::ofFloat(90.0f));
   const refhost::FrameSource halves = [](int32_t, int32_t width, int32_t height) {
     std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
@@ -165,9 +160,9 @@ TEST(FrameRender, CoreAndCompatibilityProfilesDrawTheSameImage) {
     RenderFixture fixture(profile);
     refhost::Host& host = fixture.host();
     host.setValue("numberOfCuts", ParamValue::ofInt(3));
-    setLocalCut(host, 0, 3.0f, -2.0f, 20.0f);
-    setLocalCut(host, 1, -10.0f, 5.0f, 100.0f);
-    setLocalCut(host, 2, 12.0f, 8.0f, -60.0f);
+    setCut(host, 0, 3.0f, -2.0f, 20.0f);
+    setCut(host, 1, -10.0f, 5.0f, 100.0f);
+    setCut(host, 2, 12.0f, 8.0f, -60.0f);
     host.setValue("borderWidth", ParamValue::ofFloat(5.0f));
     host.setValue("borderColor", ParamValue::ofColor(0.2f, 0.9f, 0.4f));
     return fixture.render({200, 30, 90, 255});

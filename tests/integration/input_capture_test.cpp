@@ -15,8 +15,7 @@ const std::string kLayer = "22222222-0000-4000-8000-000000000002";
 
 // One vertical cut through the centre: input 1 on the left, input 0 on the right.
 void splitDownTheMiddle(refhost::Host& host) {
-  host.setValue("cutPosition_0", ParamValue::ofPoint(0.0f, 0.0f));
-  host.setValue("cutDirection_0", ParamValue::ofFloat(0.0f));
+  setCut(host, 0, 0.0f, 0.0f, 0.0f);
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
 }
 

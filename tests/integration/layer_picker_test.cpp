@@ -20,8 +20,7 @@ class LayerPicker : public LoadedPlugin {
  protected:
   // Selects input 1 (left of a vertical cut) and leaves the pointer over it.
   void selectInputOne() {
-    host().setValue("cutPosition_0", ParamValue::ofPoint(0.0f, 0.0f));
-    host().setValue("cutDirection_0", ParamValue::ofFloat(0.0f));
+    setCut(host(), 0, 0.0f, 0.0f, 0.0f);
     ViewerEvents viewer(host(), 160, 90);
     viewer.press(20, 45);
     viewer.release(20, 45);

@@ -10,6 +10,12 @@
 #include "refhost/host.h"
 #include "refhost/module.h"
 
+// Cut i through the frame-space point (x, y), its direction in degrees (0 along +y).
+inline void setCut(refhost::Host& host, int i, float x, float y, float degrees) {
+  host.setValue("cutPosition_" + std::to_string(i), refhost::ParamValue::ofPoint(x, y));
+  host.setValue("cutDirection_" + std::to_string(i), refhost::ParamValue::ofFloat(degrees));
+}
+
 class LoadedPlugin : public ::testing::Test {
  protected:
   void SetUp() override {

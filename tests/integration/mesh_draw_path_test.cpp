@@ -44,8 +44,7 @@ TEST(MeshDrawPath, RestartFollowsTheExtensionListAndTheChip) {
     refhost::ScopedGlOverrides overrides(row.overrides);
     RenderFixture fixture(row.profile);
     refhost::Host& host = fixture.host();
-    host.setValue("cutPosition_0", ParamValue::ofPoint(3.0f, -4.0f));
-    host.setValue("cutDirection_0", ParamValue::ofFloat(30.0f));
+    setCut(host, 0, 3.0f, -4.0f, 30.0f);
     host.setValue("borderWidth", ParamValue::ofFloat(5.0f));
     host.setValue("borderColor", ParamValue::ofColor(1.0f, 1.0f, 1.0f));
     host.clearCallLog();

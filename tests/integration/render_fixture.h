@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "loaded_plugin.h"
 #include "refhost/host.h"
 #include "refhost/module.h"
 #include "refhost/render_frame.h"

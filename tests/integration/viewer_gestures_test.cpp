@@ -27,10 +27,7 @@ class ViewerGestures : public LoadedPlugin {
   ViewerEvents& viewer() { return *viewer_; }
 
   std::array<float, 3> number(const std::string& id) { return host().valueAt(id, 0).number; }
-  void setCut(int i, float x, float y, float degrees) {
-    host().setValue("cutPosition_" + std::to_string(i), ParamValue::ofPoint(x, y));
-    host().setValue("cutDirection_" + std::to_string(i), ParamValue::ofFloat(degrees));
-  }
+  void setCut(int i, float x, float y, float degrees) { ::setCut(host(), i, x, y, degrees); }
   void setRadial(int cuts) {
     host().setValue("cutType", ParamValue::ofInt(1));
     host().setValue("numberOfCuts", ParamValue::ofInt(cuts));
