@@ -129,32 +129,6 @@ TEST(FrameRender, InputPlacementMovesAndScalesThePicture) {
     EXPECT_EQ(fixture.pixel(pixels, x, y), kClear) << x << "," << y;
 }
 
-// Rotation 90 turns the picture's +y axis onto +x: a picture red on its left half and green on
-// its right shows green below the centre and red above, turned as a true rotation of the
-// 64 x 36 picture (36 wide once turned, so x < 14 stays transparent).
-TEST(FrameRender, InputRotationTurnsThePictureAboutItsCentre) {
-  RenderFixture fixture;
-  refhost::Host& host = fixture.host();
-  host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
-  setCut(host, 0, -31.0f, 0.0f, 0.0f);
-  host.setValue("inputFrameRotation0", ParamValue::ofFloat(90.0f));
-  const refhost::FrameSource halves = [](int32_t, int32_t width, int32_t height) {
-    std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
-    for (int32_t y = 0; y < height; ++y)
-      for (int32_t x = 0; x < width; ++x) {
-        const Rgba colour = x < width / 2 ? kRed : kGreen;
-        std::copy(colour.begin(), colour.end(),
-                  pixels.begin() + (static_cast<ptrdiff_t>(y) * width + x) * 4);
-      }
-    return pixels;
-  };
-  const std::vector<uint8_t> pixels = fixture.render(kRed, 10, halves);
-  EXPECT_EQ(fixture.pixel(pixels, 32, 5), kGreen);
-  EXPECT_EQ(fixture.pixel(pixels, 32, 30), kRed);
-  EXPECT_EQ(fixture.pixel(pixels, 8, 18), kClear);
-  EXPECT_EQ(fixture.pixel(pixels, 56, 18), kClear);
-}
-
 TEST(FrameRender, CoreAndCompatibilityProfilesDrawTheSameImage) {
   auto renderWith = [](refhost::GlProfile profile) {
     RenderFixture fixture(profile);

@@ -52,8 +52,7 @@ TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
   const struct {
     float degrees;
     int cursor;
-  } cases[] = {{0, 10},   {20, 10},  {25, 11},  {90, 12},  {135, 13}, {180, 14},  {225, 15},
-               {270, 16}, {315, 17}, {340, 10}, {-90, 16}, {450, 12}, {-675, 11}, {3600 + 240, 15}};
+  } cases[] = {{0, 10}, {135, 13}, {315, 17}, {-90, 16}, {-675, 11}, {3600 + 240, 15}};
   for (const auto& c : cases) {
     refhost::Host host;
     AngleParam param{c.degrees * kDegree, {}};
