@@ -3,8 +3,8 @@
 
 #include <cmath>
 #include <filesystem>
-#include <fstream>
 #include <ostream>
+#include <sstream>
 #include <stdexcept>
 
 #include "refhost/staged_file.h"
@@ -90,15 +90,12 @@ nlohmann::ordered_json savedScene(const nlohmann::ordered_json& original,
 }
 
 void writeScene(const std::string& path, const nlohmann::ordered_json& document) {
-  refhost::StagedFile file(path);
-  {
-    std::ofstream out(file.temporaryPath());
-    writeJson(out, document, 0, 0);
-    out << "\n";
-    out.flush();
-    if (!out) throw std::runtime_error(path + ": cannot be written");
-  }
-  file.commit();
+  std::ostringstream text;
+  writeJson(text, document, 0, 0);
+  text << "\n";
+  // Every write, the flush and the close are checked, and the old scene stays until the new one
+  // is complete.
+  refhost::writeFileAtomically(path, text.str());
 }
 
 }  // namespace veltrane_viewer
