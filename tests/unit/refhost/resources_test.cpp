@@ -145,7 +145,7 @@ TEST_F(HostResources, FramesCarryTheirIndexAndAreTheHosts) {
 }
 
 // The layer states and timing the module reads show in its renders and its layer menu; here
-// what it leaves alone: names cut to the buffer, the second matrix, and failures on request.
+// what they leave alone: names cut to the buffer, the second matrix, and failures on request.
 TEST_F(HostResources, LayerQueriesBoundNamesAndFailOnRequest) {
   Layer camera;
   camera.guid = kClip;
@@ -155,7 +155,6 @@ TEST_F(HostResources, LayerQueriesBoundNamesAndFailOnRequest) {
   char guid[40] = {}, name[5] = {};
   int32_t kind = -1;
   api()->GetLayerInfo(handle(), 0, guid, name, sizeof name, &kind);
-  EXPECT_STREQ(guid, kClip);
   EXPECT_STREQ(name, "Came");  // bounded by the buffer size, terminated
   LayerState state;
   std::memset(&state, 0xAB, sizeof state);
@@ -163,14 +162,10 @@ TEST_F(HostResources, LayerQueriesBoundNamesAndFailOnRequest) {
   EXPECT_EQ(state.type, 4u);
   EXPECT_EQ(state.secondMatrix[15], 1.0f);
 
-  WispTimeInfo time{};
-  host().setTimeInfo(320, 180, 30.0);
-  ASSERT_EQ(api()->GetTimeInfo(handle(), &time), 0);
-  EXPECT_EQ(time.width, 320);
-  EXPECT_EQ(time.frameRate, 30.0);
   host().setFailLayerQueries(true);
   host().setFailTimeInfo(true);
   EXPECT_NE(api()->QueryLayerState(handle(), kClip, 4000, &state), 0);
+  WispTimeInfo time{};
   EXPECT_NE(api()->GetTimeInfo(handle(), &time), 0);
 }
 
