@@ -208,9 +208,9 @@ TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   EXPECT_EQ(host.problems(), std::vector<std::string>{"EndUndo without BeginUndo"});
 }
 
-// Cursors, redraws and frame requests are checked through the controls and the module; here
-// the popup answers and the host's names as configured.
-TEST(HostViewerRecords, AnswersPopupsAndNamesItselfAsConfigured) {
+// Cursors, redraws and the frame requests themselves are checked through the controls and the
+// module; here the popup answers, a layer request's log line and the host's names.
+TEST(HostViewerRecords, RecordsRequestsAndAnswersAsConfigured) {
   Host host;
   tagWispAPI& api = host.api();
   WispHost* h = host.handle();
@@ -218,6 +218,10 @@ TEST(HostViewerRecords, AnswersPopupsAndNamesItselfAsConfigured) {
   EXPECT_EQ(api.ShowPopupMenu(h, "A|B|C"), 2);
   EXPECT_EQ(api.ShowPopupMenu(h, ""), -1);  // no answer left: dismissed
   EXPECT_EQ(host.popupMenus(), (std::vector<std::string>{"A|B|C", ""}));
+  const uint32_t frames[] = {12, 12};
+  api.RequestLayerFrames(h, kLayerA, 2, frames);
+  EXPECT_EQ(host.callsTo("RequestLayerFrames"),
+            std::vector<std::string>{std::string("RequestLayerFrames ") + kLayerA + " 2 12 12"});
 
   EXPECT_EQ(toUtf8(api.GetHostIdentifier(h)), "org.veltrane.refhost");
   host.setHostId(6001);

@@ -85,7 +85,7 @@ TEST_F(HostResources, GivenBackTexturesAreReusedBySizeAndFormatWithFreshSampling
 }
 
 // What buffers hold and how they are bound shows in every draw of the module; here the one
-// vertex array and the count.
+// vertex array, the log line and the count.
 TEST_F(HostResources, BuffersAreCountedUnderOneVertexArray) {
   const uint32_t vertexArray = api()->CreateVertexArray(handle());
   EXPECT_NE(vertexArray, 0u);
@@ -97,6 +97,7 @@ TEST_F(HostResources, BuffersAreCountedUnderOneVertexArray) {
   const uint32_t indices = api()->AcquireBuffer(handle(), GL_ELEMENT_ARRAY_BUFFER, 12, nullptr,
                                                 GL_DYNAMIC_DRAW, nullptr);
   EXPECT_NE(buffer, 0u);
+  EXPECT_EQ(host().callsTo("AcquireBuffer")[0], "AcquireBuffer 0x8892 32 null 0x88E8");
   EXPECT_EQ(host().outstandingBuffers(), 2);
   api()->ReleaseBuffer(handle(), buffer);
   api()->ReleaseBuffer(handle(), indices);
