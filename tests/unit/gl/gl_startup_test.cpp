@@ -1,17 +1,14 @@
-// GL start-up builds the thirteen programs at fixed indices on Mesa, and every GLSL source of
-// the project is valid GLSL 4.10 for the reference compiler as well.
+// GL start-up builds the thirteen programs at fixed indices on Mesa, and every stage of them is
+// valid GLSL 4.10 for the reference compiler as well.
 #include "render/gl_startup.h"
 
 #include <gtest/gtest.h>
 #include <sys/wait.h>
-#include <unistd.h>
 
 #include <cstdio>
 #include <fstream>
 #include <string>
 
-#include "shaders/control_shaders.h"
-#include "shaders/effect_shaders.h"
 #include "support/gl_host.h"
 #include "support/temp_paths.h"
 
@@ -20,32 +17,25 @@ namespace {
 using GlStartup = testsupport::GlHostTest;
 
 TEST_F(GlStartup, BuildsTheProgramsInTheirFixedOrderAndOnlyTheHelpersOnce) {
-  const char* const order[] = {"splitScreen",
-                               "combineBorder",
-                               "distanceField",
-                               "layerAlignment",
-                               "glClear",
-                               "glCopy",
-                               "SplitScreenCutPositionControl",
-                               "SplitScreenCutMoveHandle",
-                               "RotationControl",
-                               "MoveHandle",
-                               "CutHandle",
-                               "AAQuadControl",
-                               "DirectionScaleControl"};
   testing::internal::CaptureStdout();
   buildPrograms();
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "") << "silent unless verbose";
   ASSERT_EQ(registry_->programCount(), 13);
+  std::string order;  // the names by index
   for (int index = 0; index < 13; ++index) {
-    EXPECT_EQ(registry_->programIndex(order[index]), index) << order[index];
-    EXPECT_TRUE(registry_->program(index).linked) << order[index];
+    for (const veltrane::ProgramName& name : registry_->programNames())
+      if (name.index == index) order += name.name + " ";
+    EXPECT_TRUE(registry_->program(index).linked) << index;
   }
+  EXPECT_EQ(order,
+            "splitScreen combineBorder distanceField layerAlignment glClear glCopy "
+            "SplitScreenCutPositionControl SplitScreenCutMoveHandle RotationControl MoveHandle "
+            "CutHandle AAQuadControl DirectionScaleControl ");
   EXPECT_EQ(glGetAttribLocation(registry_->program(2).id, "vertexPosition"), 0);
 
   // A second start-up, verbose: the banner, no logs (Mesa has nothing to say about these
   // sources), every program but the two helpers again, the new ones found first by name.
-  api()->verbose = 1;
+  host().setVerbose(true);
   const int32_t clearId = registry_->programId("glClear");
   testing::internal::CaptureStdout();
   EXPECT_EQ(veltrane::prepareGl(handle(), api()), 1);
@@ -68,38 +58,31 @@ int validate(const std::string& path, std::string* output) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
 
-TEST(ShaderSources, EveryStageIsValidGlsl410ForTheReferenceCompiler) {
-  namespace s = veltrane::shaders;
-  const struct {
-    const char* name;
-    const char* stage;  // the validator takes the stage from the file suffix
-    const std::string& text;
-  } sources[] = {
-      {"texturedVertex", "vert", s::kTexturedVertex},
-      {"distanceVertex", "vert", s::kDistanceVertex},
-      {"solidVertex", "vert", s::kSolidVertex},
-      {"layerAlignmentVertex", "vert", s::kLayerAlignmentVertex},
-      {"splitScreenFragment", "frag", s::kSplitScreenFragment},
-      {"combineBorderFragment", "frag", s::kCombineBorderFragment},
-      {"distanceFragment", "frag", s::kDistanceFragment},
-      {"solidFragment", "frag", s::kSolidFragment},
-      {"copyFragment", "frag", s::kCopyFragment},
-      {"rotationHandleFragment", "frag", s::kRotationHandleFragment},
-      {"doubleArrowFragment", "frag", s::kDoubleArrowFragment},
-      {"quadEdgesFragment", "frag", s::kQuadEdgesFragment},
-      {"cutMarkerFragment", "frag", s::kCutMarkerFragment},
-      {"moveMarkerFragment", "frag", s::kMoveMarkerFragment},
-  };
-  const std::string directory = testsupport::makeTempDirectory("veltrane_glsl_");
-  for (const auto& source : sources) {
-    EXPECT_EQ(source.text.rfind("#version 410\n", 0), 0u) << source.name;
-    const std::string path = std::string(directory) + "/" + source.name + "." + source.stage;
-    std::ofstream(path) << source.text;
-    std::string output;
-    EXPECT_EQ(validate(path, &output), 0) << source.name << ":\n" << output << source.text;
-    std::remove(path.c_str());
+// The stages are read back from the built programs, so that none is left out.
+TEST_F(GlStartup, EveryStageIsValidGlsl410ForTheReferenceCompiler) {
+  buildPrograms();
+  testsupport::ScratchDirectory folder;
+  for (int index = 0; index < registry_->programCount(); ++index) {
+    GLuint stages[3] = {};
+    GLsizei count = 0;
+    glGetAttachedShaders(registry_->program(index).id, 3, &count, stages);
+    EXPECT_EQ(count, 2) << index;
+    for (GLsizei k = 0; k < count; ++k) {
+      GLint type = 0, length = 0;
+      glGetShaderiv(stages[k], GL_SHADER_TYPE, &type);
+      glGetShaderiv(stages[k], GL_SHADER_SOURCE_LENGTH, &length);
+      std::string text(static_cast<size_t>(length), '\0');
+      glGetShaderSource(stages[k], length, nullptr, text.data());
+      text.pop_back();  // the terminator
+      EXPECT_EQ(text.rfind("#version 410\n", 0), 0u) << index;
+      // The validator takes the stage from the file suffix.
+      const std::string path = folder.file(std::to_string(index) + "_" + std::to_string(k) +
+                                           (type == GL_VERTEX_SHADER ? ".vert" : ".frag"));
+      std::ofstream(path) << text;
+      std::string output;
+      EXPECT_EQ(validate(path, &output), 0) << path << ":\n" << output << text;
+    }
   }
-  rmdir(directory.c_str());
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
-// The program registry on Mesa: build, link, failures and their printed logs, name order,
-// uniform lookup and setting, attribute binding and deletion.
+// The program registry on Mesa: build, link, failures and their printed logs, name order and
+// deletion, uniform lookup and setting, attribute binding.
 #include <gtest/gtest.h>
 
 #include <string>
@@ -47,75 +47,83 @@ std::string compileLog(GLenum type, const std::string& source) {
 
 using ProgramRegistry = testsupport::GlHostTest;
 
-TEST_F(ProgramRegistry, WarningsArePrintedOnceAndOnlyWhenVerbose) {
-  const std::string vertexLog = compileLog(GL_VERTEX_SHADER, kWarningVertex);
-  ASSERT_NE(vertexLog.find("warning"), std::string::npos) << vertexLog;
-  for (bool verbose : {true, false}) {
+// A build prints the compile logs only when verbose, each once: a warning alone, or every log up
+// to a failed compile, which throws type 0 and leaves the registry as it was. A failed link
+// throws type 1 after the unlinked program was added with its log.
+TEST_F(ProgramRegistry, BuildsPrintLogsWhenVerboseAndThrowTheFailuresType) {
+  const std::string warning = compileLog(GL_VERTEX_SHADER, kWarningVertex);
+  const std::string broken = compileLog(GL_FRAGMENT_SHADER, kBrokenFragment);
+  ASSERT_NE(warning.find("warning"), std::string::npos) << warning;
+  using namespace Plugin::gl;
+  const struct {
+    const std::string &vertex, &fragment;
+    bool verbose;
+    std::string printed;
+    int type;  // of the failure thrown; -1 for none
+    const char* error;
+  } cases[] = {
+      {kWarningVertex, kFragment, true, warning, -1, ""},
+      {kWarningVertex, kFragment, false, "", -1, ""},
+      {kWarningVertex, kBrokenFragment, true, warning + "\n" + broken, GLSLErrorType_ShaderCompile,
+       "GLSLErrorType_ShaderCompile - The Shader failed to compile."},
+      {kVertex, kUnresolvedFragment, false, "", GLSLErrorType_ShaderLink,
+       "GLSLErrorType_ShaderLink - The shader program failed to link."},
+  };
+  for (const auto& c : cases) {
     EffectData registry;
+    registry.addProgram(kVertex, kFragment, false, "kept", true, true);
     testing::internal::CaptureStdout();
-    EXPECT_EQ(registry.addProgram(kWarningVertex, kFragment, verbose, "warned", true, true), 1);
-    EXPECT_EQ(testing::internal::GetCapturedStdout(), verbose ? vertexLog : "");
-    EXPECT_TRUE(registry.program(0).linked);
+    int type = -1;
+    std::string error;
+    try {
+      EXPECT_EQ(registry.addProgram(c.vertex, c.fragment, c.verbose, "added", true, true), 1);
+    } catch (const FXGLSLexception& e) {
+      type = e.type();
+      error = e.what();
+    }
+    EXPECT_EQ(testing::internal::GetCapturedStdout(), c.printed) << c.error;
+    EXPECT_EQ(type, c.type);
+    EXPECT_EQ(error, c.error);
+    // Only a failed compile adds nothing; a failed link adds its program with the log.
+    const int count = c.type == GLSLErrorType_ShaderCompile ? 1 : 2;
+    ASSERT_EQ(registry.programCount(), count) << c.error;
+    EXPECT_EQ(registry.programNames().size(), static_cast<size_t>(count));
+    const bool linked = c.type != GLSLErrorType_ShaderLink;
+    EXPECT_EQ(registry.program(count - 1).linked, linked);
+    EXPECT_EQ(registry.program(count - 1).log.empty(), linked);
+    EXPECT_FALSE(registry.linkProgram("no such program", false));
   }
+  forgetCompileErrors(broken);
 }
 
-TEST_F(ProgramRegistry, CompileFailureThrowsTypeZeroAndLeavesTheRegistryAsItWas) {
-  EffectData registry;
-  registry.addProgram(kVertex, kFragment, false, "kept", true, true);
-  const std::string fragmentLog = compileLog(GL_FRAGMENT_SHADER, kBrokenFragment);
-  testing::internal::CaptureStdout();
-  try {
-    registry.addProgram(kWarningVertex, kBrokenFragment, true, "broken", true, true);
-    ADD_FAILURE() << "no exception";
-  } catch (const Plugin::gl::FXGLSLexception& e) {
-    EXPECT_EQ(e.type(), Plugin::gl::GLSLErrorType_ShaderCompile);
-    EXPECT_STREQ(e.what(), "GLSLErrorType_ShaderCompile - The Shader failed to compile.");
-  }
-  EXPECT_EQ(testing::internal::GetCapturedStdout(),
-            compileLog(GL_VERTEX_SHADER, kWarningVertex) + "\n" + fragmentLog);
-  forgetCompileErrors(fragmentLog);
-  EXPECT_EQ(registry.programCount(), 1);
-  EXPECT_EQ(registry.programNames().size(), 1u);
-}
+TEST_F(ProgramRegistry, NamesAreKeptInByteOrderLookedUpAndDeletedWithTheRegistry) {
+  std::vector<GLuint> ids;
+  {
+    EffectData registry;
+    for (const char* name : {"b", "a", "B", "ab"}) {
+      registry.addProgram(kVertex, kFragment, false, name, true, true);
+    }
+    for (int index = 0; index < 4; ++index) ids.push_back(registry.program(index).id);
+    const std::vector<std::pair<std::string, int>> expected = {
+        {"B", 2}, {"a", 1}, {"ab", 3}, {"b", 0}};
+    ASSERT_EQ(registry.programNames().size(), expected.size());
+    for (size_t i = 0; i < expected.size(); ++i) {
+      EXPECT_EQ(registry.programNames()[i].name, expected[i].first);
+      EXPECT_EQ(registry.programNames()[i].index, expected[i].second);
+      EXPECT_EQ(registry.programId(expected[i].first),
+                static_cast<int32_t>(registry.program(expected[i].second).id));
+    }
+    EXPECT_EQ(registry.programId("c"), -1);
 
-TEST_F(ProgramRegistry, LinkFailureThrowsTypeOneAfterTheProgramWasAdded) {
-  EffectData registry;
-  try {
-    registry.addProgram(kVertex, kUnresolvedFragment, false, "unlinked", true, true);
-    ADD_FAILURE() << "no exception";
-  } catch (const Plugin::gl::FXGLSLexception& e) {
-    EXPECT_EQ(e.type(), Plugin::gl::GLSLErrorType_ShaderLink);
-    EXPECT_STREQ(e.what(), "GLSLErrorType_ShaderLink - The shader program failed to link.");
+    EXPECT_EQ(registry.currentProgramIndex(), -1);
+    registry.useProgram("a");
+    registry.useProgram("c");
+    registry.useProgramAt(4);
+    EXPECT_EQ(registry.currentProgramIndex(), 1) << "unknown names and indices change nothing";
+    registry.releaseProgram();
+    EXPECT_EQ(registry.currentProgramIndex(), -1);
   }
-  ASSERT_EQ(registry.programCount(), 1);
-  EXPECT_FALSE(registry.program(0).linked);
-  EXPECT_FALSE(registry.program(0).log.empty());
-  EXPECT_FALSE(registry.linkProgram("no such program", false));
-}
-
-TEST_F(ProgramRegistry, NamesAreKeptInByteOrderAndLookedUp) {
-  EffectData registry;
-  for (const char* name : {"b", "a", "B", "ab"}) {
-    registry.addProgram(kVertex, kFragment, false, name, true, true);
-  }
-  const std::vector<std::pair<std::string, int>> expected = {
-      {"B", 2}, {"a", 1}, {"ab", 3}, {"b", 0}};
-  ASSERT_EQ(registry.programNames().size(), expected.size());
-  for (size_t i = 0; i < expected.size(); ++i) {
-    EXPECT_EQ(registry.programNames()[i].name, expected[i].first);
-    EXPECT_EQ(registry.programNames()[i].index, expected[i].second);
-    EXPECT_EQ(registry.programId(expected[i].first),
-              static_cast<int32_t>(registry.program(expected[i].second).id));
-  }
-  EXPECT_EQ(registry.programId("c"), -1);
-
-  EXPECT_EQ(registry.currentProgramIndex(), -1);
-  registry.useProgram("a");
-  registry.useProgram("c");
-  registry.useProgramAt(4);
-  EXPECT_EQ(registry.currentProgramIndex(), 1) << "unknown names and indices change nothing";
-  registry.releaseProgram();
-  EXPECT_EQ(registry.currentProgramIndex(), -1);
+  for (GLuint id : ids) EXPECT_FALSE(glIsProgram(id)) << id;
 }
 
 TEST_F(ProgramRegistry, UniformsOfAnUnregisteredProgramAreLookedUpInProgramZero) {
@@ -230,17 +238,6 @@ TEST_F(ProgramRegistry, AttributeLocationsFollowTheBuildOperation) {
       }
     }
   }
-}
-
-TEST_F(ProgramRegistry, DestructionDeletesEveryProgram) {
-  std::vector<GLuint> ids;
-  {
-    EffectData registry;
-    registry.addProgram(kVertex, kFragment, false, "one", true, true);
-    registry.addProgram(kVertex, kOtherFragment, false, "two", true, true);
-    ids = {registry.program(0).id, registry.program(1).id};
-  }
-  for (GLuint id : ids) EXPECT_FALSE(glIsProgram(id)) << id;
 }
 
 }  // namespace

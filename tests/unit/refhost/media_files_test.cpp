@@ -1,20 +1,36 @@
 // Media on disk: stills written and read back exactly, small videos encoded and decoded frame
-// by frame by index, and the kinds of output their names choose. (What appears on disk, and
-// when, is checked through the command line.)
+// by frame by index, damaged ones failing at the first frame they cannot give, and the kinds of
+// output their names choose. (What appears on disk, and when, is checked through the command
+// line.)
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <fstream>
+#include <iterator>
 
 #include "refhost/frame_output.h"
 #include "refhost/image_files.h"
 #include "refhost/media_source.h"
+#include "refhost/test_patterns.h"
 #include "refhost/video_reader.h"
+#include "refhost/video_writer.h"
 #include "support/temp_paths.h"
 
 namespace refhost {
 namespace {
 
 using testsupport::ScratchDirectory;
+
+// Counter frames first .. first + frames - 1 at 25 fps, encoded with the codec every container
+// gets.
+void writeCounterVideo(const std::string& path, VideoContainer container, int32_t width,
+                       int32_t height, int32_t frames, int32_t first = 0) {
+  VideoWriter writer(path, container, width, height, 25.0);
+  EXPECT_EQ(writer.codecName(), "libx264") << writer.note();
+  for (int32_t i = first; i < first + frames; ++i)
+    writer.write(generatePattern(Pattern::Counter, i, width, height));
+  writer.finish();
+}
 
 TEST(ImageFiles, StillsRoundTripExactlyAndStretchAsSources) {
   ScratchDirectory folder;
@@ -56,13 +72,7 @@ TEST(VideoFiles, DecodedFrameNShowsCounterN) {
                                                                {VideoContainer::Mov, "clip.mov"},
                                                                {VideoContainer::Mkv, "clip.mkv"}};
   for (const auto& [container, name] : containers) {
-    {
-      VideoWriter writer(folder.file(name), container, width, height, 25.0);
-      EXPECT_EQ(writer.codecName(), "libx264") << writer.note();
-      for (int32_t i = 0; i < frames; ++i)
-        writer.write(generatePattern(Pattern::Counter, i, width, height));
-      writer.finish();
-    }
+    writeCounterVideo(folder.file(name), container, width, height, frames);
     VideoReader reader(folder.file(name));
     EXPECT_EQ(reader.width(), width);
     EXPECT_DOUBLE_EQ(reader.frameRate(), 25.0);
@@ -75,15 +85,44 @@ TEST(VideoFiles, DecodedFrameNShowsCounterN) {
     EXPECT_EQ(readCounterCode(reader.frame(6, 2 * width, 2 * height)), 6) << name;
   }
   // Odd sizes are padded to even ones.
-  {
-    VideoWriter writer(folder.file("odd.mp4"), VideoContainer::Mp4, 65, 37, 30.0);
-    writer.write(generatePattern(Pattern::Counter, 3, 65, 37));
-    writer.finish();
-  }
+  writeCounterVideo(folder.file("odd.mp4"), VideoContainer::Mp4, 65, 37, 1, 3);
   VideoReader reader(folder.file("odd.mp4"));
   EXPECT_EQ(reader.width(), 66);
   EXPECT_EQ(reader.height(), 38);
   EXPECT_EQ(readCounterCode(reader.frame(0, 66, 38)), 3);
+}
+
+// A video whose index is intact but whose picture data is damaged past some point, as a copy
+// cut short in the middle with its index at the front is: the frames before the damage decode,
+// and the first one after it fails with one line naming the file and the frame.
+TEST(VideoFiles, TheFirstUndecodableFrameIsNamedWithTheFile) {
+  ScratchDirectory folder;
+  const std::string path = folder.file("damaged.mp4");
+  writeCounterVideo(path, VideoContainer::Mp4, 64, 36, 30);
+  std::ifstream in(path, std::ios::binary);
+  std::string bytes(std::istreambuf_iterator<char>(in), {});
+  // Zero the second half of the picture data box: 4 bytes of big-endian size, then "mdat".
+  const std::size_t box = bytes.find("mdat");
+  ASSERT_NE(box, std::string::npos);
+  std::size_t size = 0;
+  for (std::size_t i = box - 4; i < box; ++i) size = size << 8 | static_cast<uint8_t>(bytes[i]);
+  ASSERT_LE(box - 4 + size, bytes.size());
+  std::fill(bytes.begin() + static_cast<long>(box + size / 2),
+            bytes.begin() + static_cast<long>(box - 4 + size), '\0');
+  std::ofstream(path, std::ios::binary | std::ios::trunc) << bytes;
+
+  VideoReader reader(path);
+  int decoded = 0;
+  std::string message;
+  try {
+    for (; decoded < 30; ++decoded) reader.frame(decoded, 64, 36);
+  } catch (const std::runtime_error& error) {
+    message = error.what();
+  }
+  EXPECT_GT(decoded, 0);
+  EXPECT_EQ(message.rfind(path + ": cannot decode video: frame " + std::to_string(decoded), 0), 0u)
+      << message;
+  EXPECT_EQ(message.find('\n'), std::string::npos) << message;
 }
 
 TEST(OutputTarget, NamesChooseTheKindOfOutput) {

@@ -1,5 +1,5 @@
 // The host's parameter panel as the plug-in's calls build and use it: declaration and its call
-// log, refused calls, keyframed values, undo steps, and the viewer requests the host records.
+// log, refused calls, keyframed values, undo steps, popup answers and the host's names.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -50,22 +50,15 @@ class HostPanel : public ::testing::Test {
   WispHost* h = host.handle();
 };
 
-// Kinds, names, ranges and groups are checked against the effect's own declaration elsewhere;
-// here the nesting of groups, the enabled states and the log lines.
+// Kinds, names, ranges, defaults and the whole group tree are checked against the effect's own
+// declaration elsewhere; here each parameter's group path, the enabled state its flags start
+// it in, and the log lines of the declaration.
 TEST_F(HostPanel, NestsGroupsStartsFlaggedParametersDisabledAndLogsEveryCall) {
-  EXPECT_EQ(host.panel().openGroupDepth(), 0);
   EXPECT_EQ(host.panel().groupPath(host.param("a")), (std::vector<std::string>{"Cuts", "Cut 1"}));
   EXPECT_TRUE(host.panel().groupPath(host.param("c")).empty());
-  EXPECT_EQ(read("a", 0), "225");
   // The flag bit 0x2 starts a parameter disabled; SetParamEnabled then decides.
   EXPECT_FALSE(host.isEnabled("f"));
   EXPECT_TRUE(host.isEnabled("l"));
-  uint8_t on = 1, off = 0;
-  api.SetParamEnabled(h, "f", &on);
-  api.SetParamEnabled(h, "l", &off);
-  EXPECT_TRUE(host.isEnabled("f"));
-  EXPECT_FALSE(host.isEnabled("l"));
-
   const std::vector<std::string> firstCalls(host.callLog().begin(), host.callLog().begin() + 6);
   EXPECT_EQ(firstCalls, (std::vector<std::string>{
                             "AddChoiceParam \"Preset\" c 98 \"A|B|C\" 1 0",
@@ -75,8 +68,6 @@ TEST_F(HostPanel, NestsGroupsStartsFlaggedParametersDisabledAndLogsEveryCall) {
                             "AddAngleParam \"Direction\" a 17 1 225",
                             "EndParamGroup",
                         }));
-  EXPECT_EQ(host.callsTo("SetParamEnabled"),
-            (std::vector<std::string>{"SetParamEnabled f 1", "SetParamEnabled l 0"}));
 }
 
 TEST_F(HostPanel, RefusesTheArmedCallDuplicatesAndUnbalancedGroups) {
@@ -86,7 +77,6 @@ TEST_F(HostPanel, RefusesTheArmedCallDuplicatesAndUnbalancedGroups) {
   EXPECT_NE(api.AddBoolParam(h, L"B", "y", 0, 0), 0);
   EXPECT_EQ(api.AddBoolParam(h, L"C", "z", 0, 0), 0);
   EXPECT_EQ(host.declarationCallCount(), 3);
-  EXPECT_EQ(host.panel().find("y"), nullptr);
   EXPECT_TRUE(host.problems().empty());
 
   EXPECT_NE(api.AddIntParam(h, L"Again", L"", "i", 0, 1, 8, 1), 0);
@@ -97,47 +87,28 @@ TEST_F(HostPanel, RefusesTheArmedCallDuplicatesAndUnbalancedGroups) {
 }
 
 TEST_F(HostPanel, InterpolatesContinuousKindsAndHoldsDiscreteOnes) {
+  // Keys at times 10 and 20, and what each kind reads at other times.
+  using Value = ParamValue;
   const struct {
     const char* id;
-    ParamValue at10, at20;
+    Value at10, at20;
+    std::vector<std::pair<int32_t, std::string>> reads;
   } keys[] = {
-      {"f", ParamValue::ofFloat(0), ParamValue::ofFloat(100)},
-      {"i", ParamValue::ofInt(1), ParamValue::ofInt(8)},
-      {"b", ParamValue::ofInt(0), ParamValue::ofInt(1)},
-      {"c", ParamValue::ofInt(2), ParamValue::ofInt(0)},
-      {"p", ParamValue::ofPoint(-10, 4), ParamValue::ofPoint(10, 8)},
-      {"a", ParamValue::ofFloat(90), ParamValue::ofFloat(-270)},
-      {"col", ParamValue::ofColor(0, 1, 0.5f), ParamValue::ofColor(1, 0, 0.5f)},
-      {"l", ParamValue::ofLayer(kLayerA), ParamValue::ofLayer(kLayerB)},
+      {"f", Value::ofFloat(0), Value::ofFloat(100), {{5, "0"}, {12, "20"}, {99, "100"}}},
+      {"a", Value::ofFloat(90), Value::ofFloat(-270), {{15, "-90"}, {11, "54"}}},
+      {"p", Value::ofPoint(-10, 4), Value::ofPoint(10, 8), {{15, "(0, 6)"}, {0, "(-10, 4)"}}},
+      {"col", Value::ofColor(0, 1, 0.5f), Value::ofColor(1, 0, 0.5f), {{15, "(0.5, 0.5, 0.5)"}}},
+      {"i", Value::ofInt(1), Value::ofInt(8), {{19, "1"}, {20, "8"}, {-5, "1"}}},
+      {"b", Value::ofInt(0), Value::ofInt(1), {{19, "0"}, {20, "1"}}},
+      {"c", Value::ofInt(2), Value::ofInt(0), {{15, "2"}, {25, "0"}}},
+      {"l", Value::ofLayer(kLayerA), Value::ofLayer(kLayerB), {{19, kLayerA}, {20, kLayerB}}},
   };
   for (const auto& key : keys) {
     host.setKeyframe(key.id, 10, key.at10);
     host.setKeyframe(key.id, 20, key.at20);
+    for (const auto& [time, expected] : key.reads)
+      EXPECT_EQ(read(key.id, time), expected) << key.id << " @" << time;
   }
-  const struct {
-    const char* id;
-    int32_t time;
-    std::string expected;
-  } cases[] = {
-      {"f", 5, "0"},
-      {"f", 12, "20"},
-      {"f", 99, "100"},
-      {"a", 15, "-90"},
-      {"a", 11, "54"},
-      {"p", 15, "(0, 6)"},
-      {"p", 0, "(-10, 4)"},
-      {"i", 19, "1"},
-      {"i", 20, "8"},
-      {"i", -5, "1"},
-      {"b", 19, "0"},
-      {"b", 20, "1"},
-      {"c", 15, "2"},
-      {"c", 25, "0"},
-      {"l", 19, kLayerA},
-      {"l", 20, kLayerB},
-      {"col", 15, "(0.5, 0.5, 0.5)"},
-  };
-  for (const auto& c : cases) EXPECT_EQ(read(c.id, c.time), c.expected) << c.id << " @" << c.time;
 
   // A plug-in edit of an animated parameter adds a keyframe; of a static one sets the value.
   api.SetFloatParam(h, "f", 15, 10, 0);
@@ -156,7 +127,6 @@ TEST_F(HostPanel, StoresWhatItIsGivenAndReportsMisuse) {
   host.setValue("f", ParamValue::ofFloat(NAN));
   EXPECT_EQ(read("i", 7), "-3");
   EXPECT_TRUE(std::isnan(api.GetFloatParam(h, "f", 0)));
-  EXPECT_EQ(read("l", 0), kNoLayer);
 
   // Unknown ids and kind mismatches read zero values, write nothing and are reported.
   EXPECT_EQ(api.GetIntParam(h, "nope", 0), 0);
@@ -174,7 +144,7 @@ TEST_F(HostPanel, StoresWhatItIsGivenAndReportsMisuse) {
   EXPECT_THROW(host.setValue("typo", ParamValue::ofInt(1)), std::out_of_range);
 }
 
-TEST_F(HostPanel, UndoAndRedoRestoreExactStatesAcrossSteps) {
+TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   host.setKeyframe("a", 0, ParamValue::ofFloat(0));
   host.setKeyframe("a", 100, ParamValue::ofFloat(90));
   std::vector<std::vector<ParamState>> history{snapshot()};
@@ -214,25 +184,20 @@ TEST_F(HostPanel, UndoAndRedoRestoreExactStatesAcrossSteps) {
   EXPECT_FALSE(host.redo());
   EXPECT_TRUE(std::isnan(host.valueAt("p", 0).number[1]));
   EXPECT_TRUE(std::signbit(host.valueAt("p", 0).number[0]));
-}
 
-TEST_F(HostPanel, NewStepDropsRedoAndEditsOutsideBracketsAreImmediate) {
-  api.BeginUndo(h, "First");
-  api.SetFloatParam(h, "f", 0, 5, 0);
-  api.EndUndo(h);
+  // An edit outside any bracket is immediate and keeps the step that can be redone.
   ASSERT_TRUE(host.undo());
-
   api.SetLayerParam(h, "l", 4, kLayerB, 0);
   ASSERT_EQ(host.immediateEdits().size(), 1u);
   EXPECT_EQ(host.immediateEdits()[0].id, "l");
   EXPECT_EQ(host.immediateEdits()[0].time, 4);
   EXPECT_EQ(host.immediateEdits()[0].value, kLayerB);
-  EXPECT_EQ(host.redoStepNames(), std::vector<std::string>{"First"});  // immediate edits keep it
-
-  api.BeginUndo(h, "Second");
+  EXPECT_EQ(host.redoStepNames(), std::vector<std::string>{"Select"});
+  // A new step drops it.
+  api.BeginUndo(h, "Width");
   api.SetFloatParam(h, "f", 0, 9, 0);
   api.EndUndo(h);
-  EXPECT_EQ(host.undoStepNames(), std::vector<std::string>{"Second"});
+  EXPECT_EQ(host.undoStepNames(), (std::vector<std::string>{"Move Cut", "Rotate Cut", "Width"}));
   EXPECT_FALSE(host.redo());
 
   // Undo is refused while the plug-in holds a bracket open (a drag in progress).
@@ -243,6 +208,8 @@ TEST_F(HostPanel, NewStepDropsRedoAndEditsOutsideBracketsAreImmediate) {
   EXPECT_EQ(host.problems(), std::vector<std::string>{"EndUndo without BeginUndo"});
 }
 
+// Cursors, redraws and the frame requests themselves are checked through the controls and the
+// module; here the popup answers, a layer request's log line and the host's names.
 TEST(HostViewerRecords, RecordsRequestsAndAnswersAsConfigured) {
   Host host;
   tagWispAPI& api = host.api();
@@ -250,28 +217,14 @@ TEST(HostViewerRecords, RecordsRequestsAndAnswersAsConfigured) {
   host.queuePopupAnswer(2);
   EXPECT_EQ(api.ShowPopupMenu(h, "A|B|C"), 2);
   EXPECT_EQ(api.ShowPopupMenu(h, ""), -1);  // no answer left: dismissed
-  const uint32_t frames[] = {12, 12};
-  api.SetCursor(h, 3);
-  api.Redraw(h, 0);
-  api.RequestFrames(h, 2, frames);
-  api.RequestLayerFrames(h, kLayerA, 2, frames);
   EXPECT_EQ(host.popupMenus(), (std::vector<std::string>{"A|B|C", ""}));
-  EXPECT_EQ(host.cursorShapes(), std::vector<int32_t>{3});
-  EXPECT_EQ(host.redrawCount(), 1);
-  ASSERT_EQ(host.frameRequests().size(), 2u);
-  EXPECT_EQ(host.frameRequests()[0].layerGuid, "");
-  EXPECT_EQ(host.frameRequests()[1].frames, (std::vector<uint32_t>{12, 12}));
+  const uint32_t frames[] = {12, 12};
+  api.RequestLayerFrames(h, kLayerA, 2, frames);
   EXPECT_EQ(host.callsTo("RequestLayerFrames"),
             std::vector<std::string>{std::string("RequestLayerFrames ") + kLayerA + " 2 12 12"});
-  host.clearViewerRecords();
-  EXPECT_TRUE(host.cursorShapes().empty() && host.frameRequests().empty());
 
   EXPECT_EQ(toUtf8(api.GetHostIdentifier(h)), "org.veltrane.refhost");
   host.setHostId(6001);
-  host.setVerbose(true);
-  host.setTextureFormatMode(2);
-  EXPECT_EQ(api.verbose, 1);
-  EXPECT_EQ(api.textureFormatMode, 2u);
   host.setHostIdentifier(L"org.example.\u00e9dit");
   EXPECT_EQ(api.GetHostId(h), 6001);
   EXPECT_EQ(toUtf8(api.GetHostIdentifier(h)),

@@ -1,5 +1,6 @@
-// The split-screen sample stage rendered on Mesa and compared, pixel by pixel, with a CPU model
-// of its formula (the border combine is checked through the whole render).
+// Textured draws on Mesa through the reference host: the frame quad through the copy program,
+// and the split-screen sample stage compared, pixel by pixel, with a CPU model of its formula
+// (the border combine is checked through the whole render).
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -19,12 +20,26 @@ namespace ids = veltrane::shader_ids;
 
 constexpr int kWidth = 64;
 constexpr int kHeight = 36;
+// Source texels are linear ramps over the whole allocation, so bilinear sampling reproduces the
+// ramp exactly between texel centres and the model needs no filtering of its own; the frame's
+// image is its lower-left part.
+constexpr int kSourceWidth = 128;
+constexpr int kSourceHeight = 64;
+float ramp(float coordinate, int size, float step) {
+  return step * std::fmin(std::fmax(coordinate * size - 0.5f, 0.0f), size - 1.0f) / 255.0f;
+}
 
-class EffectStagePixels : public testsupport::GlHostTest {
+class TexturedDraw : public testsupport::GlHostTest {
  protected:
   void SetUp() override {
     GlHostTest::SetUp();
     buildPrograms();
+    std::vector<float> texels;
+    for (int j = 0; j < kSourceHeight; ++j) {
+      for (int i = 0; i < kSourceWidth; ++i)
+        texels.insert(texels.end(), {2 * i / 255.0f, 4 * j / 255.0f, 0.5f, 1});
+    }
+    source_ = makeTexture(kWidth, kHeight, kSourceWidth, kSourceHeight, GL_RGBA8, texels);
   }
 
   void select(const char* program) {
@@ -35,38 +50,35 @@ class EffectStagePixels : public testsupport::GlHostTest {
   }
   GLint uniform(const char* name) { return registry_->uniformLocation(name); }
 
-  // Draws the frame with texture coordinates 0..1, as a region covering it would, into a new
-  // target and reads it back.
-  std::vector<float> drawFrame() {
+  // Draws the quad with the selected program into a new target and reads it back.
+  std::vector<float> drawFrame(const TexturedQuad& quad) {
     RenderTarget target = createRenderTarget(handle(), api(), false);
     attachRenderTarget(target.texture, 0, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
     glClearColor(0, 0, 0, 0);
     glClear(GL_COLOR_BUFFER_BIT);
-    TextureRecord unitSquare{};
-    unitSquare.s1 = unitSquare.t1 = 1.0f;
-    const TexturedQuad quad = makeTextureQuad(unitSquare, kWidth, kHeight);
     drawTexturedVertices(api(), handle(), quad.data(), 4, GL_TRIANGLE_STRIP);
+    drawTexturedVertices(api(), handle(), quad.data(), 0, GL_TRIANGLE_STRIP);  // draws nothing
     registry_->releaseProgram();
     return readImage(target.texture);
   }
+
+  TextureRecord source_{};
 };
 
-// Source texels are linear ramps over the whole allocation, so bilinear sampling reproduces the
-// ramp exactly between texel centres and the model needs no filtering of its own.
-constexpr int kSourceWidth = 128;
-constexpr int kSourceHeight = 64;
-float ramp(float coordinate, int size, float step) {
-  return step * std::fmin(std::fmax(coordinate * size - 0.5f, 0.0f), size - 1.0f) / 255.0f;
+// The frame quad over the image part of the source, drawn through the copy program, reproduces
+// that image texel for texel: positions reach attribute 0, texture coordinates attribute 8, and
+// the corners sit in strip order. Only the draw of vertices takes a buffer.
+TEST_F(TexturedDraw, FrameQuadCopiesTheImagePartExactly) {
+  context_.source = source_;
+  select("glCopy");
+  bindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, source_.id, true);
+  const std::vector<float> pixels = drawFrame(makeFrameQuad(context_));
+  unbindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, true);
+  EXPECT_EQ(host().callsTo("AcquireBuffer").size(), 1u);
+  EXPECT_TRUE(pixels == readImage(source_)) << "the copy differs from the image";
 }
 
-TEST_F(EffectStagePixels, SplitScreenSampleMatchesTheModel) {
-  std::vector<float> texels;
-  for (int j = 0; j < kSourceHeight; ++j) {
-    for (int i = 0; i < kSourceWidth; ++i)
-      texels.insert(texels.end(), {2 * i / 255.0f, 4 * j / 255.0f, 0.5f, 1});
-  }
-  const TextureRecord source =
-      makeTexture(kWidth, kHeight, kSourceWidth, kSourceHeight, GL_RGBA8, texels);
+TEST_F(TexturedDraw, SplitScreenSampleMatchesTheModel) {
   const float aspect = static_cast<float>(kWidth) / kHeight;
   const struct {
     const char* label;
@@ -81,15 +93,17 @@ TEST_F(EffectStagePixels, SplitScreenSampleMatchesTheModel) {
   for (const auto& c : cases) {
     SCOPED_TRACE(c.label);
     select("splitScreen");
-    bindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, source.id, true);
+    bindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, source_.id, true);
     registry_->setUniform1i(uniform(ids::kSourceTexture), 0);
-    registry_->setUniform2f(uniform(ids::kSourceExtent), source.s1, source.t1);
+    registry_->setUniform2f(uniform(ids::kSourceExtent), source_.s1, source_.t1);
     registry_->setUniform3f(uniform(ids::kTint), c.tint[0], c.tint[1], c.tint[2]);
     registry_->setUniform2f(uniform(ids::kSampleOffset), c.offsetX, c.offsetY);
     registry_->setUniform1f(uniform(ids::kSampleRotation), c.rotation);
     registry_->setUniform1f(uniform(ids::kInverseScale), c.inverseScale);
     registry_->setUniform1f(uniform(ids::kAspectRatio), c.aspect);
-    const std::vector<float> pixels = drawFrame();
+    TextureRecord unitSquare{};  // texture coordinates 0..1, as a region covering the frame has
+    unitSquare.s1 = unitSquare.t1 = 1.0f;
+    const std::vector<float> pixels = drawFrame(makeTextureQuad(unitSquare, kWidth, kHeight));
 
     int compared = 0, outside = 0;
     for (int y = 0; y < kHeight; ++y) {
@@ -104,8 +118,8 @@ TEST_F(EffectStagePixels, SplitScreenSampleMatchesTheModel) {
         };
         if (onEdge(u) || onEdge(v)) continue;  // either answer is right on the boundary
         const bool inside = u >= 0 && u <= 1 && v >= 0 && v <= 1;
-        const float expected[4] = {inside ? ramp(u * source.s1, kSourceWidth, 2) * c.tint[0] : 0,
-                                   inside ? ramp(v * source.t1, kSourceHeight, 4) * c.tint[1] : 0,
+        const float expected[4] = {inside ? ramp(u * source_.s1, kSourceWidth, 2) * c.tint[0] : 0,
+                                   inside ? ramp(v * source_.t1, kSourceHeight, 4) * c.tint[1] : 0,
                                    inside ? 0.5f * c.tint[2] : 0, inside ? 1.0f : 0};
         for (int k = 0; k < 4; ++k) {
           // 8-bit output and the source's own rounding of 0.5
