@@ -282,7 +282,6 @@ TEST_F(ViewerGestures, HostileValuesKeepEveryUndoStepBalanced) {
   const auto pick = [&random](const auto& table) {
     return table[std::uniform_int_distribution<size_t>(0, std::size(table) - 1)(random)];
   };
-  const auto point = [&] { return ParamValue::ofPoint(pick(floats), pick(floats)); };
   std::uniform_int_distribution<int> coordinate(-100, 2000);
   for (int trial = 0; trial < 300; ++trial) {
     WispViewerContext& context = viewer().context();
@@ -291,18 +290,13 @@ TEST_F(ViewerGestures, HostileValuesKeepEveryUndoStepBalanced) {
     context.viewScaleX = pick(scales);
     context.viewScaleY = pick(scales);
     context.uiScale = pick(scales);
-    host().setValue("numberOfCuts", ParamValue::ofInt(pick(counts)));
-    host().setValue("cutType", ParamValue::ofInt(pick(counts)));
-    host().setValue("cutPosition_global", point());
-    for (int i = 0; i < 8; ++i) {
-      host().setValue("cutPosition_" + std::to_string(i), point());
-      host().setValue("cutDirection_" + std::to_string(i), ParamValue::ofFloat(pick(floats)));
-    }
-    for (int j = 0; j < 9; ++j) {
-      const std::string n = std::to_string(j);
-      host().setValue("inputFrameTranslation" + n, point());
-      host().setValue("inputFrameScale" + n, ParamValue::ofFloat(pick(floats)));
-      host().setValue("inputFrameRotation" + n, ParamValue::ofFloat(pick(floats)));
+    // Every number of every parameter (layers and colours aside) takes a hostile value.
+    for (const refhost::Param& param : host().panel().params()) {
+      if (param.kind == refhost::ParamKind::Layer || param.kind == refhost::ParamKind::Color)
+        continue;
+      ParamValue value = ParamValue::ofPoint(pick(floats), pick(floats));
+      value.integer = pick(counts);
+      host().setValue(param.id, value);
     }
     viewer().key(trial % 3 == 0 ? 1007 : 1008, kShift);
     host().clearCallLog();
