@@ -1,4 +1,4 @@
-// Spawning the command line with redirected output.
+// Spawning the command line with redirected output, and the scene its tests share.
 #include "cli_runner.h"
 
 #include <fcntl.h>
@@ -39,7 +39,9 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin,
 
   std::vector<std::string> environment;
   for (char** entry = environ; *entry; ++entry) {
-    if (std::string(*entry).rfind("VELTRANE_PLUGIN=", 0) != 0) environment.push_back(*entry);
+    const std::string name = std::string(*entry).substr(0, std::string(*entry).find('='));
+    if (name != "VELTRANE_PLUGIN" && name != "DISPLAY" && name != "WAYLAND_DISPLAY")
+      environment.push_back(*entry);
   }
   if (plugin) environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
   std::vector<char*> envp;
@@ -65,4 +67,22 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin,
   unlink(outPath);
   unlink(errPath);
   return run;
+}
+
+const char kLayerA[] = "aaaaaaaa-0000-4000-8000-000000000001";
+
+nlohmann::json smallScene(const std::string& pattern, int frames) {
+  return {{"width", 64},
+          {"height", 36},
+          {"fps", 25},
+          {"duration", frames},
+          {"source", {{"pattern", pattern}}},
+          {"layers", nlohmann::json::array({{{"guid", kLayerA}, {"name", "A"}}})},
+          {"params", {{"cutPosition_0", {28, 0}}, {"cutDirection_0", 0}, {"borderWidth", 0}}}};
+}
+
+std::string writeScene(const ScratchDirectory& folder, const nlohmann::json& scene) {
+  const std::string path = folder.file("scene.json");
+  writeText(path, scene.dump());
+  return path;
 }

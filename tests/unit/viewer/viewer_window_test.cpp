@@ -154,35 +154,4 @@ TEST_F(ViewerWindow, ShowsTheRenderOfWhatItSavesWithTheHandlesOverIt) {
       << ", rectangle edges " << counts[2] << ", elsewhere " << counts[3];
 }
 
-// A scene error reads as `veltrane render` words it; no display says so and what to do.
-TEST(ViewerCommand, FailsWithOneLineWithoutADisplayOrWithABadScene) {
-  std::string dir = testsupport::makeTempDirectory("veltrane_view_");
-  std::ofstream(dir + "/good.json") << kScene;
-  std::ofstream(dir + "/bad.json") << R"({"width": 320, "height": 180, "fps": 25,
-      "duration": 10, "source": {"pattern": "zebra"}})";
-  ChildProcess render({VELTRANE_CLI_PATH, "render", dir + "/bad.json", "-o", dir + "/x.png"}, {},
-                      "/dev/null", dir + "/render.txt");
-  ASSERT_EQ(render.wait(60), 1);
-  std::string renderMessage = text(dir + "/render.txt");
-  ASSERT_EQ(renderMessage.rfind("veltrane render: ", 0), 0u) << renderMessage;
-  struct Case {
-    std::string scene;
-    std::vector<std::string> environment;
-    std::string message;
-  } cases[] = {
-      {dir + "/good.json",
-       {"DISPLAY=", "WAYLAND_DISPLAY="},
-       "veltrane view: cannot open a window: no display (DISPLAY is not set); run it under a "
-       "virtual X server, e.g. xvfb-run -a veltrane view SCENE.json\n"},
-      {dir + "/bad.json", {}, "veltrane view: " + renderMessage.substr(17)},
-  };
-  for (const Case& c : cases) {
-    ChildProcess viewer({VELTRANE_CLI_PATH, "view", c.scene, "--plugin", VELTRANE_MODULE_PATH},
-                        c.environment, "/dev/null", dir + "/err.txt");
-    EXPECT_EQ(viewer.wait(60), 1) << c.scene;
-    EXPECT_EQ(text(dir + "/err.txt"), c.message);
-  }
-  std::filesystem::remove_all(dir);
-}
-
 }  // namespace
