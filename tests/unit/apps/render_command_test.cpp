@@ -1,5 +1,5 @@
-// `veltrane render` end to end: frames arrive upright and at the right time in every kind of
-// output.
+// `veltrane render` end to end: frames arrive upright, in order and at the right time in every
+// kind of output, with a progress line telling the rate and the time left.
 #include <gtest/gtest.h>
 
 #include <nlohmann/json.hpp>
@@ -10,8 +10,6 @@
 #include "refhost/video_reader.h"
 
 namespace {
-
-using nlohmann::json;
 
 CliRun render(const std::string& scene, const std::vector<std::string>& more) {
   std::vector<std::string> args{"render", scene, "--plugin", VELTRANE_MODULE_PATH};
@@ -35,30 +33,39 @@ TEST(RenderCommand, StillsAreUpright) {
   EXPECT_LE(image.pixel(10, 35)[1], 1);
 }
 
-TEST(RenderCommand, EveryOutputKindCarriesTheFramesAsked) {
+// Sequences are written by several writers and videos through a queue: every frame of the
+// counter source must still arrive in its own place.
+TEST(RenderCommand, EveryOutputKindCarriesTheFramesAskedInOrder) {
   ScratchDirectory folder;
-  std::string scene = writeScene(folder, smallScene("counter"));
+  std::string scene = writeScene(folder, smallScene("counter", 30));
   auto code = [](const refhost::RgbaImage& image) {
     return static_cast<int>(refhost::readCounterCode(image).value_or(9999));
   };
   CliRun still = render(scene, {"-o", folder.file("f.exr"), "--frame", "5"});
   ASSERT_EQ(still.status, 0) << still.err;
   EXPECT_EQ(code(refhost::readImageFile(folder.file("f.exr"))), 5);
-
-  CliRun sequence = render(scene, {"-o", folder.file("s_%04d.png"), "--frames", "2-4"});
-  ASSERT_EQ(sequence.status, 0) << sequence.err;
-  for (int frame : {2, 3, 4}) {
-    std::string name = folder.file("s_000" + std::to_string(frame) + ".png");
-    EXPECT_EQ(code(refhost::readImageFile(name)), frame) << name;
+  const std::pair<std::string, std::vector<std::string>> runs[] = {
+      {"s_%04d.png", {"--frames", "1-29"}}, {"v.mkv", {"--frames", "1-29"}}, {"all.mkv", {}}};
+  for (const auto& [output, frames] : runs) {
+    std::vector<std::string> options{"-o", folder.file(output)};
+    options.insert(options.end(), frames.begin(), frames.end());
+    CliRun run = render(scene, options);
+    ASSERT_EQ(run.status, 0) << run.err;
+    const std::string count = frames.empty() ? "30/30" : "29/29";
+    for (const std::string& progress : {count + "  ", std::string(" fps "), std::string(" s left")})
+      EXPECT_NE(run.err.find(progress), std::string::npos) << output << ": " << run.err;
   }
-
-  CliRun video = render(scene, {"--output", folder.file("v.mkv")});
-  ASSERT_EQ(video.status, 0) << video.err;
-  EXPECT_NE(video.err.find("10/10"), std::string::npos);  // the progress bar reached the end
-  refhost::VideoReader reader(folder.file("v.mkv"));
-  EXPECT_EQ(reader.frameCount(), 10);
-  for (int frame : {0, 7, 9, 3}) EXPECT_EQ(code(reader.frame(frame, 64, 36)), frame);
-  EXPECT_EQ(folder.entries().size(), 6u);  // scene, still, three frames, video: no leftovers
+  refhost::VideoReader video(folder.file("v.mkv")), all(folder.file("all.mkv"));
+  ASSERT_EQ(video.frameCount(), 29);
+  ASSERT_EQ(all.frameCount(), 30);
+  for (int frame = 1; frame <= 29; ++frame) {
+    char name[32];
+    std::snprintf(name, sizeof name, "s_%04d.png", frame);
+    EXPECT_EQ(code(refhost::readImageFile(folder.file(name))), frame) << name;
+    EXPECT_EQ(code(video.frame(frame - 1, 64, 36)), frame) << "video frame " << frame - 1;
+  }
+  for (int frame : {0, 7, 29, 3}) EXPECT_EQ(code(all.frame(frame, 64, 36)), frame) << frame;
+  EXPECT_EQ(folder.entries().size(), 33u);  // scene, still, 29 frames, two videos: nothing else
 }
 
 TEST(RenderCommand, TheShippedDemoSceneRenders) {
@@ -69,18 +76,27 @@ TEST(RenderCommand, TheShippedDemoSceneRenders) {
   EXPECT_EQ(refhost::readImageFile(folder.file("demo.png")).width, 640);
 }
 
-TEST(BenchCommand, ReportsEveryCase) {
-  CliRun run = runCli({"bench", "--plugin", VELTRANE_MODULE_PATH, "--sizes", "64x36,80x45",
-                       "--cuts", "1,3", "--repeat", "1", "--warmup", "0", "--json"});
+// The bare-GL replica of `--floor` draws the effect's own picture (the bench stops when it does
+// not); every case gets its times.
+TEST(BenchCommand, ReportsEveryCaseWithItsFloor) {
+  CliRun run = runCli({"bench", "--plugin", VELTRANE_MODULE_PATH, "--sizes", "64x36,96x54",
+                       "--cuts", "1,3,8", "--repeat", "1", "--warmup", "0", "--floor", "--json"});
   ASSERT_EQ(run.status, 0) << run.err;
-  json document = json::parse(run.out);
-  ASSERT_EQ(document["results"].size(), 8u);  // 2 sizes x 2 cut counts x 2 input kinds
-  const json& last = document["results"].back();
-  EXPECT_EQ(last["width"], 80);
-  EXPECT_EQ(last["cuts"], 3);
-  EXPECT_EQ(last["inputs"], "layers");
-  EXPECT_GT(last["renderMs"].get<double>(), 0.0);
-  EXPECT_GT(last["fetchMs"].get<double>(), 0.0);  // nine layers were fetched
+  nlohmann::json rows = nlohmann::json::parse(run.out)["results"];
+  ASSERT_EQ(rows.size(), 12u);  // 2 sizes x 3 cut counts x 2 input kinds
+  EXPECT_EQ(rows.back()["width"], 96);
+  EXPECT_EQ(rows.back()["cuts"], 8);
+  EXPECT_EQ(rows.back()["inputs"], "layers");
+  EXPECT_GT(rows.back()["fetchMs"].get<double>(), 0.0);  // nine layers were fetched
+  for (const nlohmann::json& row : rows) {
+    for (const char* time : {"renderMs", "floorMs", "floorCpuMs"})
+      EXPECT_GT(row[time].get<double>(), 0.0) << time << " " << row;
+    // Layer rows show other pictures than the replica's own source; only own rows compare.
+    EXPECT_EQ(row.contains("floorDifference"), row["inputs"] == "own") << row;
+    if (row["inputs"] == "own") {
+      EXPECT_LE(row["floorDifference"].get<int>(), 8) << row;
+    }
+  }
 }
 
 }  // namespace
