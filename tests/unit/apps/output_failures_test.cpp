@@ -87,7 +87,8 @@ TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
   const std::string n(240, 'n'), full = ": cannot write: No space left on device";
   const Case cases[] = {
       {"render", {"-o", n + ".png"}, {n + ".png"}, 0, n + "\\.png" + full},  // near the name limit
-      {"render", {"-o", n + "%04d.png"}, {n + "0003.png"}, 5, n + "00(0[1-9]|[12].)\\.png" + full},
+      // Several writers race for the last free pages: any frame may be the first refused.
+      {"render", {"-o", n + "%04d.png"}, {n + "0003.png"}, 5, n + "00[0-2][0-9]\\.png" + full},
       {"render", {"-o", "s%d.png"}, {"s1.png", "s2.png/"}, 256, "s2\\.png: cannot replace it: .*"},
       {"render", {"-o", "v.mp4"}, {"v.mp4"}, 0, "v\\.mp4: cannot write video: .*space.*"},
       {"interact", {"-o", "r"}, {"r"}, 0, "r" + full},
