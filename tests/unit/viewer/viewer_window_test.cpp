@@ -44,7 +44,7 @@ class ViewerWindow : public ::testing::Test {
     viewer_ = std::make_unique<ChildProcess>(
         std::vector<std::string>{VELTRANE_CLI_PATH, "view", scene_, "--save-as", saved_, "--plugin",
                                  VELTRANE_MODULE_PATH},
-        std::vector<std::string>{x_.environment()}, out_, dir_ + "/err.txt");
+        out_, dir_ + "/err.txt");
     x_.run({"xdotool", "search", "--sync", "--onlyvisible", "--name", "veltrane view"});
     // One frame pixel per screen pixel, so screen and render compare exactly.
     x_.run({"xdotool", "mousemove", "20", "10", "key", "1"});
@@ -64,7 +64,7 @@ class ViewerWindow : public ::testing::Test {
   refhost::RgbaImage render(const std::string& scene) {
     std::string png = dir_ + "/render.png";
     ChildProcess cli(
-        {VELTRANE_CLI_PATH, "render", scene, "-o", png, "--plugin", VELTRANE_MODULE_PATH}, {});
+        {VELTRANE_CLI_PATH, "render", scene, "-o", png, "--plugin", VELTRANE_MODULE_PATH});
     EXPECT_EQ(cli.wait(60), 0);
     return refhost::readImageFile(png);
   }
