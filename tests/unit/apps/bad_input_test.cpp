@@ -51,9 +51,9 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
   struct Case {
     std::vector<std::string> args;
     int status;
-    std::string line;                           // how the one line on stderr starts
-    std::string badText = "";                   // written to bad.json first, when not empty
-    const char* plugin = VELTRANE_MODULE_PATH;  // VELTRANE_PLUGIN
+    std::string line;          // how the one line on stderr starts
+    std::string badText = "";  // written to bad.json first, when not empty
+    const char* plugin = VELTRANE_MODULE_PATH;
   };
   auto badScene = [&](const std::string& text, const std::string& expected) {
     return Case{{"render", bad, "-o", out}, 1, "veltrane render: " + bad + ": " + expected, text};
@@ -210,8 +210,7 @@ TEST(CommandLine, RunningOutOfMemoryNamesTheSceneAndItsFrameSize) {
   getrlimit(RLIMIT_AS, &saved);
   rlimit limited{std::min<rlim_t>(saved.rlim_max, rlim_t{2500} << 20), saved.rlim_max};
   setrlimit(RLIMIT_AS, &limited);
-  CliRun run = runCli({"render", folder.file("huge.json"), "-o", folder.file("huge.png")},
-                      VELTRANE_MODULE_PATH);
+  CliRun run = runCli({"render", folder.file("huge.json"), "-o", folder.file("huge.png")});
   setrlimit(RLIMIT_AS, &saved);
   EXPECT_EQ(run.status, 1);
   EXPECT_NE(run.err.find("veltrane render: " + folder.file("huge.json") +

@@ -8,7 +8,7 @@
 #include <unistd.h>
 
 #include <fstream>
-#include <sstream>
+#include <iterator>
 
 #include "support/temp_paths.h"
 
@@ -16,9 +16,7 @@ extern char** environ;
 
 std::string slurp(const std::string& path) {
   std::ifstream file(path);
-  std::stringstream text;
-  text << file.rdbuf();
-  return text.str();
+  return std::string(std::istreambuf_iterator<char>(file), {});
 }
 
 void writeText(const std::string& path, const std::string& text) {
@@ -43,15 +41,14 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin,
     if (name != "VELTRANE_PLUGIN" && name != "DISPLAY" && name != "WAYLAND_DISPLAY")
       environment.push_back(*entry);
   }
-  if (plugin) environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
-  std::vector<char*> envp;
-  for (std::string& entry : environment) envp.push_back(entry.data());
-  envp.push_back(nullptr);
+  environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
   std::vector<std::string> argStorage{VELTRANE_CLI_PATH};
   argStorage.insert(argStorage.end(), args.begin(), args.end());
-  std::vector<char*> argv;
+  std::vector<char*> argv, envp;
   for (std::string& arg : argStorage) argv.push_back(arg.data());
+  for (std::string& entry : environment) envp.push_back(entry.data());
   argv.push_back(nullptr);
+  envp.push_back(nullptr);
 
   CliRun run;
   pid_t pid = 0;

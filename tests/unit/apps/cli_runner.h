@@ -17,10 +17,10 @@ struct CliRun {
   std::string err;
 };
 
-// Runs the command line with the arguments, without a display; `plugin` sets VELTRANE_PLUGIN
-// when not null (it is unset otherwise). `whileRunning`, when given, gets the process id before
-// the wait.
-CliRun runCli(const std::vector<std::string>& args, const char* plugin = nullptr,
+// Runs the command line with the arguments, without a display and with VELTRANE_PLUGIN naming
+// `plugin` (the built module unless told). `whileRunning`, when given, gets the process id
+// before the wait.
+CliRun runCli(const std::vector<std::string>& args, const char* plugin = VELTRANE_MODULE_PATH,
               const std::function<void(int)>& whileRunning = nullptr);
 
 std::string slurp(const std::string& path);

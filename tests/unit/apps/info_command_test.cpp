@@ -48,7 +48,7 @@ TEST(InfoCommand, ReportsTheDeclaredPanelAsJsonOrText) {
   EXPECT_EQ(params[21]["displayName"], "Layer 0");  // numbered for this host
 
   // As text, with the module found through the environment.
-  CliRun text = runCli({"info"}, VELTRANE_MODULE_PATH);
+  CliRun text = runCli({"info"});
   ASSERT_EQ(text.status, 0) << text.err;
   EXPECT_NE(text.out.find("Veltrane {split-screen}"), std::string::npos);
   EXPECT_NE(text.out.find("Parameters: 69 in 20 groups"), std::string::npos);

@@ -32,9 +32,9 @@ Interaction interact(const ScratchDirectory& folder, const json& events,
                      const std::vector<std::string>& more = {}, const std::string& scene = kScene) {
   writeText(folder.file("scene.json"), scene);
   writeText(folder.file("events.json"), events.dump());
-  std::vector<std::string> args{
-      "interact", folder.file("scene.json"),  "--events", folder.file("events.json"),
-      "-o",       folder.file("result.json"), "--plugin", VELTRANE_MODULE_PATH};
+  std::vector<std::string> args{"interact", folder.file("scene.json"),
+                                "--events", folder.file("events.json"),
+                                "-o",       folder.file("result.json")};
   args.insert(args.end(), more.begin(), more.end());
   Interaction interaction{runCli(args), json()};
   if (interaction.run.status == 0)
@@ -45,11 +45,8 @@ Interaction interact(const ScratchDirectory& folder, const json& events,
 json message(int number, int result) { return {{"message", number}, {"result", result}}; }
 
 TEST(InteractCommand, DraggingACutLineMovesItInOneUndoStep) {
-  const json drag = json::array({{{"move", {190, 120}}},
-                                 {{"press", {190, 120}}},
-                                 {{"move", {200, 110}}},
-                                 {{"move", {210, 100}}},
-                                 {{"release", {210, 100}}}});
+  const json drag = json::parse(R"([{"move": [190, 120]}, {"press": [190, 120]},
+      {"move": [200, 110]}, {"move": [210, 100]}, {"release": [210, 100]}])");
   ScratchDirectory folder;
   Interaction done = interact(folder, {{"events", drag}}, {"--overlay", folder.file("overlay")});
   ASSERT_EQ(done.run.status, 0) << done.run.err;
@@ -96,15 +93,9 @@ TEST(InteractCommand, DraggingACutLineMovesItInOneUndoStep) {
 // Also what the result says of the viewer after each event: the selected input, whether the
 // pointer hovers over its region, and the undo step a script leaves open.
 TEST(InteractCommand, LayerMenuAssignsThePickedLayerToTheSelectedInput) {
-  const json events = json::array({{{"press", {40, 150}}},
-                                   {{"release", {40, 150}}},
-                                   {{"pick", 1}},
-                                   {{"layerMenu", true}},
-                                   {{"keyDown", "Escape"}},
-                                   {{"keyUp", "Escape"}},
-                                   {{"layerMenu", true}},
-                                   {{"move", {-50, -50}}},
-                                   {{"press", {40, 150}}}});
+  const json events = json::parse(R"([{"press": [40, 150]}, {"release": [40, 150]}, {"pick": 1},
+      {"layerMenu": true}, {"keyDown": "Escape"}, {"keyUp": "Escape"}, {"layerMenu": true},
+      {"move": [-50, -50]}, {"press": [40, 150]}])");
   ScratchDirectory folder;
   Interaction done = interact(folder, {{"events", events}});
   ASSERT_EQ(done.run.status, 0) << done.run.err;

@@ -64,12 +64,11 @@ CliRun runOn(const std::string& command, int frames, int events,
   ScratchDirectory inputs;
   writeText(inputs.file("events.json"),
             json{{"events", std::vector<json>(events, {{"move", {10, 10}}})}}.dump());
-  std::vector<std::string> args{command, writeScene(inputs, smallScene("counter", frames)),
-                                "--plugin", VELTRANE_MODULE_PATH};
+  std::vector<std::string> args{command, writeScene(inputs, smallScene("counter", frames))};
   if (command == "interact") args.insert(args.end(), {"--events", inputs.file("events.json")});
   for (std::size_t i = 0; i < options.size(); ++i)
     args.push_back(i % 2 ? folder + "/" + options[i] : options[i]);
-  return runCli(args, nullptr, whileRunning);
+  return runCli(args, VELTRANE_MODULE_PATH, whileRunning);
 }
 
 // What the command printed last, after its progress bar.

@@ -44,8 +44,7 @@ TEST(RenderAudio, VideoOutputsCarryTheRenderedFramesSound) {
     nlohmann::json scene = smallScene("bars", 75);
     scene["source"] = {{"file", c.source}};
     std::vector<std::string> args{
-        "render", writeScene(folder, scene), "--plugin", VELTRANE_MODULE_PATH,
-        "-o",     folder.file(c.out),        "--frames", c.frames};
+        "render", writeScene(folder, scene), "-o", folder.file(c.out), "--frames", c.frames};
     if (!*c.codec) args.push_back("--no-audio");
     CliRun run = runCli(args);
     ASSERT_EQ(run.status, 0) << run.err;

@@ -11,15 +11,10 @@
 
 namespace {
 
-CliRun render(const std::string& scene, const std::vector<std::string>& more) {
-  std::vector<std::string> args{"render", scene, "--plugin", VELTRANE_MODULE_PATH};
-  args.insert(args.end(), more.begin(), more.end());
-  return runCli(args);
-}
-
 TEST(RenderCommand, StillsAreUpright) {
   ScratchDirectory folder;
-  CliRun run = render(writeScene(folder, smallScene("gradient")), {"-o", folder.file("g.png")});
+  CliRun run =
+      runCli({"render", writeScene(folder, smallScene("gradient")), "-o", folder.file("g.png")});
   ASSERT_EQ(run.status, 0) << run.err;
   EXPECT_NE(run.out.find("wrote " + folder.file("g.png")), std::string::npos) << run.out;
   refhost::RgbaImage image = refhost::readImageFile(folder.file("g.png"));
@@ -41,15 +36,15 @@ TEST(RenderCommand, EveryOutputKindCarriesTheFramesAskedInOrder) {
   auto code = [](const refhost::RgbaImage& image) {
     return static_cast<int>(refhost::readCounterCode(image).value_or(9999));
   };
-  CliRun still = render(scene, {"-o", folder.file("f.exr"), "--frame", "5"});
+  CliRun still = runCli({"render", scene, "-o", folder.file("f.exr"), "--frame", "5"});
   ASSERT_EQ(still.status, 0) << still.err;
   EXPECT_EQ(code(refhost::readImageFile(folder.file("f.exr"))), 5);
   const std::pair<std::string, std::vector<std::string>> runs[] = {
       {"s_%04d.png", {"--frames", "1-29"}}, {"v.mkv", {"--frames", "1-29"}}, {"all.mkv", {}}};
   for (const auto& [output, frames] : runs) {
-    std::vector<std::string> options{"-o", folder.file(output)};
-    options.insert(options.end(), frames.begin(), frames.end());
-    CliRun run = render(scene, options);
+    std::vector<std::string> args{"render", scene, "-o", folder.file(output)};
+    args.insert(args.end(), frames.begin(), frames.end());
+    CliRun run = runCli(args);
     ASSERT_EQ(run.status, 0) << run.err;
     const std::string count = frames.empty() ? "30/30" : "29/29";
     for (const std::string& progress : {count + "  ", std::string(" fps "), std::string(" s left")})
@@ -70,8 +65,8 @@ TEST(RenderCommand, EveryOutputKindCarriesTheFramesAskedInOrder) {
 
 TEST(RenderCommand, TheShippedDemoSceneRenders) {
   ScratchDirectory folder;
-  CliRun run = render(std::string(VELTRANE_SOURCE_DIR) + "/docs/examples/demo.json",
-                      {"-o", folder.file("demo.png"), "--frame", "40", "--profile", "compat"});
+  CliRun run = runCli({"render", std::string(VELTRANE_SOURCE_DIR) + "/docs/examples/demo.json",
+                       "-o", folder.file("demo.png"), "--frame", "40", "--profile", "compat"});
   ASSERT_EQ(run.status, 0) << run.err;
   EXPECT_EQ(refhost::readImageFile(folder.file("demo.png")).width, 640);
 }
@@ -79,8 +74,8 @@ TEST(RenderCommand, TheShippedDemoSceneRenders) {
 // The bare-GL replica of `--floor` draws the effect's own picture (the bench stops when it does
 // not); every case gets its times.
 TEST(BenchCommand, ReportsEveryCaseWithItsFloor) {
-  CliRun run = runCli({"bench", "--plugin", VELTRANE_MODULE_PATH, "--sizes", "64x36,96x54",
-                       "--cuts", "1,3,8", "--repeat", "1", "--warmup", "0", "--floor", "--json"});
+  CliRun run = runCli({"bench", "--sizes", "64x36,96x54", "--cuts", "1,3,8", "--repeat", "1",
+                       "--warmup", "0", "--floor", "--json"});
   ASSERT_EQ(run.status, 0) << run.err;
   nlohmann::json rows = nlohmann::json::parse(run.out)["results"];
   ASSERT_EQ(rows.size(), 12u);  // 2 sizes x 3 cut counts x 2 input kinds
