@@ -1,4 +1,4 @@
-// Spawning the command line with redirected output.
+// Spawning the command line with redirected output, and the scene its tests share.
 #include "cli_runner.h"
 
 #include <fcntl.h>
@@ -8,7 +8,7 @@
 #include <unistd.h>
 
 #include <fstream>
-#include <sstream>
+#include <iterator>
 
 #include "support/temp_paths.h"
 
@@ -16,9 +16,7 @@ extern char** environ;
 
 std::string slurp(const std::string& path) {
   std::ifstream file(path);
-  std::stringstream text;
-  text << file.rdbuf();
-  return text.str();
+  return std::string(std::istreambuf_iterator<char>(file), {});
 }
 
 void writeText(const std::string& path, const std::string& text) {
@@ -39,17 +37,18 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin,
 
   std::vector<std::string> environment;
   for (char** entry = environ; *entry; ++entry) {
-    if (std::string(*entry).rfind("VELTRANE_PLUGIN=", 0) != 0) environment.push_back(*entry);
+    const std::string name = std::string(*entry).substr(0, std::string(*entry).find('='));
+    if (name != "VELTRANE_PLUGIN" && name != "DISPLAY" && name != "WAYLAND_DISPLAY")
+      environment.push_back(*entry);
   }
-  if (plugin) environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
-  std::vector<char*> envp;
-  for (std::string& entry : environment) envp.push_back(entry.data());
-  envp.push_back(nullptr);
+  environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
   std::vector<std::string> argStorage{VELTRANE_CLI_PATH};
   argStorage.insert(argStorage.end(), args.begin(), args.end());
-  std::vector<char*> argv;
+  std::vector<char*> argv, envp;
   for (std::string& arg : argStorage) argv.push_back(arg.data());
+  for (std::string& entry : environment) envp.push_back(entry.data());
   argv.push_back(nullptr);
+  envp.push_back(nullptr);
 
   CliRun run;
   pid_t pid = 0;
@@ -65,4 +64,22 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin,
   unlink(outPath);
   unlink(errPath);
   return run;
+}
+
+const char kLayerA[] = "aaaaaaaa-0000-4000-8000-000000000001";
+
+nlohmann::json smallScene(const std::string& pattern, int frames) {
+  return {{"width", 64},
+          {"height", 36},
+          {"fps", 25},
+          {"duration", frames},
+          {"source", {{"pattern", pattern}}},
+          {"layers", nlohmann::json::array({{{"guid", kLayerA}, {"name", "A"}}})},
+          {"params", {{"cutPosition_0", {28, 0}}, {"cutDirection_0", 0}, {"borderWidth", 0}}}};
+}
+
+std::string writeScene(const ScratchDirectory& folder, const nlohmann::json& scene) {
+  const std::string path = folder.file("scene.json");
+  writeText(path, scene.dump());
+  return path;
 }

@@ -56,24 +56,19 @@ std::map<std::string, std::string> snapshot(const std::string& folder) {
   return found;
 }
 
-// Runs `command` (render or interact) on a 64x36 scene of `frames` frames and a script of
+// Runs `command` (render or interact) on the small scene of `frames` frames and a script of
 // `events` pointer moves, with the options' values (every second item) named in `folder`.
 CliRun runOn(const std::string& command, int frames, int events,
              const std::vector<std::string>& options, const std::string& folder,
              const std::function<void(int)>& whileRunning = nullptr) {
   ScratchDirectory inputs;
-  writeText(inputs.file("scene.json"),
-            R"({"width": 64, "height": 36, "fps": 25, "source": {"pattern": "counter"}, "layers":)"
-            R"( [{"guid": "aaaaaaaa-0000-4000-8000-000000000001", "name": "A"}], "duration": )" +
-                std::to_string(frames) + "}");
   writeText(inputs.file("events.json"),
             json{{"events", std::vector<json>(events, {{"move", {10, 10}}})}}.dump());
-  std::vector<std::string> args{command, inputs.file("scene.json"), "--plugin",
-                                VELTRANE_MODULE_PATH};
+  std::vector<std::string> args{command, writeScene(inputs, smallScene("counter", frames))};
   if (command == "interact") args.insert(args.end(), {"--events", inputs.file("events.json")});
   for (std::size_t i = 0; i < options.size(); ++i)
     args.push_back(i % 2 ? folder + "/" + options[i] : options[i]);
-  return runCli(args, nullptr, whileRunning);
+  return runCli(args, VELTRANE_MODULE_PATH, whileRunning);
 }
 
 // What the command printed last, after its progress bar.
@@ -91,7 +86,8 @@ TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
   const std::string n(240, 'n'), full = ": cannot write: No space left on device";
   const Case cases[] = {
       {"render", {"-o", n + ".png"}, {n + ".png"}, 0, n + "\\.png" + full},  // near the name limit
-      {"render", {"-o", n + "%04d.png"}, {n + "0003.png"}, 5, n + "00(0[1-9]|[12].)\\.png" + full},
+      // Several writers race for the last free pages: any frame may be the first refused.
+      {"render", {"-o", n + "%04d.png"}, {n + "0003.png"}, 5, n + "00[0-2][0-9]\\.png" + full},
       {"render", {"-o", "s%d.png"}, {"s1.png", "s2.png/"}, 256, "s2\\.png: cannot replace it: .*"},
       {"render", {"-o", "v.mp4"}, {"v.mp4"}, 0, "v\\.mp4: cannot write video: .*space.*"},
       {"interact", {"-o", "r"}, {"r"}, 0, "r" + full},
@@ -111,16 +107,6 @@ TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
         << run.err;
     EXPECT_EQ(snapshot(disk.path()), before) << c.error;
   }
-}
-
-TEST(OutputWrites, AnOverlayFolderThatIsAFileIsOneLine) {
-  ScratchDirectory folder;
-  writeText(folder.file("f"), "");
-  CliRun run = runOn("interact", 1, 1, {"-o", "r.json", "--overlay", "f"}, folder.path());
-  EXPECT_EQ(run.status, 2);
-  EXPECT_EQ(run.err, "veltrane interact: option '--overlay' expects a folder, '" +
-                         folder.file("f") + "' is a file (see 'veltrane interact --help')\n");
-  EXPECT_EQ(folder.entries(), std::vector<std::string>{"f"});
 }
 
 // Sends the signal once the command has written into a temporary, and had a moment more.

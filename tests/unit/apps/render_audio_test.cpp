@@ -41,15 +41,10 @@ TEST(RenderAudio, VideoOutputsCarryTheRenderedFramesSound) {
                         {"pcm.mkv", "copied.mov", "0-24", "pcm_s16le", false},
                         {"aac.mp4", "silent.mp4", "10-40", "", false}};
   for (const Case& c : cases) {
-    const nlohmann::json scene = {{"width", 64},
-                                  {"height", 36},
-                                  {"fps", 25},
-                                  {"duration", 75},
-                                  {"source", {{"file", c.source}}}};
-    writeText(folder.file("scene.json"), scene.dump());
+    nlohmann::json scene = smallScene("bars", 75);
+    scene["source"] = {{"file", c.source}};
     std::vector<std::string> args{
-        "render", folder.file("scene.json"), "--plugin", VELTRANE_MODULE_PATH,
-        "-o",     folder.file(c.out),        "--frames", c.frames};
+        "render", writeScene(folder, scene), "-o", folder.file(c.out), "--frames", c.frames};
     if (!*c.codec) args.push_back("--no-audio");
     CliRun run = runCli(args);
     ASSERT_EQ(run.status, 0) << run.err;

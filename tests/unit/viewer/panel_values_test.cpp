@@ -70,12 +70,7 @@ TEST(PanelValues, KeyframeToggleAndEditsKeepOrDropAnimation) {
     float staticValue;              // after the toggle, when no key is left
   } cases[] = {
       {"static gets its first key", width, 3, KeyState::Static, {{3, 2}}, 2},
-      {"between keys gets the shown value",
-       animated,
-       5,
-       KeyState::Animated,
-       {{0, 0}, {5, 50}, {10, 100}},
-       2},
+      {"adds the shown value", animated, 5, KeyState::Animated, {{0, 0}, {5, 50}, {10, 100}}, 2},
       {"a key is removed", animated, 10, KeyState::KeyHere, {{0, 0}}, 2},
       {"the last key leaves its value static", oneKey, 4, KeyState::KeyHere, {}, 7},
   };

@@ -5,7 +5,6 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <functional>
 #include <limits>
 
 namespace veltrane_viewer {
@@ -19,36 +18,19 @@ void expectSame(Point2 a, Point2 b, double tolerance, const char* what) {
   EXPECT_NEAR(a.y, b.y, tolerance) << what;
 }
 
-TEST(ViewMapping, ProjectionAndPointerConversionAgree) {
-  const std::pair<const char*, std::function<void(ViewMapping&)>> cases[] = {
-      {"fitted", [](ViewMapping&) {}},
-      {"actual pixels", [](ViewMapping& v) { v.showActualPixels(); }},
-      {"zoomed in about a point",
-       [](ViewMapping& v) {
-         v.zoomAbout({612.5, 233}, 3.7);
-       }},
-      {"zoomed out and panned",
-       [](ViewMapping& v) {
-         v.zoomAbout({10, 600}, 0.2);
-         v.panBy(-41.5, 17);
-       }},
-  };
-  for (const auto& [name, arrange] : cases) {
-    ViewMapping view(640, 360);
-    view.setArea({0, 20, 600, 640});
-    arrange(view);
-    refhost::Matrix4 m = view.projection(kFbWidth, kFbHeight);
-    for (Point2 corner : {Point2{0, 0}, Point2{640, 360}, Point2{211.25, 97.5}}) {
-      Point2 pixel = view.toPixel(corner);
-      expectSame(view.toCorner(pixel), corner, 1e-9, name);
-      // Column-major: clip = m * (x, y, 0, 1); GL rows count from the bottom.
-      Point2 clip{m[0] * corner.x + m[4] * corner.y + m[12],
-                  m[1] * corner.x + m[5] * corner.y + m[13]};
-      expectSame({(clip.x + 1) / 2 * kFbWidth, kFbHeight - (clip.y + 1) / 2 * kFbHeight}, pixel,
-                 1e-3, name);
-    }
-    EXPECT_DOUBLE_EQ(view.viewScale(), 1 / view.zoom()) << name;
+// Pointer conversion goes both ways, and the projection agrees with it, in the view as it is.
+void expectProjectionAgrees(const ViewMapping& view, const char* state) {
+  refhost::Matrix4 m = view.projection(kFbWidth, kFbHeight);
+  for (Point2 corner : {Point2{0, 0}, Point2{640, 360}, Point2{211.25, 97.5}}) {
+    Point2 pixel = view.toPixel(corner);
+    expectSame(view.toCorner(pixel), corner, 1e-9, state);
+    // Column-major: clip = m * (x, y, 0, 1); GL rows count from the bottom.
+    Point2 clip{m[0] * corner.x + m[4] * corner.y + m[12],
+                m[1] * corner.x + m[5] * corner.y + m[13]};
+    expectSame({(clip.x + 1) / 2 * kFbWidth, kFbHeight - (clip.y + 1) / 2 * kFbHeight}, pixel, 1e-3,
+               state);
   }
+  EXPECT_DOUBLE_EQ(view.viewScale(), 1 / view.zoom()) << state;
 }
 
 TEST(ViewMapping, FitShowsTheWholeFrameCentredAndRefitsWithTheArea) {
@@ -65,6 +47,7 @@ TEST(ViewMapping, FitShowsTheWholeFrameCentredAndRefitsWithTheArea) {
                {c.area.x + c.area.width / 2, c.area.y + c.area.height / 2}, 1e-9, "centred");
     // The corner-space origin is the frame's bottom-left corner, y up.
     expectSame(view.toCorner({frame.x, frame.y + frame.height}), {0, 0}, 1e-9, "origin");
+    expectProjectionAgrees(view, "fitted");
   }
   ViewMapping view(640, 360);
   view.setArea({0, 0, 640, 360});
@@ -73,22 +56,30 @@ TEST(ViewMapping, FitShowsTheWholeFrameCentredAndRefitsWithTheArea) {
   view.showActualPixels();
   EXPECT_EQ(view.frameRect().x, 320);  // whole pixels, one frame pixel each
   EXPECT_EQ(view.frameRect().y, 180);
+  expectProjectionAgrees(view, "actual pixels");
 }
 
-TEST(ViewMapping, ZoomKeepsThePivotResizingKeepsTheCentreEventsRound) {
+TEST(ViewMapping, ZoomKeepsThePivotPanMovesResizingKeepsTheCentreEventsRound) {
   ViewMapping view(320, 180);
-  view.setArea({0, 0, 800, 600});
-  Point2 pivot{123, 456};
+  view.setArea({0, 20, 800, 600});
+  Point2 pivot{612.5, 233};
   Point2 under = view.toCorner(pivot);
+  view.zoomAbout(pivot, 3.7);
+  expectSame(view.toCorner(pivot), under, 1e-9, "pivot");
+  expectProjectionAgrees(view, "zoomed in about a point");
   view.zoomAbout(pivot, 1e6);
   EXPECT_DOUBLE_EQ(view.zoom(), ViewMapping::kLargestZoom);
   expectSame(view.toCorner(pivot), under, 1e-9, "pivot");
   view.zoomAbout(pivot, std::numeric_limits<double>::quiet_NaN());
   view.zoomAbout(pivot, 1e-9);
   EXPECT_DOUBLE_EQ(view.zoom(), ViewMapping::kSmallestZoom);
-  Point2 centre = view.toCorner({400, 300});
+  view.panBy(-41.5, 17);
+  expectSame(view.toCorner({pivot.x - 41.5, pivot.y + 17}), under, 1e-9, "panned");
+  expectProjectionAgrees(view, "zoomed out and panned");
+  Point2 centre = view.toCorner({400, 320});
   view.setArea({100, 50, 400, 200});
   expectSame(view.toCorner({300, 150}), centre, 1e-9, "centre");
+  expectProjectionAgrees(view, "resized");
   // Events carry the nearest whole frame pixel, whatever the pointer's position.
   EventPosition near = eventPosition({10.5, -3.6}), far = eventPosition({1e30, std::nan("")});
   EXPECT_EQ(std::make_pair(near.x, near.y), std::make_pair(11, -4));

@@ -7,8 +7,8 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <chrono>
+#include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <stdexcept>
@@ -18,39 +18,19 @@
 
 extern char** environ;
 
-namespace {
-
-// The null-terminated array of pointers posix_spawn takes.
-std::vector<char*> pointers(std::vector<std::string>& texts) {
-  std::vector<char*> out;
-  for (std::string& text : texts) out.push_back(text.data());
-  out.push_back(nullptr);
-  return out;
-}
-
-}  // namespace
-
-ChildProcess::ChildProcess(const std::vector<std::string>& argv,
-                           const std::vector<std::string>& environment, const std::string& outPath,
+ChildProcess::ChildProcess(const std::vector<std::string>& argv, const std::string& outPath,
                            const std::string& errPath) {
-  std::vector<std::string> entries, args = argv;
-  for (char** entry = environ; *entry; ++entry) {
-    std::string name = std::string(*entry).substr(0, std::string(*entry).find('=') + 1);
-    if (std::none_of(environment.begin(), environment.end(),
-                     [&](const std::string& change) { return change.rfind(name, 0) == 0; }))
-      entries.push_back(*entry);
-  }
-  for (const std::string& change : environment) {
-    if (change.back() != '=') entries.push_back(change);
-  }
-  std::vector<char*> argp = pointers(args), envp = pointers(entries);
+  std::vector<std::string> args = argv;
+  std::vector<char*> argp;
+  for (std::string& arg : args) argp.push_back(arg.data());
+  argp.push_back(nullptr);
   posix_spawn_file_actions_t actions;
   posix_spawn_file_actions_init(&actions);
   posix_spawn_file_actions_addopen(&actions, 1, outPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC,
                                    0644);
   posix_spawn_file_actions_addopen(&actions, 2, errPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC,
                                    0644);
-  int failed = posix_spawnp(&pid_, argp[0], &actions, nullptr, argp.data(), envp.data());
+  int failed = posix_spawnp(&pid_, argp[0], &actions, nullptr, argp.data(), environ);
   posix_spawn_file_actions_destroy(&actions);
   if (failed) throw std::runtime_error("cannot start " + argv[0] + ": " + std::strerror(failed));
 }
@@ -87,8 +67,7 @@ XSession::XSession() {
   // Xvfb picks a free display and writes its number to the pipe once it takes connections.
   server_ = std::make_unique<ChildProcess>(
       std::vector<std::string>{"Xvfb", "-displayfd", std::to_string(pipe_[1]), "-screen", "0",
-                               "1600x1000x24", "-nolisten", "tcp"},
-      std::vector<std::string>{});
+                               "1600x1000x24", "-nolisten", "tcp"});
   close(pipe_[1]);
   std::string number;
   char c = 0;
@@ -96,13 +75,11 @@ XSession::XSession() {
   close(pipe_[0]);
   if (number.empty())
     throw std::runtime_error("Xvfb did not start (is the xvfb package installed?)");
-  display_ = ":" + number;
+  setenv("DISPLAY", (":" + number).c_str(), 1);
 }
 
-XSession::~XSession() = default;
-
 void XSession::run(const std::vector<std::string>& argv) const {
-  ChildProcess tool(argv, {environment()});
+  ChildProcess tool(argv);
   if (tool.wait(30) != 0) throw std::runtime_error(argv[0] + " failed");
 }
 

@@ -14,9 +14,9 @@
 // A program run with posix_spawn, its output going to files; killed if still running at the end.
 class ChildProcess {
  public:
-  // `environment` entries ("NAME=value") replace the parent's; "NAME=" alone removes NAME.
-  ChildProcess(const std::vector<std::string>& argv, const std::vector<std::string>& environment,
-               const std::string& outPath = "/dev/null", const std::string& errPath = "/dev/null");
+  explicit ChildProcess(const std::vector<std::string>& argv,
+                        const std::string& outPath = "/dev/null",
+                        const std::string& errPath = "/dev/null");
   ~ChildProcess();
   ChildProcess(const ChildProcess&) = delete;
   ChildProcess& operator=(const ChildProcess&) = delete;
@@ -27,19 +27,17 @@ class ChildProcess {
   pid_t pid_ = -1;
 };
 
+// Starts Xvfb on a free display, 1600x1000x24, and makes it this process's DISPLAY, so that
+// every program started afterwards shows its windows there.
 class XSession {
  public:
-  XSession();  // starts Xvfb on a free display, 1600x1000x24
-  ~XSession();
-  const std::string& display() const { return display_; }
-  std::string environment() const { return "DISPLAY=" + display_; }
-  // Runs the tool on this display and waits; throws when it fails.
+  XSession();
+  // Runs the tool and waits; throws when it fails.
   void run(const std::vector<std::string>& argv) const;
   refhost::RgbaImage screenshot(const std::string& scratchDirectory) const;
 
  private:
   std::unique_ptr<ChildProcess> server_;
-  std::string display_;
 };
 
 // Polls until the condition holds; false after `seconds`.
