@@ -1,15 +1,12 @@
 // Spawning the command line with redirected output, and the scene its tests share.
 #include "cli_runner.h"
 
-#include <fcntl.h>
-#include <spawn.h>
-#include <stdlib.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <fstream>
 #include <iterator>
 
+#include "support/child_process.h"
 #include "support/temp_paths.h"
 
 extern char** environ;
@@ -26,15 +23,6 @@ void writeText(const std::string& path, const std::string& text) {
 
 CliRun runCli(const std::vector<std::string>& args, const char* plugin,
               const std::function<void(int)>& whileRunning) {
-  const std::string outFile = testsupport::makeTempFile("veltrane_cli_out_");
-  const std::string errFile = testsupport::makeTempFile("veltrane_cli_err_");
-  const char* outPath = outFile.c_str();
-  const char* errPath = errFile.c_str();
-  posix_spawn_file_actions_t actions;
-  posix_spawn_file_actions_init(&actions);
-  posix_spawn_file_actions_addopen(&actions, 1, outPath, O_WRONLY | O_TRUNC, 0);
-  posix_spawn_file_actions_addopen(&actions, 2, errPath, O_WRONLY | O_TRUNC, 0);
-
   std::vector<std::string> environment;
   for (char** entry = environ; *entry; ++entry) {
     const std::string name = std::string(*entry).substr(0, std::string(*entry).find('='));
@@ -42,27 +30,20 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin,
       environment.push_back(*entry);
   }
   environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
-  std::vector<std::string> argStorage{VELTRANE_CLI_PATH};
-  argStorage.insert(argStorage.end(), args.begin(), args.end());
-  std::vector<char*> argv, envp;
-  for (std::string& arg : argStorage) argv.push_back(arg.data());
-  for (std::string& entry : environment) envp.push_back(entry.data());
-  argv.push_back(nullptr);
-  envp.push_back(nullptr);
-
+  std::vector<std::string> argv{VELTRANE_CLI_PATH};
+  argv.insert(argv.end(), args.begin(), args.end());
+  const std::string outPath = testsupport::makeTempFile("veltrane_cli_out_");
+  const std::string errPath = testsupport::makeTempFile("veltrane_cli_err_");
   CliRun run;
-  pid_t pid = 0;
-  if (posix_spawn(&pid, VELTRANE_CLI_PATH, &actions, nullptr, argv.data(), envp.data()) == 0) {
-    if (whileRunning) whileRunning(pid);
-    int status = 0;
-    waitpid(pid, &status, 0);
-    run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  {
+    testsupport::ChildProcess cli(argv, outPath, errPath, &environment);
+    if (whileRunning) whileRunning(cli.pid());
+    run.status = cli.wait(600);
   }
-  posix_spawn_file_actions_destroy(&actions);
   run.out = slurp(outPath);
   run.err = slurp(errPath);
-  unlink(outPath);
-  unlink(errPath);
+  unlink(outPath.c_str());
+  unlink(errPath.c_str());
   return run;
 }
 

@@ -1,65 +1,14 @@
-// Xvfb, child processes and screenshots for the window tests.
+// Xvfb and screenshots for the window tests.
 #include "x_session.h"
 
-#include <fcntl.h>
-#include <signal.h>
-#include <spawn.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
-#include <chrono>
 #include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <stdexcept>
-#include <thread>
 
 #include "refhost/image_files.h"
-
-extern char** environ;
-
-ChildProcess::ChildProcess(const std::vector<std::string>& argv, const std::string& outPath,
-                           const std::string& errPath) {
-  std::vector<std::string> args = argv;
-  std::vector<char*> argp;
-  for (std::string& arg : args) argp.push_back(arg.data());
-  argp.push_back(nullptr);
-  posix_spawn_file_actions_t actions;
-  posix_spawn_file_actions_init(&actions);
-  posix_spawn_file_actions_addopen(&actions, 1, outPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC,
-                                   0644);
-  posix_spawn_file_actions_addopen(&actions, 2, errPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC,
-                                   0644);
-  int failed = posix_spawnp(&pid_, argp[0], &actions, nullptr, argp.data(), environ);
-  posix_spawn_file_actions_destroy(&actions);
-  if (failed) throw std::runtime_error("cannot start " + argv[0] + ": " + std::strerror(failed));
-}
-
-ChildProcess::~ChildProcess() {
-  if (pid_ <= 0) return;
-  kill(pid_, SIGTERM);
-  if (wait(5) == -1 && pid_ > 0) {
-    kill(pid_, SIGKILL);
-    waitpid(pid_, nullptr, 0);
-  }
-}
-
-int ChildProcess::wait(double seconds) {
-  int status = 0;
-  bool exited = waitUntil([&] { return waitpid(pid_, &status, WNOHANG) == pid_; }, seconds);
-  if (!exited) return -1;
-  pid_ = -1;
-  return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-}
-
-bool waitUntil(const std::function<bool()>& condition, double seconds) {
-  auto end = std::chrono::steady_clock::now() + std::chrono::duration<double>(seconds);
-  while (!condition()) {
-    if (std::chrono::steady_clock::now() > end) return false;
-    std::this_thread::sleep_for(std::chrono::milliseconds(50));
-  }
-  return true;
-}
 
 XSession::XSession() {
   int pipe_[2];
