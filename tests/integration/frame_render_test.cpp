@@ -51,6 +51,16 @@ TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
   EXPECT_EQ(fixture.pixel(pixels, 50, 4), (Rgba{255, 255, 0, 255}));  // +x -y: input 3
   EXPECT_EQ(fixture.pixel(pixels, 8, 4), kGreen);                     // -x -y: input 4
   EXPECT_EQ(fixture.pixel(pixels, 8, 30), kBlue);                     // -x +y: input 1
+
+  // Pixels twice as wide as high stretch positions across: a Local cut at x = 8 runs at
+  // x = 16, column 48, so column 44 is left of it.
+  host.setValue("cutType", ParamValue::ofInt(0));
+  host.setValue("numberOfCuts", ParamValue::ofInt(1));
+  setCut(host, 0, 8.0f, 0.0f, 0.0f);
+  fixture.pixelAspect = 2.0f;
+  pixels = fixture.render(kRed);
+  EXPECT_EQ(fixture.pixel(pixels, 44, 18), kBlue);
+  EXPECT_EQ(fixture.pixel(pixels, 52, 18), kRed);
 }
 
 // Coverage c = clamp(h - d + 0.5, 0, 1) x clamp(h, 0, 1) of the border colour (premultiplied by
@@ -127,6 +137,11 @@ TEST(FrameRender, InputPlacementMovesAndScalesThePicture) {
     EXPECT_EQ(fixture.pixel(pixels, x, y), kRed) << x << "," << y;
   for (const auto& [x, y] : {std::pair{30, 18}, {12, 18}, {48, 7}, {48, 29}})
     EXPECT_EQ(fixture.pixel(pixels, x, y), kClear) << x << "," << y;
+  // Pixels twice as wide as high halve the move across: x from 24 to 56.
+  fixture.pixelAspect = 2.0f;
+  const std::vector<uint8_t> wide = fixture.render(kRed);
+  EXPECT_EQ(fixture.pixel(wide, 26, 18), kRed);
+  EXPECT_EQ(fixture.pixel(wide, 58, 18), kClear);
 }
 
 TEST(FrameRender, CoreAndCompatibilityProfilesDrawTheSameImage) {

@@ -100,7 +100,8 @@ class RenderFixture {
     host_->setSourceFrames(sourceFrames ? sourceFrames : solidSource(sourceColour));
     std::vector<uint8_t> pixels;
     {
-      refhost::RenderFrame target(*host_, {width_, height_, 25.0, 1.0f, 100, kOwnLayer}, frame);
+      refhost::RenderFrame target(*host_, {width_, height_, 25.0, pixelAspect, 100, kOwnLayer},
+                                  frame);
       host_->setRenderContext(&target.context());
       EXPECT_EQ(host_->send(12), 1);
       glClearColor(0.25f, 0.5f, 0.75f, 1.0f);
@@ -136,6 +137,7 @@ class RenderFixture {
   }
 
   int32_t width() const { return width_; }
+  float pixelAspect = 1.0f;  // of the frames rendered
   int32_t height() const { return height_; }
 
  private:

@@ -167,10 +167,10 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
     ASSERT_TRUE(host().undo());
   }
 
-  // The rotation handle sits above the picture's centre, half a handle beyond its circle.
+  // The rotation handle sits above the picture's centre, half a handle beyond its circle; the
+  // press finds it without a hover before it.
   host().setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
   host().setValue("inputFrameTranslation0", ParamValue::ofPoint(0.0f, 0.0f));
-  viewer().move(80, 77, false);
   ASSERT_EQ(viewer().press(80, 77), 1);
   for (int step = 1; step <= 6; ++step) {
     const float theta = 15.0f * static_cast<float>(step) * 3.1415927f / 180.0f;
@@ -203,6 +203,8 @@ TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
   EXPECT_EQ(viewer().key(1008, kEscape), 1);
   EXPECT_EQ(host().send(1012), 0);
   EXPECT_EQ(viewer().key(1008, kEscape), 0);
+  viewer().drag(120, 20, 200, 20);  // released outside the frame: over no input
+  EXPECT_EQ(host().send(1012), 0);
 
   // A host that keeps a pressed control's hover drops the selection after every release.
   host().setHostId(3000);

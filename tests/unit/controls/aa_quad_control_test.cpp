@@ -63,6 +63,7 @@ TEST(AAQuadControl, PartAndCursorUnderThePointer) {
       {upright, 0.0f, 0, {200, 150}, ControlPart::None, 0},
       {upright, 0.0f, 1, {200, 150}, ControlPart::Inside, 3},
       {upright, 0.0f, 1, {50, 50}, ControlPart::None, 0},
+      {upright, 0.0f, 1, {350, 150}, ControlPart::None, 0},
       // A quarter turn carries the x1 edge's middle below the centre (200, 150).
       {upright, kQuarterTurn, 0, {200, 50}, ControlPart::EdgeX1, 6},
       {upright, kQuarterTurn, 0, {250, 150}, ControlPart::EdgeY1, 8},

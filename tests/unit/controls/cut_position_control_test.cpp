@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <utility>
 #include <vector>
 
 #include "refhost/host.h"
@@ -59,6 +60,16 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
     const std::vector<int32_t> cursors =
         c.cursor < 0 ? std::vector<int32_t>{} : std::vector{c.cursor};
     EXPECT_EQ(host.cursorShapes(), cursors) << c.pointer.x << "," << c.pointer.y;
+  }
+  // Across a horizontal segment the reach follows the vertical view scale.
+  for (const auto& [y, hot] : {std::pair{107.0f, true}, std::pair{108.0f, false}}) {
+    refhost::Host host;
+    PointParam param;
+    SplitScreenCutPositionControl control = controlFor(param);
+    EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, {300.0f, 100.0f},
+                           {200.0f, y}, {2.0f, 2.0f}, 0.0f, 0),
+              hot)
+        << y;
   }
   // A zero-length segment has no inside at all.
   refhost::Host host;

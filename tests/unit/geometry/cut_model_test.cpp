@@ -109,6 +109,8 @@ TEST(Angles, WrapIntoRangeKeepsBothEndsOfTheRange) {
                {kPi, -kPi, kPi, kPi}};
   for (const auto& c : cases)
     EXPECT_NEAR(wrapIntoRange(c.alpha, c.start, c.end), c.wrapped, 1e-5f) << c.alpha;
+  // Some 4,800 turns away: more than the turns taken one by one.
+  EXPECT_LE(std::fabs(wrapIntoRange(3e4f, -kPi, kPi)), kPi);
 }
 
 TEST_F(CutModel, PixelAspectStretchesPositionAndDirection) {

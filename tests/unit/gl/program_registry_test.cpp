@@ -49,7 +49,7 @@ using ProgramRegistry = testsupport::GlHostTest;
 
 // A build prints the compile logs only when verbose, each once: a warning alone, or every log up
 // to a failed compile, which throws type 0 and leaves the registry as it was. A failed link
-// throws type 1 after the unlinked program was added with its log.
+// throws type 1 after the unlinked program was added with its log, which it prints.
 TEST_F(ProgramRegistry, BuildsPrintLogsWhenVerboseAndThrowTheFailuresType) {
   const std::string warning = compileLog(GL_VERTEX_SHADER, kWarningVertex);
   const std::string broken = compileLog(GL_FRAGMENT_SHADER, kBrokenFragment);
@@ -66,7 +66,7 @@ TEST_F(ProgramRegistry, BuildsPrintLogsWhenVerboseAndThrowTheFailuresType) {
       {kWarningVertex, kFragment, false, "", -1, ""},
       {kWarningVertex, kBrokenFragment, true, warning + "\n" + broken, GLSLErrorType_ShaderCompile,
        "GLSLErrorType_ShaderCompile - The Shader failed to compile."},
-      {kVertex, kUnresolvedFragment, false, "", GLSLErrorType_ShaderLink,
+      {kVertex, kUnresolvedFragment, true, "", GLSLErrorType_ShaderLink,
        "GLSLErrorType_ShaderLink - The shader program failed to link."},
   };
   for (const auto& c : cases) {
@@ -81,7 +81,7 @@ TEST_F(ProgramRegistry, BuildsPrintLogsWhenVerboseAndThrowTheFailuresType) {
       type = e.type();
       error = e.what();
     }
-    EXPECT_EQ(testing::internal::GetCapturedStdout(), c.printed) << c.error;
+    const std::string printed = testing::internal::GetCapturedStdout();
     EXPECT_EQ(type, c.type);
     EXPECT_EQ(error, c.error);
     // Only a failed compile adds nothing; a failed link adds its program with the log.
@@ -91,6 +91,7 @@ TEST_F(ProgramRegistry, BuildsPrintLogsWhenVerboseAndThrowTheFailuresType) {
     const bool linked = c.type != GLSLErrorType_ShaderLink;
     EXPECT_EQ(registry.program(count - 1).linked, linked);
     EXPECT_EQ(registry.program(count - 1).log.empty(), linked);
+    EXPECT_EQ(printed, linked ? c.printed : registry.program(count - 1).log) << c.error;
     EXPECT_FALSE(registry.linkProgram("no such program", false));
   }
   forgetCompileErrors(broken);
