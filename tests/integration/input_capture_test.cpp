@@ -104,7 +104,7 @@ TEST(InputCapture, LayersAreAlignedOnlyWhenTheirPlacementDiffers) {
   host.clearCallLog();
   const std::vector<uint8_t> pixels = fixture.render(kRed);
   EXPECT_EQ(calls(host, "AllocateTexture"), 3u);
-  EXPECT_EQ(calls(host, "ReleaseTexture"), 4u);  // both targets, the aligned copy, the frame
+  EXPECT_EQ(calls(host, "ReleaseTexture"), 4u);    // both targets, the aligned copy, the frame
   EXPECT_EQ(fixture.pixel(pixels, 0, 0), kGreen);  // its first and last rows and columns
   EXPECT_EQ(fixture.pixel(pixels, 31, 17), kGreen);
   EXPECT_EQ(fixture.pixel(pixels, 8, 30), kClear);  // above it, still in input 1's region

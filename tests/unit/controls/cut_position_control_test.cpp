@@ -66,8 +66,8 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
     refhost::Host host;
     PointParam param;
     SplitScreenCutPositionControl control = controlFor(param);
-    EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, {300.0f, 100.0f},
-                           {200.0f, y}, {2.0f, 2.0f}, 0.0f, 0),
+    EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, {300.0f, 100.0f}, {200.0f, y},
+                           {2.0f, 2.0f}, 0.0f, 0),
               hot)
         << y;
   }

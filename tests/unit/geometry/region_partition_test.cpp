@@ -71,8 +71,8 @@ TEST(RegionPartition, InputsShownAcrossLayouts) {
 // passes by is never reached, however near the lines of its edges run.
 TEST(RegionPartition, ACutReachesOnlyTheRegionsItsRayEnters) {
   Region corner;
-  corner.triangles.push_back({{RegionVertex{0, 0, 0, 0}, RegionVertex{10, 0, 0, 0},
-                               RegionVertex{0, 10, 0, 0}}});
+  corner.triangles.push_back(
+      {{RegionVertex{0, 0, 0, 0}, RegionVertex{10, 0, 0, 0}, RegionVertex{0, 10, 0, 0}}});
   EXPECT_EQ(regionReach(corner, makeCut(1, -5, 5, 90)), 25.0f);  // enters at (0, 5)
   EXPECT_EQ(regionReach(corner, makeCut(1, -5, 20, 90)), kFloatMax);
 }
