@@ -92,6 +92,18 @@ TEST(FrameRender, BorderCoverageFollowsTheDistanceToTheCut) {
   }
 }
 
+// With no cut to read (a host may store any count) the output is the source, pixel for pixel.
+TEST(FrameRender, WithoutCutsTheOutputIsTheSource) {
+  RenderFixture fixture;
+  fixture.host().setValue("numberOfCuts", ParamValue::ofInt(0));
+  const refhost::FrameSource ramp = [](int32_t, int32_t width, int32_t height) {
+    std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
+    for (size_t i = 0; i < pixels.size(); ++i) pixels[i] = static_cast<uint8_t>(i * 7 % 251);
+    return pixels;
+  };
+  EXPECT_EQ(fixture.render(kRed, 10, ramp), ramp(10, fixture.width(), fixture.height()));
+}
+
 TEST(FrameRender, ViewCutRegionsTintsARampOfGreys) {
   RenderFixture fixture;
   refhost::Host& host = fixture.host();
