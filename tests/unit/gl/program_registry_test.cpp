@@ -1,5 +1,5 @@
 // The program registry on Mesa: build, link, failures and their printed logs, name order and
-// deletion, uniform lookup and setting, attribute binding.
+// deletion, and whose uniforms are looked up. (Attributes and uniform setting show in the draws.)
 #include <gtest/gtest.h>
 
 #include <string>
@@ -24,9 +24,8 @@ const std::string kFragment =
     "#version 410\nin vec2 fragTexCoord;\nuniform vec4 onlyFirst;\n"
     "layout(location = 0) out vec4 colour;\n"
     "void main() { colour = onlyFirst + vec4(fragTexCoord, 0.0, 0.0); }\n";
-const std::string kOtherFragment =
-    "#version 410\nuniform vec4 onlySecond;\nlayout(location = 0) out vec4 colour;\n"
-    "void main() { colour = onlySecond; }\n";
+const std::string kPlainFragment =
+    "#version 410\nlayout(location = 0) out vec4 colour;\nvoid main() { colour = vec4(1.0); }\n";
 const std::string kBrokenFragment =
     "#version 410\nlayout(location = 0) out vec4 colour;\nvoid main() { colour = vec4(1.0) +; }\n";
 // Compiles, but the declared function has no body anywhere: the link fails.
@@ -101,9 +100,10 @@ TEST_F(ProgramRegistry, NamesAreKeptInByteOrderLookedUpAndDeletedWithTheRegistry
   std::vector<GLuint> ids;
   {
     EffectData registry;
-    for (const char* name : {"b", "a", "B", "ab"}) {
-      registry.addProgram(kVertex, kFragment, false, name, true, true);
-    }
+    // Only the first program has the uniform.
+    for (const std::string name : {"b", "a", "B", "ab"})
+      registry.addProgram(kVertex, name == "b" ? kFragment : kPlainFragment, false, name, true,
+                          true);
     for (int index = 0; index < 4; ++index) ids.push_back(registry.program(index).id);
     const std::vector<std::pair<std::string, int>> expected = {
         {"B", 2}, {"a", 1}, {"ab", 3}, {"b", 0}};
@@ -117,7 +117,9 @@ TEST_F(ProgramRegistry, NamesAreKeptInByteOrderLookedUpAndDeletedWithTheRegistry
     EXPECT_EQ(registry.programId("c"), -1);
 
     EXPECT_EQ(registry.currentProgramIndex(), -1);
+    EXPECT_NE(registry.uniformLocation("onlyFirst"), -1) << "none in use: program zero's";
     registry.useProgram("a");
+    EXPECT_EQ(registry.uniformLocation("onlyFirst"), -1);
     registry.useProgram("c");
     registry.useProgramAt(4);
     EXPECT_EQ(registry.currentProgramIndex(), 1) << "unknown names and indices change nothing";
@@ -125,120 +127,6 @@ TEST_F(ProgramRegistry, NamesAreKeptInByteOrderLookedUpAndDeletedWithTheRegistry
     EXPECT_EQ(registry.currentProgramIndex(), -1);
   }
   for (GLuint id : ids) EXPECT_FALSE(glIsProgram(id)) << id;
-}
-
-TEST_F(ProgramRegistry, UniformsOfAnUnregisteredProgramAreLookedUpInProgramZero) {
-  EffectData registry;
-  EXPECT_EQ(registry.uniformLocation("onlyFirst"), -1) << "empty registry";
-  registry.addProgram(kVertex, kFragment, false, "first", true, true);
-  registry.addProgram(kVertex, kOtherFragment, false, "second", true, true);
-  EffectData outsider;
-  outsider.addProgram(kVertex, kOtherFragment, false, "outside", true, true);
-
-  outsider.useProgramAt(0);
-  EXPECT_EQ(registry.uniformLocation("onlyFirst"),
-            glGetUniformLocation(registry.program(0).id, "onlyFirst"));
-  EXPECT_NE(registry.uniformLocation("onlyFirst"), -1);
-  EXPECT_EQ(registry.uniformLocation("onlySecond"), -1);
-  registry.useProgramAt(1);
-  EXPECT_NE(registry.uniformLocation("onlySecond"), -1);
-  EXPECT_EQ(registry.uniformLocation("onlyFirst"), -1);
-  registry.releaseProgram();
-}
-
-TEST_F(ProgramRegistry, MatricesAreSetForDimensionsTwoToFourOnly) {
-  EffectData registry;
-  registry.addProgram(kVertex,
-                      "#version 410\nuniform mat2 m2;\nuniform mat3 m3;\nuniform mat4 m4;\n"
-                      "layout(location = 0) out vec4 colour;\n"
-                      "void main() { colour = vec4(m2[0], m3[0].xy) + m4[0]; }\n",
-                      false, "matrices", true, true);
-  registry.useProgram("matrices");
-  const float values[16] = {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
-  const float zeros[16] = {};
-  const struct {
-    const char* uniform;
-    int dimension;
-    bool transpose;
-    std::vector<float> expected;  // column-major read-back
-  } cases[] = {
-      {"m2", 2, false, {1, 2, 3, 4}},
-      {"m3", 3, true, {1, 4, 7, 2, 5, 8, 3, 6, 9}},
-      {"m4", 4, false, {1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16}},
-  };
-  for (const auto& c : cases) {
-    const GLint location = registry.uniformLocation(c.uniform);
-    registry.setUniformMatrix(location, c.dimension, 1, c.transpose, values);
-    registry.setUniformMatrix(location, 5, 1, false, zeros);  // sets nothing
-    registry.setUniformMatrix(location, 1, 1, false, zeros);
-    std::vector<float> read(c.expected.size());
-    glGetUniformfv(registry.program(0).id, location, read.data());
-    EXPECT_EQ(read, c.expected) << c.uniform;
-  }
-  registry.releaseProgram();
-}
-
-TEST_F(ProgramRegistry, AttributeLocationsFollowTheBuildOperation) {
-  // One vertex stage per naming: every attribute role is declared and used.
-  const auto vertex = [](const std::string& p) {
-    return "#version 410\nin vec4 " + p + "Position;\nin vec2 " + p + "TexCoord;\nin vec2 " + p +
-           "TexCoord0;\nin vec2 " + p + "TexCoord1;\nout vec2 fragTexCoord;\nvoid main() {\n" +
-           "  fragTexCoord = " + p + "TexCoord + " + p + "TexCoord0 + " + p + "TexCoord1;\n" +
-           "  gl_Position = " + p + "Position;\n}\n";
-  };
-  // The geometry case passes the texture coordinate on under its own name, so that it stays
-  // active and keeps its location.
-  const std::string geometry =
-      "#version 410\nlayout(triangles) in;\nlayout(triangle_strip, max_vertices = 3) out;\n"
-      "in vec2 fragTexCoord[];\nout vec2 passedTexCoord;\nvoid main() {\n"
-      "  for (int i = 0; i < 3; ++i) {\n    passedTexCoord = fragTexCoord[i];\n"
-      "    gl_Position = gl_in[i].gl_Position;\n    EmitVertex();\n  }\n}\n";
-  const auto fragment = [](const char* input) {
-    return std::string("#version 410\nin vec2 ") + input +
-           ";\nlayout(location = 0) out vec4 colour;\nvoid main() { colour = vec4(" + input +
-           ", 0.0, 1.0); }\n";
-  };
-  enum Build { WithTexCoord, WithoutTexCoord, Dual, Geometry };
-  const int kFree = -2;  // any location the registry did not fix
-  const struct {
-    Build build;
-    bool sourceNames;
-    int position, texCoord, texCoord0, texCoord1;
-  } cases[] = {
-      {WithTexCoord, true, 0, 8, kFree, kFree},
-      {WithoutTexCoord, true, 0, kFree, kFree, kFree},
-      {WithTexCoord, false, 0, 8, kFree, kFree},
-      {Dual, true, 0, kFree, 8, 9},
-      {Dual, false, 0, kFree, 8, 9},
-      {Geometry, false, 0, 8, kFree, kFree},
-  };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(testing::Message() << "build " << c.build << " source names " << c.sourceNames);
-    EffectData registry;
-    const std::string prefix = c.sourceNames ? "vertex" : "in_";
-    const std::string source = vertex(prefix);
-    const int built =
-        c.build == Dual ? registry.addDualTexCoordProgram(source, fragment("fragTexCoord"), false,
-                                                          "p", c.sourceNames)
-        : c.build == Geometry
-            ? registry.addGeometryProgram(source, geometry, fragment("passedTexCoord"), false, "p",
-                                          c.sourceNames)
-            : registry.addProgram(source, fragment("fragTexCoord"), false, "p", c.sourceNames,
-                                  c.build == WithTexCoord);
-    EXPECT_EQ(built, 1);
-    const std::pair<const char*, int> roles[] = {{"Position", c.position},
-                                                 {"TexCoord", c.texCoord},
-                                                 {"TexCoord0", c.texCoord0},
-                                                 {"TexCoord1", c.texCoord1}};
-    for (const auto& [role, expected] : roles) {
-      const int actual = glGetAttribLocation(registry.program(0).id, (prefix + role).c_str());
-      if (expected == kFree) {
-        EXPECT_TRUE(actual != 0 && actual != 8 && actual != 9) << role << " at " << actual;
-      } else {
-        EXPECT_EQ(actual, expected) << role;
-      }
-    }
-  }
 }
 
 }  // namespace
