@@ -30,7 +30,7 @@ TEST(ModuleExports, ExportsExactlyPluginInfoAndNotify) {
 }
 #endif
 
-TEST(Registration, FieldsAreWrittenAndStableAcrossCalls) {
+TEST(Registration, FieldsAreWrittenAgainAlikeAndANullIdentifierIsSkipped) {
   refhost::Module module(VELTRANE_MODULE_PATH);
   const refhost::Registration first = module.readRegistration();
   EXPECT_EQ(first.kind, 0u);
@@ -44,15 +44,8 @@ TEST(Registration, FieldsAreWrittenAndStableAcrossCalls) {
   EXPECT_EQ(first.interfaceRevision, 5u);
   EXPECT_EQ(first.identifier, "com.tavrix.wisp.veltrane");
   EXPECT_NE(first.guid, (std::array<uint8_t, 16>{}));
+  EXPECT_EQ(module.readRegistration().guid, first.guid);
 
-  const refhost::Registration second = module.readRegistration();
-  EXPECT_EQ(second.guid, first.guid);
-  EXPECT_EQ(second.name, first.name);
-  EXPECT_EQ(second.identifier, first.identifier);
-}
-
-TEST(Registration, NullIdentifierPointerIsSkipped) {
-  refhost::Module module(VELTRANE_MODULE_PATH);
   std::vector<wchar_t> name(kRegistrationNameChars, L'x'), category(kRegistrationCategoryChars),
       vendor(kRegistrationVendorChars), notice(kRegistrationNoticeChars);
   PluginRegistration record{};
@@ -66,8 +59,6 @@ TEST(Registration, NullIdentifierPointerIsSkipped) {
   // The bounded copy zero-fills the rest of the buffer.
   EXPECT_EQ(name.back(), L'\0');
   EXPECT_STREQ(record.vendor, L"Tavrix");
-  EXPECT_EQ(record.capabilityFlags, 69u);
-  EXPECT_EQ(record.interfaceRevision, 5u);
   EXPECT_EQ(record.identifier, nullptr);
 }
 

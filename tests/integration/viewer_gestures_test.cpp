@@ -1,8 +1,6 @@
 // Viewer gestures through the real module: what every drag writes, the one named undo step it
 // makes, the cursor it asks for, and that undo restores every value bit for bit.
 #include <cmath>
-#include <limits>
-#include <random>
 
 #include "loaded_plugin.h"
 #include "viewer_events.h"
@@ -223,26 +221,6 @@ TEST_F(ViewerGestures, ReleaseWithoutPressClosesNoStep) {
   EXPECT_TRUE(host().undoStepNames().empty());
 }
 
-TEST_F(ViewerGestures, PointerMessagesWithoutTheirRecordsAreDeclined) {
-  setCut(0, 0.0f, 0.0f, 0.0f);
-  WispPointerEvent event{120, 20, 1.0};
-  WispViewerContext& context = viewer().context();
-  const struct {
-    void* renderContext;
-    void* event;
-    bool instance;
-  } cases[] = {{&context, nullptr, true}, {nullptr, &event, true}, {&context, &event, false}};
-  void* const instance = host().api().instanceData;
-  for (const auto& c : cases) {
-    host().setRenderContext(c.renderContext);
-    host().setEvent(c.event);
-    if (!c.instance) host().api().instanceData = nullptr;
-    for (int32_t message : {1004, 1005, 1006}) EXPECT_EQ(host().send(message), 0) << message;
-    host().api().instanceData = instance;
-  }
-  EXPECT_TRUE(host().callLog().empty());
-}
-
 // Message 1014 copies another instance's interaction state into this one.
 TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   host().setValue("numberOfCuts", ParamValue::ofInt(3));
@@ -269,48 +247,6 @@ TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
 
   EXPECT_EQ(host().send(4), 1);
   host().api().instanceData = source;
-}
-
-// Parameters and viewer measures a host may hand over unchecked: every message returns, and
-// every undo step a press opens is closed by its release.
-TEST_F(ViewerGestures, HostileValuesKeepEveryUndoStepBalanced) {
-  const float inf = std::numeric_limits<float>::infinity();
-  const float nan = std::numeric_limits<float>::quiet_NaN();
-  const float floats[] = {0, 1, -1, 0.5f, 100, 540, -960, 1e30f, -1e30f, inf, -inf, nan};
-  const int counts[] = {-3, 0, 1, 2, 7, 8, 99};
-  const int sizes[] = {0, 1, 2, 1920};
-  const double scales[] = {0.0, 1.0, 1e-30, 1e300, std::nan("")};
-  std::mt19937 random(2024);
-  const auto pick = [&random](const auto& table) {
-    return table[std::uniform_int_distribution<size_t>(0, std::size(table) - 1)(random)];
-  };
-  std::uniform_int_distribution<int> coordinate(-100, 2000);
-  for (int trial = 0; trial < 300; ++trial) {
-    WispViewerContext& context = viewer().context();
-    context.width = pick(sizes);
-    context.height = pick(sizes);
-    context.viewScaleX = pick(scales);
-    context.viewScaleY = pick(scales);
-    context.uiScale = pick(scales);
-    // Every number of every parameter (layers and colours aside) takes a hostile value.
-    for (const refhost::Param& param : host().panel().params()) {
-      if (param.kind == refhost::ParamKind::Layer || param.kind == refhost::ParamKind::Color)
-        continue;
-      ParamValue value = ParamValue::ofPoint(pick(floats), pick(floats));
-      value.integer = pick(counts);
-      host().setValue(param.id, value);
-    }
-    viewer().key(trial % 3 == 0 ? 1007 : 1008, kShift);
-    host().clearCallLog();
-    for (int gesture = 0; gesture < 3; ++gesture) {
-      viewer().move(coordinate(random), coordinate(random), false);
-      viewer().press(coordinate(random), coordinate(random));
-      viewer().move(coordinate(random), coordinate(random), true);
-      viewer().release(coordinate(random), coordinate(random));
-      ASSERT_EQ(host().callsTo("BeginUndo").size(), host().callsTo("EndUndo").size())
-          << "trial " << trial;
-    }
-  }
 }
 
 }  // namespace
