@@ -74,17 +74,5 @@ TEST(FrameSource, HandsGlTheBottomRowFirstAtAnySize) {
   EXPECT_EQ(source(0, 2, 2).size(), 16u) << "a still source is not stuck at its first size";
 }
 
-TEST(RgbaImage, ResizeKeepsFlatAreasAndInterpolatesBetweenCentres) {
-  RgbaImage image(2, 1);
-  image.fillRect(0, 0, 1, 1, {0, 0, 0, 255});
-  image.fillRect(1, 0, 2, 1, {200, 100, 50, 255});
-  const RgbaImage wide = resized(image, 4, 1);
-  EXPECT_EQ(wide.pixel(0, 0), (Rgba8{0, 0, 0, 255}));
-  EXPECT_EQ(wide.pixel(1, 0), (Rgba8{50, 25, 13, 255}));  // a quarter of the way
-  EXPECT_EQ(wide.pixel(3, 0), (Rgba8{200, 100, 50, 255}));
-  EXPECT_EQ(resized(image, 2, 1).pixels, image.pixels);
-  EXPECT_TRUE(resized(image, 0, 5).pixels.empty());
-}
-
 }  // namespace
 }  // namespace refhost
