@@ -7,7 +7,7 @@
 #include "geometry/cut_model.h"
 #include "geometry/cut_segments.h"
 #include "geometry/region_partition.h"
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace {
 

@@ -8,7 +8,7 @@
 #include <cstdlib>
 #include <filesystem>
 
-#include "refhost/shared_library.h"
+#include "refhost/platform/shared_library.h"
 
 namespace veltrane_cli {
 

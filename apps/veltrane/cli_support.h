@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "refhost/gl_context.h"
+#include "refhost/gl/gl_context.h"
 
 namespace veltrane_cli {
 

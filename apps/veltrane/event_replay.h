@@ -6,7 +6,7 @@
 #include <nlohmann/json.hpp>
 
 #include "event_script.h"
-#include "refhost/frame_output.h"
+#include "refhost/pipeline/frame_output.h"
 #include "scene_session.h"
 
 namespace veltrane_cli {

@@ -6,7 +6,7 @@
 #include "cli_support.h"
 #include "commands.h"
 #include "panel_report.h"
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace veltrane_cli {
 namespace {

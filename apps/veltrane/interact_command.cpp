@@ -9,7 +9,7 @@
 #include "commands.h"
 #include "event_replay.h"
 #include "event_script.h"
-#include "refhost/staged_file.h"
+#include "refhost/platform/staged_file.h"
 #include "scene_file.h"
 #include "scene_session.h"
 #include "stop_signals.h"

@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <cstdio>
 
-#include "refhost/text.h"
+#include "refhost/platform/text.h"
 
 namespace veltrane_cli {
 namespace {

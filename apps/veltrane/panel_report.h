@@ -5,8 +5,8 @@
 #include <nlohmann/json.hpp>
 #include <string>
 
-#include "refhost/module.h"
-#include "refhost/params.h"
+#include "refhost/core/module.h"
+#include "refhost/core/params.h"
 
 namespace veltrane_cli {
 

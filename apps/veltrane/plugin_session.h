@@ -8,8 +8,8 @@
 #include <set>
 #include <string>
 
-#include "refhost/host.h"
-#include "refhost/module.h"
+#include "refhost/core/host.h"
+#include "refhost/core/module.h"
 
 namespace veltrane_cli {
 

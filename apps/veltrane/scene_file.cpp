@@ -6,7 +6,7 @@
 
 #include "json_fields.h"
 #include "json_file.h"
-#include "refhost/params.h"
+#include "refhost/core/params.h"
 
 namespace veltrane_cli {
 namespace {

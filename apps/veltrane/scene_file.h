@@ -6,7 +6,7 @@
 #include <set>
 #include <string>
 
-#include "refhost/composition.h"
+#include "refhost/engine/composition.h"
 
 namespace veltrane_cli {
 

@@ -1,7 +1,7 @@
 // Checking scene parameter values against the declared panel, and writing them back.
 #include "scene_params.h"
 
-#include "refhost/text.h"
+#include "refhost/platform/text.h"
 
 namespace veltrane_cli {
 namespace {

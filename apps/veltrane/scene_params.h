@@ -10,7 +10,7 @@
 #include <vector>
 
 #include "json_fields.h"
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace veltrane_cli {
 

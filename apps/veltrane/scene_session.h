@@ -9,8 +9,8 @@
 #include <string>
 
 #include "plugin_session.h"
-#include "refhost/render_frame.h"
-#include "refhost/rgba_image.h"
+#include "refhost/engine/render_frame.h"
+#include "refhost/media/rgba_image.h"
 #include "scene_file.h"
 #include "scene_params.h"
 

@@ -9,9 +9,6 @@
 
 namespace veltrane {
 
-constexpr uint32_t kKeyLeftShift = 65505;
-constexpr uint32_t kKeyEscape = 65307;
-
 int onKeyDown(WispHost* host, tagWispAPI* api, uint32_t keyCode);
 int onKeyUp(WispHost* host, tagWispAPI* api, uint32_t keyCode);
 // 1 when an input is selected, the pointer is over a region and that region shows it.

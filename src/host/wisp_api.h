@@ -7,6 +7,47 @@
 
 extern "C" {
 
+// The message numbers the host sends through Notify, named once for both sides.
+enum WispMessage : int32_t {
+  kMessageLoad = 0,
+  kMessageUnload = 1,
+  kMessageDeclareParameters = 2,
+  kMessageCreateInstance = 3,
+  kMessageDestroyInstance = 4,
+  kMessageParameterChanged = 7,
+  kMessagePrepareGl = 8,
+  kMessageRender = 10,
+  kMessageRequestFrames = 12,
+  kMessageParameterReport13 = 13,
+  kMessageParameterReport14 = 14,
+  kMessageAcknowledged1001 = 1001,
+  kMessageAcknowledged1002 = 1002,
+  kMessageDrawOverlay = 1003,
+  kMessagePointerMove = 1004,
+  kMessagePointerPress = 1005,
+  kMessagePointerRelease = 1006,
+  kMessageKeyDown = 1007,
+  kMessageKeyUp = 1008,
+  kMessageAcknowledged1009 = 1009,
+  kMessageAcknowledged1010 = 1010,
+  kMessageAcknowledged1011 = 1011,
+  kMessagePointerOverSelection = 1012,
+  kMessagePickLayer = 1013,
+  kMessageCopyInstance = 1014,
+};
+
+// Notify's answers beyond a handler's own 0 and 1.
+enum WispResult : int32_t {
+  kResultNotHandled = 2,  // a message number the plug-in does not know
+  kResultException = 5,   // one of the plug-in's exceptions reached Notify
+};
+
+// X11 keysyms of the keys the plug-in reacts to (messages 1007 and 1008).
+enum WispKey : uint32_t {
+  kKeyLeftShift = 65505,
+  kKeyEscape = 65307,
+};
+
 // Opaque host handle, passed back as the first argument of every host operation.
 typedef struct WispHost WispHost;
 

@@ -14,8 +14,8 @@
 #include <string>
 #include <vector>
 
-#include "refhost/host.h"
-#include "refhost/render_frame.h"
+#include "refhost/core/host.h"
+#include "refhost/engine/render_frame.h"
 
 namespace {
 

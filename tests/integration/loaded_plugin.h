@@ -7,8 +7,8 @@
 #include <memory>
 #include <string>
 
-#include "refhost/host.h"
-#include "refhost/module.h"
+#include "refhost/core/host.h"
+#include "refhost/core/module.h"
 
 // Cut i through the frame-space point (x, y), its direction in degrees (0 along +y).
 inline void setCut(refhost::Host& host, int i, float x, float y, float degrees) {

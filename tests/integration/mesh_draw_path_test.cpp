@@ -1,6 +1,6 @@
 // Whether the border meshes are drawn with primitive restart (one indexed draw per mesh) or run
 // by run depends on the extension list and on the graphics chip; both give the same image.
-#include "refhost/gl_overrides.h"
+#include "refhost/gl/gl_overrides.h"
 #include "render_fixture.h"
 
 namespace {

@@ -12,9 +12,9 @@
 #include <vector>
 
 #include "loaded_plugin.h"
-#include "refhost/host.h"
-#include "refhost/module.h"
-#include "refhost/render_frame.h"
+#include "refhost/core/host.h"
+#include "refhost/core/module.h"
+#include "refhost/engine/render_frame.h"
 
 using Rgba = std::array<uint8_t, 4>;
 

@@ -8,8 +8,8 @@
 #include <cmath>
 #include <iterator>
 
-#include "refhost/host.h"
-#include "refhost/render_frame.h"
+#include "refhost/core/host.h"
+#include "refhost/engine/render_frame.h"
 
 class ViewerEvents {
  public:

@@ -10,7 +10,7 @@
 #include <vector>
 
 #include "gl/effect_data.h"
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace testsupport {
 

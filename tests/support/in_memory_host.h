@@ -5,7 +5,7 @@
 
 #include <string>
 
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace testsupport {
 

@@ -5,7 +5,7 @@
 #include <algorithm>
 #include <cstdlib>
 
-#include "refhost/image_files.h"
+#include "refhost/media/image_files.h"
 
 namespace {
 

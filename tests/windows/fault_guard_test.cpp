@@ -5,8 +5,8 @@
 #include <array>
 #include <cstdint>
 
-#include "refhost/host.h"
-#include "refhost/module.h"
+#include "refhost/core/host.h"
+#include "refhost/core/module.h"
 
 namespace {
 

@@ -5,7 +5,7 @@
 
 #include <cstdio>
 
-#include "refhost/gl_context.h"
+#include "refhost/gl/gl_context.h"
 
 namespace {
 

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "refhost/module.h"
+#include "refhost/core/module.h"
 
 namespace {
 

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "refhost/params.h"
+#include "refhost/core/params.h"
 
 namespace veltrane_viewer {
 

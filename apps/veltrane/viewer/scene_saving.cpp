@@ -7,7 +7,7 @@
 #include <sstream>
 #include <stdexcept>
 
-#include "refhost/staged_file.h"
+#include "refhost/platform/staged_file.h"
 #include "scene_params.h"
 
 namespace veltrane_viewer {

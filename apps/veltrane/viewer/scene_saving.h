@@ -5,7 +5,7 @@
 #include <nlohmann/json.hpp>
 #include <string>
 
-#include "refhost/params.h"
+#include "refhost/core/params.h"
 
 namespace veltrane_viewer {
 

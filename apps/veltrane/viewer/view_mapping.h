@@ -5,7 +5,7 @@
 
 #include <cstdint>
 
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace veltrane_viewer {
 

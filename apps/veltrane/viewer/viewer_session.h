@@ -12,7 +12,7 @@
 #include <string>
 #include <vector>
 
-#include "refhost/render_frame.h"
+#include "refhost/engine/render_frame.h"
 #include "scene_file.h"
 #include "scene_session.h"
 #include "view_mapping.h"

@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <string>
 
-#include "refhost/gl_context.h"
+#include "refhost/gl/gl_context.h"
 #include "scene_file.h"
 
 namespace veltrane_viewer {

@@ -12,7 +12,7 @@
 #include <string>
 #include <vector>
 
-#include "refhost/gl_context.h"
+#include "refhost/gl/gl_context.h"
 
 namespace veltrane_viewer {
 

@@ -7,7 +7,7 @@
 #include <nlohmann/json.hpp>
 
 #include "cli_runner.h"
-#include "refhost/image_files.h"
+#include "refhost/media/image_files.h"
 
 namespace {
 

@@ -5,9 +5,9 @@
 #include <nlohmann/json.hpp>
 
 #include "cli_runner.h"
-#include "refhost/image_files.h"
-#include "refhost/test_patterns.h"
-#include "refhost/video_reader.h"
+#include "refhost/media/image_files.h"
+#include "refhost/media/test_patterns.h"
+#include "refhost/media/video_reader.h"
 
 namespace {
 

@@ -5,7 +5,7 @@
 #include <gtest/gtest.h>
 
 #include "controls/parameter_accessors.h"
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace {
 

@@ -7,7 +7,7 @@
 #include <utility>
 #include <vector>
 
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace {
 

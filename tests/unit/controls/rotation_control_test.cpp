@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "controls/handle_math.h"
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace {
 

@@ -1,15 +1,16 @@
 // The overlapped render loop and its stages: decoding ahead gives exactly the wrapped source's
 // frames in any order of asking, and a failure in decoding or drawing stops the run with that
 // failure's own message and leaves no file behind.
-#include "refhost/frame_pipeline.h"
+#include "refhost/engine/composition.h"
+#include "refhost/engine/frame_pipeline.h"
 
 #include <GL/glew.h>
 #include <gtest/gtest.h>
 
 #include <filesystem>
 
-#include "refhost/frame_prefetch.h"
-#include "refhost/image_files.h"
+#include "refhost/pipeline/frame_prefetch.h"
+#include "refhost/media/image_files.h"
 #include "support/gl_host.h"
 #include "support/temp_paths.h"
 

@@ -8,12 +8,12 @@
 #include <fstream>
 #include <iterator>
 
-#include "refhost/frame_output.h"
-#include "refhost/image_files.h"
-#include "refhost/media_source.h"
-#include "refhost/test_patterns.h"
-#include "refhost/video_reader.h"
-#include "refhost/video_writer.h"
+#include "refhost/pipeline/frame_output.h"
+#include "refhost/media/image_files.h"
+#include "refhost/media/media_source.h"
+#include "refhost/media/test_patterns.h"
+#include "refhost/media/video_reader.h"
+#include "refhost/pipeline/video_writer.h"
 #include "support/temp_paths.h"
 
 namespace refhost {

@@ -2,7 +2,7 @@
 // no file and for damaged copies of the built module, refused before the system loader could
 // fault on them. (Missing files, other files and libraries without the entry points are
 // reported through the command line's info command.)
-#include "refhost/module.h"
+#include "refhost/core/module.h"
 
 #include <gtest/gtest.h>
 

@@ -5,7 +5,7 @@
 
 #include <cmath>
 
-#include "refhost/host.h"
+#include "refhost/core/host.h"
 
 namespace refhost {
 namespace {

@@ -1,6 +1,6 @@
 // The times a render context carries for a frame, in whole milliseconds at any frame rate. (The
 // other fields of the context show in every render of the module.)
-#include "refhost/render_frame.h"
+#include "refhost/engine/render_frame.h"
 
 #include <gtest/gtest.h>
 

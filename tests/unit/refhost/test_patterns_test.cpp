@@ -1,11 +1,12 @@
 // Generated pictures hold exactly the values they promise, the counter's code block reads
 // back the frame number, and frame sources hand GL its rows bottom first (a moving source's
 // upright frames are read back through the render context).
-#include "refhost/test_patterns.h"
+#include "refhost/engine/composition.h"
+#include "refhost/media/test_patterns.h"
 
 #include <gtest/gtest.h>
 
-#include "refhost/media_source.h"
+#include "refhost/media/media_source.h"
 
 namespace refhost {
 namespace {

@@ -10,7 +10,7 @@
 #include <iterator>
 #include <nlohmann/json.hpp>
 
-#include "refhost/image_files.h"
+#include "refhost/media/image_files.h"
 #include "support/temp_paths.h"
 #include "x_session.h"
 

@@ -8,7 +8,7 @@
 #include <memory>
 #include <stdexcept>
 
-#include "refhost/image_files.h"
+#include "refhost/media/image_files.h"
 
 XSession::XSession() {
   int pipe_[2];

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "refhost/rgba_image.h"
+#include "refhost/media/rgba_image.h"
 #include "support/child_process.h"
 
 using testsupport::ChildProcess;

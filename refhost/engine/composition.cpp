@@ -1,0 +1,66 @@
+// Installing a composition into the host.
+#include "refhost/engine/composition.h"
+
+#include "refhost/pipeline/frame_prefetch.h"
+
+namespace refhost {
+namespace {
+
+// Frames a source decodes ahead of the render: enough to cover a slow frame, few enough that
+// four 1080p sources hold under 100 MB.
+constexpr int32_t kDecodeAhead = 3;
+
+// Sources that change over time (videos, the counter) decode ahead on a worker thread each.
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec) {
+  std::shared_ptr<MediaSource> source = openMediaSource(spec);
+  if (!source->changesOverTime()) return source;
+  return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead);
+}
+
+}  // namespace
+
+FrameSource frameSourceOf(std::shared_ptr<MediaSource> source) {
+  struct Kept {
+    int32_t width = -1, height = -1;
+    std::vector<uint8_t> rows;
+  };
+  auto kept = std::make_shared<Kept>();
+  return [source, kept](int32_t frame, int32_t width, int32_t height) {
+    bool still = !source->changesOverTime();
+    if (still && kept->width == width && kept->height == height) return kept->rows;
+    std::vector<uint8_t> rows = source->glRows(frame, width, height);
+    if (still) *kept = Kept{width, height, rows};
+    return rows;
+  };
+}
+
+const char* const kDefaultOwnLayerGuid = "5ec0a11e-0000-4000-8000-000000000001";
+
+InstalledComposition installComposition(Host& host, const Composition& composition) {
+  InstalledComposition installed;
+  installed.source = opened(composition.source);
+  installed.sourceFrameCount =
+      installed.source->frameCount() > 0 ? installed.source->frameCount() : composition.duration;
+  host.setTimeInfo(composition.width, composition.height, composition.frameRate);
+  host.setSourceFrames(frameSourceOf(installed.source));
+
+  Layer own;
+  own.guid = composition.ownLayerGuid;
+  own.name = composition.ownLayerName;
+  own.kind = 0;
+  own.firstFrame = 0;
+  own.frameCount = composition.duration;
+  own.width = composition.width;
+  own.height = composition.height;
+  own.source = frameSourceOf(installed.source);
+  host.addLayer(own);
+
+  for (const CompositionLayer& entry : composition.layers) {
+    Layer layer = entry.layer;
+    layer.source = frameSourceOf(opened(entry.media));
+    host.addLayer(layer);
+  }
+  return installed;
+}
+
+}  // namespace refhost

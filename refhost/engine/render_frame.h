@@ -1,0 +1,58 @@
+// The render context of one frame, as the host hands it with the frame-request and render
+// messages, together with the textures it names; and the viewer context of the overlay and
+// pointer messages.
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "refhost/core/host.h"
+#include "refhost/media/rgba_image.h"
+
+namespace refhost {
+
+// Orthographic projection of pixel coordinates (0..W, 0..H) onto clip space, column-major as
+// GL takes it.
+Matrix4 pixelProjection(int32_t width, int32_t height);
+
+// The composition time of a frame: trunc(frame * 1000 / rate + 0.49999), a rate of 0 or less
+// counting as 25.
+int32_t frameToMilliseconds(int32_t frame, double frameRate);
+
+struct FrameSettings {
+  int32_t width = 0;
+  int32_t height = 0;
+  double frameRate = 25.0;
+  float pixelAspect = 1.0f;
+  int32_t sourceFrameCount = 1;
+  std::string ownLayerGuid;
+};
+
+// One frame's render context. Its three textures (the own source's frame from the host's
+// frame source, the output and a second texture of the frame's size) are host textures, not
+// counted as the plug-in's, and are deleted with this object. Parameter time, frame number and
+// source frame index are all the frame number; the layer-space matrix and both view matrices
+// are the identity (the lens term of a 50 mm camera in element 5).
+class RenderFrame {
+ public:
+  RenderFrame(Host& host, const FrameSettings& settings, int32_t frame);
+  ~RenderFrame();
+  RenderFrame(const RenderFrame&) = delete;
+  RenderFrame& operator=(const RenderFrame&) = delete;
+
+  WispRenderContext& context() { return context_; }
+  // The output texture's pixels, top row first (the frame's top edge, t = 1, comes first).
+  RgbaImage readOutput();
+
+ private:
+  Host& host_;
+  std::string ownLayerGuid_;
+  WispRenderContext context_{};
+};
+
+// The viewer context of messages 1003 to 1006: no name, the frame size, the scales, the time
+// and the same pixel projection as the render.
+WispViewerContext makeViewerContext(int32_t width, int32_t height, double viewScaleX,
+                                    double viewScaleY, double uiScale, int32_t time);
+
+}  // namespace refhost

@@ -1,0 +1,58 @@
+// Still images for the Windows host through the header-only stb readers and writer: OpenImageIO
+// is not built for Windows. Reading takes what stb_image decodes (PNG, JPEG, BMP, TGA, GIF, PSD,
+// HDR, PIC, PNM); writing is PNG only.
+#include <cstdlib>
+#include <stdexcept>
+
+#include "refhost/media/image_files.h"
+#include "refhost/platform/staged_file.h"
+
+// Paths are UTF-8 here, as everywhere in the host; stb converts them for Windows' wide calls.
+#define STBI_WINDOWS_UTF8
+#define STBIW_WINDOWS_UTF8
+#define STB_IMAGE_IMPLEMENTATION
+#define STB_IMAGE_WRITE_IMPLEMENTATION
+#include <stb/stb_image.h>
+#include <stb/stb_image_write.h>
+
+namespace refhost {
+
+RgbaImage readImageFile(const std::string& path) {
+  int width = 0, height = 0, channels = 0;
+  // Asking for four channels expands grey to RGB and adds an opaque alpha where there is none.
+  stbi_uc* pixels = stbi_load(path.c_str(), &width, &height, &channels, 4);
+  if (!pixels) {
+    const char* reason = stbi_failure_reason();
+    throw std::runtime_error(path + ": cannot read image: " + (reason ? reason : "unknown error"));
+  }
+  RgbaImage image;
+  image.width = width;
+  image.height = height;
+  image.pixels.assign(
+      pixels, pixels + static_cast<std::size_t>(width) * static_cast<std::size_t>(height) * 4);
+  stbi_image_free(pixels);
+  return image;
+}
+
+std::vector<uint8_t> encodeImage(const RgbaImage& image, ImageFormat format,
+                                 const std::string& shownName) {
+  if (format != ImageFormat::Png)
+    throw std::runtime_error(shownName + ": cannot write image: the Windows build writes PNG only");
+  std::vector<uint8_t> bytes;
+  const auto append = [](void* into, void* data, int size) {
+    const auto* first = static_cast<const uint8_t*>(data);
+    static_cast<std::vector<uint8_t>*>(into)->insert(
+        static_cast<std::vector<uint8_t>*>(into)->end(), first, first + size);
+  };
+  if (!stbi_write_png_to_func(append, &bytes, image.width, image.height, 4, image.pixels.data(),
+                              image.width * 4))
+    throw std::runtime_error(shownName + ": cannot write image: the picture could not be encoded");
+  return bytes;
+}
+
+void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format) {
+  const std::vector<uint8_t> bytes = encodeImage(image, format, path);
+  writeFileContents(path, path, bytes.data(), bytes.size());
+}
+
+}  // namespace refhost

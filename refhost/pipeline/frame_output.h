@@ -1,0 +1,53 @@
+// Where a render's frames go: one still image (PNG or EXR), a numbered image sequence, or a
+// video file. Everything is written under temporary names and moved into place at the end.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "refhost/media/image_files.h"
+#include "refhost/media/rgba_image.h"
+#include "refhost/pipeline/video_writer.h"
+
+namespace refhost {
+
+enum class OutputKind { Still, Sequence, Video };
+
+struct OutputTarget {
+  OutputKind kind = OutputKind::Still;
+  std::string path;  // a sequence's path holds its frame-number pattern
+  ImageFormat imageFormat = ImageFormat::Png;
+  VideoContainer container = VideoContainer::Mp4;
+
+  // A sequence's file name for the frame: the pattern's %0Nd (or %d) replaced by the number,
+  // zero-padded to N digits.
+  std::string frameName(int32_t frame) const;
+};
+
+// By the name: a pattern with one %0Nd or %d in the file name (not a folder's) and ending in
+// .png or .exr is a sequence; .png and .exr alone are stills; .mp4, .mov and .mkv are videos
+// (letter case ignored). Throws std::invalid_argument saying what was expected.
+OutputTarget parseOutputTarget(const std::string& path);
+
+class FrameSink {
+ public:
+  virtual ~FrameSink() = default;  // deletes whatever was not committed
+  // A picture of the sink's size, top row first.
+  virtual void write(int32_t frame, const RgbaImage& picture) = 0;
+  // Moves everything written into place, all or nothing; returns the final names. Every write
+  // and the flush at the end is checked: errors name the final name and the system's reason.
+  virtual std::vector<std::string> commit() = 0;
+  // Empty, or something the user should know about how the frames were written.
+  virtual std::string note() const { return ""; }
+  // True when write() may run on several threads at once (for different frames).
+  virtual bool concurrentWrites() const { return false; }
+};
+
+// Throws std::runtime_error naming the file when it cannot be created. A video carries the
+// audio clip's sound, if it has any.
+std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
+                                         double frameRate, const AudioClip& audio = {});
+
+}  // namespace refhost
