@@ -2,8 +2,8 @@
 // cut segments and the region under the pointer.
 #include <benchmark/benchmark.h>
 
+#include "common/param_ids.h"
 #include "effect/param_declaration.h"
-#include "effect/param_ids.h"
 #include "geometry/cut_model.h"
 #include "geometry/cut_segments.h"
 #include "geometry/region_partition.h"

@@ -4,7 +4,7 @@
 
 #include <functional>
 
-#include "geometry/glsl_types.h"
+#include "common/glsl_types.h"
 #include "host/wisp_api.h"
 
 namespace veltrane {

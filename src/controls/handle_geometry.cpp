@@ -5,8 +5,8 @@
 #include <cmath>
 #include <string>
 
+#include "common/param_ids.h"
 #include "controls/handle_math.h"
-#include "effect/param_ids.h"
 #include "geometry/cut_model.h"
 #include "geometry/input_transform.h"
 

@@ -3,8 +3,8 @@
 // place the handles from the same functions so that what is drawn is what is hit.
 #pragma once
 
+#include "common/param_ids.h"
 #include "controls/accessors.h"
-#include "effect/param_ids.h"
 
 namespace veltrane {
 

@@ -2,9 +2,9 @@
 // convention: angle a points along (sin a, cos a), 0 along +y, growing toward +x.
 #pragma once
 
+#include "common/glsl_types.h"
 #include "controls/control_constants.h"
 #include "geometry/angles.h"
-#include "geometry/glsl_types.h"
 
 namespace veltrane {
 namespace handle_math {

@@ -4,7 +4,7 @@
 
 #include <cstdint>
 
-#include "effect/instance_record.h"
+#include "controls/instance_record.h"
 #include "host/wisp_api.h"
 
 namespace veltrane {

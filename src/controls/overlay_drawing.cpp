@@ -10,7 +10,7 @@
 
 #include "controls/control_constants.h"
 #include "controls/handle_geometry.h"
-#include "effect/instance_record.h"
+#include "controls/instance_record.h"
 #include "gl/draws.h"
 #include "gl/effect_data.h"
 #include "gl/textured_quad.h"

@@ -7,9 +7,9 @@
 #include <string>
 #include <utility>
 
+#include "common/param_ids.h"
 #include "controls/control_constants.h"
 #include "controls/handle_math.h"
-#include "effect/param_ids.h"
 #include "geometry/cut_model.h"
 #include "geometry/input_transform.h"
 

@@ -11,12 +11,12 @@
 #include <string>
 #include <vector>
 
+#include "common/param_ids.h"
 #include "controls/control_constants.h"
 #include "controls/handle_geometry.h"
 #include "controls/handle_math.h"
+#include "controls/instance_record.h"
 #include "controls/undo_names.h"
-#include "effect/instance_record.h"
-#include "effect/param_ids.h"
 #include "geometry/cut_model.h"
 #include "geometry/cut_segments.h"
 #include "geometry/region_partition.h"

@@ -4,7 +4,7 @@
 
 #include <cstring>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 
 namespace veltrane {
 

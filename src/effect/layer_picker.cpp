@@ -8,9 +8,9 @@
 #include <string>
 #include <vector>
 
+#include "common/param_ids.h"
+#include "controls/instance_record.h"
 #include "controls/key_handling.h"
-#include "effect/instance_record.h"
-#include "effect/param_ids.h"
 
 namespace veltrane {
 namespace {

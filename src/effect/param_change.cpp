@@ -5,7 +5,7 @@
 #include <cstring>
 #include <string>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 
 namespace veltrane {
 namespace {

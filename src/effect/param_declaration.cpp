@@ -5,8 +5,8 @@
 
 #include <string>
 
-#include "effect/param_ids.h"
-#include "plugin/plugin_exception.h"
+#include "common/param_ids.h"
+#include "common/plugin_exception.h"
 
 namespace veltrane {
 namespace {

@@ -1,5 +1,5 @@
-// Building the border distance meshes, and the one GL decision they need: whether primitive
-// restart may separate their strips and fans.
+// Building and drawing the border distance meshes, and the one GL decision they need: whether
+// primitive restart may separate their strips and fans.
 #include "geometry/border_mesh.h"
 
 #include <GL/glew.h>
@@ -7,6 +7,7 @@
 #include <cmath>
 #include <string>
 
+#include "gl/buffer_scopes.h"
 #include "gl/draws.h"
 #include "gl/effect_data.h"
 #include "gl/extensions.h"
@@ -21,6 +22,7 @@ using plugin_glsl_types::genVec2;
 constexpr float kCapStep = 0.19634955f;  // pi / 16
 constexpr int kCapPoints = 33;
 constexpr float kCapDummyX = -1e10f;  // far outside any frame; never referenced
+constexpr GLuint kPosition = shader_ids::kPositionLocation;
 
 uint32_t appendVertex(BorderMesh& mesh, float x, float y, float value) {
   mesh.vertices.push_back(MeshVertex{x, y, value});
@@ -50,6 +52,43 @@ std::string lowerCase(const char* text) {
 }
 
 const char* glText(GLenum name) { return reinterpret_cast<const char*>(glGetString(name)); }
+
+const void* byteOffset(std::size_t bytes) { return reinterpret_cast<const void*>(bytes); }
+
+void enableMeshPosition() {
+  glEnableVertexAttribArray(kPosition);
+  glVertexAttribPointer(kPosition, 3, GL_FLOAT, GL_FALSE, sizeof(MeshVertex), byteOffset(0));
+}
+
+void drawElements(tagWispAPI* api, WispHost* host, GLenum mode, const uint32_t* indices,
+                  std::size_t count) {
+  BufferScope elements(api, host, GL_ELEMENT_ARRAY_BUFFER, count * sizeof(uint32_t), indices,
+                       GL_DYNAMIC_DRAW);
+  glDrawElements(mode, static_cast<GLsizei>(count), GL_UNSIGNED_INT, byteOffset(0));
+}
+
+void drawWithRestart(const BorderMesh& mesh, tagWispAPI* api, WispHost* host) {
+  const std::size_t count = restartDrawCount(mesh.indices.size(), mesh.mode);
+  if (count == 0) return;
+  VertexArrayScope scope(api, host, mesh.vertices.data(),
+                         mesh.vertices.size() * sizeof(MeshVertex));
+  glEnable(GL_PRIMITIVE_RESTART);
+  enableMeshPosition();
+  drawElements(api, host, mesh.mode, mesh.indices.data(), count);
+  glDisableVertexAttribArray(kPosition);
+  glFlush();
+  glDisable(GL_PRIMITIVE_RESTART);
+}
+
+void drawRunByRun(const BorderMesh& mesh, tagWispAPI* api, WispHost* host) {
+  VertexArrayScope scope(api, host, mesh.vertices.data(),
+                         mesh.vertices.size() * sizeof(MeshVertex));
+  enableMeshPosition();
+  for (const IndexRun& run : indexRuns(mesh.indices, mesh.mode)) {
+    drawElements(api, host, mesh.mode, mesh.indices.data() + run.first, run.count);
+  }
+  glDisableVertexAttribArray(kPosition);
+}
 
 void drawDistanceMesh(WispHost* host, tagWispAPI* api, const float* modelView,
                       const BorderMesh& mesh) {
@@ -129,6 +168,16 @@ BorderMesh buildStripMesh(const SegmentList& segments, float radius, bool restar
     appendSegmentStrip(mesh, segments.start(i), segments.end(i), 0.0f, 0.0f, 1.0f, 1.0f, radius);
   }
   return mesh;
+}
+
+void drawMesh(const BorderMesh& mesh, tagWispAPI* api, WispHost* host) {
+  if (mesh.vertices.empty() || mesh.indices.empty()) return;
+  if (mesh.restart) {
+    drawWithRestart(mesh, api, host);
+    return;
+  }
+  drawRunByRun(mesh, api, host);
+  glFlush();
 }
 
 void buildCutCaps(WispHost* host, tagWispAPI* api, const float* modelView,

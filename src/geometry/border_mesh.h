@@ -7,7 +7,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "geometry/glsl_types.h"
+#include "common/glsl_types.h"
 #include "host/wisp_api.h"
 
 namespace veltrane {
@@ -57,6 +57,10 @@ struct SegmentList {
 // The two meshes of a segment list, built without touching GL.
 BorderMesh buildCapMesh(const SegmentList& segments, float radius, bool restart);
 BorderMesh buildStripMesh(const SegmentList& segments, float radius, bool restart);
+
+// Draws the mesh's primitives (vertex value to attribute 0 as the z of a 3-float position):
+// one indexed draw with restart index 0 when `mesh.restart`, else one draw per run.
+void drawMesh(const BorderMesh& mesh, tagWispAPI* api, WispHost* host);
 
 // Build the cap (respectively strip) mesh and draw it with the "distanceField" program: the
 // host's projection as it comes, `modelView` (row by row) transposed.

@@ -5,7 +5,7 @@
 #include <cmath>
 #include <string>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "geometry/angles.h"
 
 namespace veltrane {

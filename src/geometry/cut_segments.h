@@ -4,8 +4,8 @@
 
 #include <vector>
 
+#include "common/glsl_types.h"
 #include "geometry/cut_model.h"
-#include "geometry/glsl_types.h"
 
 namespace veltrane {
 

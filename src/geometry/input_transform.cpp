@@ -3,7 +3,7 @@
 
 #include <cmath>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "geometry/angles.h"
 
 namespace veltrane {

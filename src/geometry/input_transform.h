@@ -5,7 +5,7 @@
 #include <array>
 #include <cstdint>
 
-#include "geometry/glsl_types.h"
+#include "common/glsl_types.h"
 #include "host/wisp_api.h"
 
 namespace veltrane {

@@ -4,7 +4,7 @@
 #include <cmath>
 #include <utility>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "geometry/angles.h"
 
 namespace veltrane {

@@ -6,8 +6,8 @@
 #include <cstdint>
 #include <vector>
 
+#include "common/glsl_types.h"
 #include "geometry/cut_model.h"
-#include "geometry/glsl_types.h"
 
 namespace veltrane {
 

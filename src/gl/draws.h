@@ -1,5 +1,5 @@
-// The draws every pass uses: textured vertices as one array draw, and indexed meshes whose
-// primitives are separated by index 0, drawn with primitive restart or run by run.
+// The draws every pass uses: textured vertices as one array draw, and the rules by which an
+// index array whose primitives are separated by index 0 is drawn with restart or run by run.
 #pragma once
 
 #include <GL/glew.h>
@@ -8,7 +8,6 @@
 #include <cstdint>
 #include <vector>
 
-#include "geometry/border_mesh.h"
 #include "gl/textured_quad.h"
 #include "host/wisp_api.h"
 
@@ -18,10 +17,6 @@ namespace veltrane {
 // texture coordinate to attribute 8.
 void drawTexturedVertices(tagWispAPI* api, WispHost* host, const TexturedVertex* vertices,
                           int count, GLenum mode);
-
-// Draws the mesh's primitives (vertex value to attribute 0 as the z of a 3-float position):
-// one indexed draw with restart index 0 when `mesh.restart`, else one draw per run.
-void drawMesh(const BorderMesh& mesh, tagWispAPI* api, WispHost* host);
 
 // A stretch of the index array drawn as one primitive.
 struct IndexRun {

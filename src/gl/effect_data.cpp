@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <utility>
 
+#include "common/glsl_exception.h"
 #include "gl/fx_shader.h"
-#include "gl/glsl_exception.h"
 #include "gl/shader_log.h"
 #include "shaders/shader_identifiers.h"
 

@@ -9,7 +9,7 @@
 #include <string>
 #include <vector>
 
-#include "gl/glsl_exception.h"  // what the build and link operations throw
+#include "common/glsl_exception.h"  // what the build and link operations throw
 
 namespace veltrane {
 

@@ -3,7 +3,7 @@
 
 #include <vector>
 
-#include "gl/glsl_exception.h"
+#include "common/glsl_exception.h"
 
 namespace Plugin {
 namespace gl {

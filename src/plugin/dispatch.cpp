@@ -2,17 +2,17 @@
 // exception types are turned into a result here, and nothing they changed is rolled back.
 #include "plugin/dispatch.h"
 
+#include "common/plugin_exception.h"
+#include "controls/instance_record.h"
 #include "controls/key_handling.h"
 #include "controls/overlay_drawing.h"
 #include "controls/pointer_handling.h"
 #include "effect/frame_requests.h"
-#include "effect/instance_record.h"
 #include "effect/layer_picker.h"
 #include "effect/param_change.h"
 #include "effect/param_declaration.h"
 #include "gl/effect_data.h"
 #include "plugin/fault_guard.h"
-#include "plugin/plugin_exception.h"
 #include "render/frame_render.h"
 #include "render/gl_startup.h"
 

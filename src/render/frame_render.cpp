@@ -7,7 +7,7 @@
 
 #include <vector>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "geometry/border_mesh.h"
 #include "geometry/cut_model.h"
 #include "geometry/cut_segments.h"

@@ -10,7 +10,7 @@
 #include <cwchar>
 #include <string>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "gl/texture_units.h"
 #include "render/layer_alignment.h"
 #include "render/layer_state.h"

@@ -7,7 +7,7 @@
 
 #include <cstring>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "gl/buffer_scopes.h"
 #include "gl/effect_data.h"
 #include "gl/render_target.h"

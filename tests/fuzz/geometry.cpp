@@ -7,7 +7,7 @@
 #include <cstring>
 #include <vector>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "geometry/cut_model.h"
 #include "geometry/cut_segments.h"
 #include "geometry/input_transform.h"

@@ -7,8 +7,8 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "common/param_ids.h"
 #include "controls/rotation_control.h"
-#include "effect/param_ids.h"
 #include "support/in_memory_host.h"
 
 namespace {

@@ -9,7 +9,7 @@
 #include <utility>
 #include <vector>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "geometry/angles.h"
 #include "support/in_memory_host.h"
 

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "geometry/cut_model.h"
 #include "geometry/cut_segments.h"
 #include "geometry/region_partition.h"

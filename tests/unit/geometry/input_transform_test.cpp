@@ -4,7 +4,7 @@
 
 #include <gtest/gtest.h>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "support/in_memory_host.h"
 
 namespace veltrane {

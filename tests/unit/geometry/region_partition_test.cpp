@@ -7,7 +7,7 @@
 
 #include <vector>
 
-#include "effect/param_ids.h"
+#include "common/param_ids.h"
 #include "make_cut.h"
 
 namespace veltrane {

@@ -1,6 +1,6 @@
 // Instance lifetime. The storage is zero-filled before construction so that every byte of the
 // record, padding included, has a defined value from the start.
-#include "effect/instance_record.h"
+#include "controls/instance_record.h"
 
 #include <cstddef>
 #include <cstring>

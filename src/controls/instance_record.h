@@ -5,11 +5,11 @@
 #include <array>
 #include <cstdint>
 
+#include "common/glsl_types.h"
+#include "common/param_ids.h"
 #include "controls/aa_quad_control.h"
 #include "controls/cut_position_control.h"
 #include "controls/rotation_control.h"
-#include "effect/param_ids.h"
-#include "geometry/glsl_types.h"
 #include "host/wisp_api.h"
 
 namespace veltrane {
