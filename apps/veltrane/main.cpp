@@ -6,9 +6,9 @@
 #include <string>
 #include <vector>
 
-#include "cli_support.h"
-#include "commands.h"
-#include "stop_signals.h"
+#include "cli/cli_support.h"
+#include "cli/stop_signals.h"
+#include "commands/commands.h"
 
 namespace {
 

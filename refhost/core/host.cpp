@@ -68,12 +68,12 @@ void Host::setTimeInfo(int32_t width, int32_t height, double frameRate) {
 }
 
 const wchar_t* Host::getHostIdentifier() {
-  log("GetHostIdentifier");
+  log([&] { return std::string("GetHostIdentifier"); });
   return hostIdentifier_.c_str();
 }
 
 int32_t Host::getHostId() {
-  log("GetHostId");
+  log([&] { return std::string("GetHostId"); });
   return hostId_;
 }
 

@@ -14,11 +14,11 @@
 #include <vector>
 
 #include "host/wisp_api.h"
-#include "refhost/gl/gl_context.h"
 #include "refhost/core/module.h"
 #include "refhost/core/params.h"
-#include "refhost/gl/texture_pool.h"
 #include "refhost/core/undo.h"
+#include "refhost/gl/gl_context.h"
+#include "refhost/gl/texture_pool.h"
 
 namespace refhost {
 
@@ -127,7 +127,6 @@ class Host {
                               uint32_t internalFormat = 0x1908 /* GL_RGBA */);
   void deleteTexture(uint32_t id);
   const TexturePool& texturePool() const { return texturePool_; }
-  std::vector<uint8_t> readTexture(uint32_t id, int32_t width, int32_t height);  // RGBA8
 
   // ---- Parameters ------------------------------------------------------------------------
   const ParamPanel& panel() const { return panel_; }
@@ -137,6 +136,10 @@ class Host {
   void setValue(const std::string& id, const ParamValue& value);  // static; drops keyframes
   void setKeyframe(const std::string& id, int32_t time, const ParamValue& value);
   void clearKeyframes(const std::string& id);
+  // Replaces the parameter's whole state (static value and keyframes), outside any undo step.
+  void editStateWithoutUndo(const std::string& id, const ParamState& state) {
+    mutableParam(id).state = state;
+  }
   ParamValue valueAt(const std::string& id, int32_t time) const;
   bool isEnabled(const std::string& id) const { return param(id).enabled; }
 
@@ -170,8 +173,10 @@ class Host {
   // The lines of one operation (the text before the first space equals `operation`).
   std::vector<std::string> callsTo(const std::string& operation) const;
   void clearCallLog() { callLog_.clear(); }
-  // Long renders and benchmarks keep no log: it grows by every call the plug-in makes.
+  // The log is a test instrument, off unless asked for: it grows by every call the plug-in
+  // makes, and formatting its lines costs more than most of the calls themselves.
   void setCallLogging(bool on) { callLogging_ = on; }
+  bool callLogging() const { return callLogging_; }
   // What the host refused or found wrong in a call: unknown ids, kind mismatches, null
   // pointers, releases of names it never handed out, an EndUndo without BeginUndo.
   const std::vector<std::string>& problems() const { return problems_; }
@@ -215,6 +220,15 @@ class Host {
   const std::vector<FrameRequest>& frameRequests() const { return frameRequests_; }
   void clearFrameRequests() { frameRequests_.clear(); }
   void clearViewerRecords();
+  // Forgets the cursors and redraw requests only, keeping menus and queued answers.
+  void clearCursorsAndRedraws() {
+    cursorShapes_.clear();
+    redraws_ = 0;
+  }
+
+  // While set, every parameter the plug-in reads is appended to the list (the panel's own
+  // records): how a host learns what a message looked at without keeping the call log.
+  void setReadRecord(std::vector<const Param*>* record) { readRecord_ = record; }
 
  private:
   friend struct Operations;  // the C callbacks, in callbacks.cpp
@@ -223,8 +237,11 @@ class Host {
     Host* host;
   };
 
-  void log(std::string line) {
-    if (callLogging_) callLog_.push_back(std::move(line));
+  // `line` makes the text; it is called only while the log is kept, so a render without the
+  // log formats nothing.
+  template <typename Line>
+  void log(Line&& line) {
+    if (callLogging_) callLog_.push_back(line());
   }
   void problem(std::string text) { problems_.push_back(std::move(text)); }
   // The interface's reserved arguments are 0; anything else is the plug-in misusing it.
@@ -332,7 +349,7 @@ class Host {
   FrameSource sourceFrames_;
 
   std::vector<std::string> callLog_;
-  bool callLogging_ = true;
+  bool callLogging_ = false;
   std::vector<std::string> problems_;
   std::vector<MessageRecord> messages_;
 
@@ -362,6 +379,7 @@ class Host {
   std::vector<std::string> popupMenus_;
   std::function<int32_t(const std::string&)> popupChooser_;
   std::vector<FrameRequest> frameRequests_;
+  std::vector<const Param*>* readRecord_ = nullptr;
 };
 
 }  // namespace refhost

@@ -33,13 +33,15 @@ const Layer* Host::findLayer(const char* guid) const {
 }
 
 int32_t Host::getLayerCount() {
-  log("GetLayerCount");
+  log([&] { return std::string("GetLayerCount"); });
   return static_cast<int32_t>(layers_.size());
 }
 
 void Host::getLayerInfo(int32_t index, char* guidBuffer, char* nameBuffer, int32_t nameSize,
                         int32_t* kind) {
-  log("GetLayerInfo " + std::to_string(index) + " " + std::to_string(nameSize));
+  log([&] {
+    return std::string("GetLayerInfo " + std::to_string(index) + " " + std::to_string(nameSize));
+  });
   if (index < 0 || static_cast<std::size_t>(index) >= layers_.size()) {
     problem("GetLayerInfo: no layer at index " + std::to_string(index));
     return;
@@ -61,7 +63,7 @@ void Host::getLayerInfo(int32_t index, char* guidBuffer, char* nameBuffer, int32
 }
 
 int32_t Host::queryLayerState(const char* guid, int32_t timeMs, LayerState* out) {
-  log("QueryLayerState " + logId(guid) + " " + std::to_string(timeMs));
+  log([&] { return std::string("QueryLayerState " + logId(guid) + " " + std::to_string(timeMs)); });
   const Layer* layer = findLayer(guid);
   if (failLayerQueries_ || !layer || !out) {
     if (!out) problem("QueryLayerState with a null record");
@@ -80,14 +82,14 @@ int32_t Host::queryLayerState(const char* guid, int32_t timeMs, LayerState* out)
 }
 
 int32_t Host::getTimeInfo(WispTimeInfo* out) {
-  log("GetTimeInfo");
+  log([&] { return std::string("GetTimeInfo"); });
   if (failTimeInfo_ || !out) return 1;
   *out = timeInfo_;
   return 0;
 }
 
 int32_t Host::getSourceFrame(void* renderContext, int32_t frameIndex, TextureRecord* out) {
-  log("GetSourceFrame " + std::to_string(frameIndex));
+  log([&] { return std::string("GetSourceFrame " + std::to_string(frameIndex)); });
   if (refuseSourceFrames_) return 1;
   // A source frame at another index has the size of the source the render context carries.
   int32_t width = timeInfo_.width;
@@ -101,7 +103,7 @@ int32_t Host::getSourceFrame(void* renderContext, int32_t frameIndex, TextureRec
 }
 
 int32_t Host::renderLayerFrame(void*, const char* guid, int32_t frame, TextureRecord* out) {
-  log("RenderLayerFrame " + logId(guid) + " " + std::to_string(frame));
+  log([&] { return std::string("RenderLayerFrame " + logId(guid) + " " + std::to_string(frame)); });
   const Layer* layer = findLayer(guid);
   if (refuseLayerFrames_ || !layer) return 1;
   FrameSource source = layer->source;

@@ -42,14 +42,14 @@ int32_t Host::declare(Param param) {
 }
 
 int32_t Host::beginParamGroup(const wchar_t* displayName) {
-  log("BeginParamGroup " + logText(displayName));
+  log([&] { return std::string("BeginParamGroup " + logText(displayName)); });
   if (declarationRefused()) return 1;
   panel_.beginGroup(toUtf8(displayName));
   return 0;
 }
 
 int32_t Host::endParamGroup() {
-  log("EndParamGroup");
+  log([&] { return std::string("EndParamGroup"); });
   if (declarationRefused()) return 1;
   if (!panel_.endGroup()) {
     problem("EndParamGroup without an open group");
@@ -75,9 +75,12 @@ Param declaredParam(ParamKind kind, const wchar_t* displayName, const char* id, 
 int32_t Host::addFloatParam(const wchar_t* displayName, const wchar_t* unit, const char* id,
                             int32_t flags, float minimum, float maximum, float defaultValue,
                             int32_t precision) {
-  log("AddFloatParam " + logText(displayName) + " " + logText(unit) + " " + logId(id) + " " +
-      std::to_string(flags) + " " + formatFloat(minimum) + " " + formatFloat(maximum) + " " +
-      formatFloat(defaultValue) + " " + std::to_string(precision));
+  log([&] {
+    return std::string("AddFloatParam " + logText(displayName) + " " + logText(unit) + " " +
+                       logId(id) + " " + std::to_string(flags) + " " + formatFloat(minimum) + " " +
+                       formatFloat(maximum) + " " + formatFloat(defaultValue) + " " +
+                       std::to_string(precision));
+  });
   if (declarationRefused()) return 1;
   Param param = declaredParam(ParamKind::Float, displayName, id, flags);
   param.unit = toUtf8(unit);
@@ -90,9 +93,11 @@ int32_t Host::addFloatParam(const wchar_t* displayName, const wchar_t* unit, con
 
 int32_t Host::addIntParam(const wchar_t* displayName, const wchar_t* unit, const char* id,
                           int32_t flags, int32_t minimum, int32_t maximum, int32_t defaultValue) {
-  log("AddIntParam " + logText(displayName) + " " + logText(unit) + " " + logId(id) + " " +
-      std::to_string(flags) + " " + std::to_string(minimum) + " " + std::to_string(maximum) + " " +
-      std::to_string(defaultValue));
+  log([&] {
+    return std::string("AddIntParam " + logText(displayName) + " " + logText(unit) + " " +
+                       logId(id) + " " + std::to_string(flags) + " " + std::to_string(minimum) +
+                       " " + std::to_string(maximum) + " " + std::to_string(defaultValue));
+  });
   if (declarationRefused()) return 1;
   Param param = declaredParam(ParamKind::Int, displayName, id, flags);
   param.unit = toUtf8(unit);
@@ -104,8 +109,10 @@ int32_t Host::addIntParam(const wchar_t* displayName, const wchar_t* unit, const
 
 int32_t Host::addBoolParam(const wchar_t* displayName, const char* id, int32_t flags,
                            uint8_t defaultValue) {
-  log("AddBoolParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) + " " +
-      std::to_string(defaultValue));
+  log([&] {
+    return std::string("AddBoolParam " + logText(displayName) + " " + logId(id) + " " +
+                       std::to_string(flags) + " " + std::to_string(defaultValue));
+  });
   if (declarationRefused()) return 1;
   Param param = declaredParam(ParamKind::Bool, displayName, id, flags);
   param.minimum = 0;
@@ -117,9 +124,12 @@ int32_t Host::addBoolParam(const wchar_t* displayName, const char* id, int32_t f
 int32_t Host::addChoiceParam(const wchar_t* displayName, const char* id, int32_t flags,
                              const wchar_t* choices, const int32_t* defaultIndex,
                              int32_t reserved) {
-  log("AddChoiceParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) +
-      " " + logText(choices) + " " + (defaultIndex ? std::to_string(*defaultIndex) : "null") + " " +
-      std::to_string(reserved));
+  log([&] {
+    return std::string("AddChoiceParam " + logText(displayName) + " " + logId(id) + " " +
+                       std::to_string(flags) + " " + logText(choices) + " " +
+                       (defaultIndex ? std::to_string(*defaultIndex) : "null") + " " +
+                       std::to_string(reserved));
+  });
   if (declarationRefused()) return 1;
   if (!defaultIndex) problem("AddChoiceParam " + logId(id) + ": null default index, 0 used");
   Param param = declaredParam(ParamKind::Choice, displayName, id, flags);
@@ -132,8 +142,10 @@ int32_t Host::addChoiceParam(const wchar_t* displayName, const char* id, int32_t
 
 int32_t Host::addPointParam(const wchar_t* displayName, const char* id, int32_t flags, float x,
                             float y) {
-  log("AddPointParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) +
-      " " + formatFloat(x) + " " + formatFloat(y));
+  log([&] {
+    return std::string("AddPointParam " + logText(displayName) + " " + logId(id) + " " +
+                       std::to_string(flags) + " " + formatFloat(x) + " " + formatFloat(y));
+  });
   if (declarationRefused()) return 1;
   Param param = declaredParam(ParamKind::Point, displayName, id, flags);
   param.defaultValue = ParamValue::ofPoint(x, y);
@@ -142,8 +154,11 @@ int32_t Host::addPointParam(const wchar_t* displayName, const char* id, int32_t 
 
 int32_t Host::addAngleParam(const wchar_t* displayName, const char* id, int32_t flags,
                             uint8_t extra, float degrees) {
-  log("AddAngleParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) +
-      " " + std::to_string(extra) + " " + formatFloat(degrees));
+  log([&] {
+    return std::string("AddAngleParam " + logText(displayName) + " " + logId(id) + " " +
+                       std::to_string(flags) + " " + std::to_string(extra) + " " +
+                       formatFloat(degrees));
+  });
   if (declarationRefused()) return 1;
   Param param = declaredParam(ParamKind::Angle, displayName, id, flags);
   param.extra = extra;
@@ -153,8 +168,11 @@ int32_t Host::addAngleParam(const wchar_t* displayName, const char* id, int32_t 
 
 int32_t Host::addColorParam(const wchar_t* displayName, const char* id, int32_t flags, float red,
                             float green, float blue) {
-  log("AddColorParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags) +
-      " " + formatFloat(red) + " " + formatFloat(green) + " " + formatFloat(blue));
+  log([&] {
+    return std::string("AddColorParam " + logText(displayName) + " " + logId(id) + " " +
+                       std::to_string(flags) + " " + formatFloat(red) + " " + formatFloat(green) +
+                       " " + formatFloat(blue));
+  });
   if (declarationRefused()) return 1;
   Param param = declaredParam(ParamKind::Color, displayName, id, flags);
   param.defaultValue = ParamValue::ofColor(red, green, blue);
@@ -162,7 +180,10 @@ int32_t Host::addColorParam(const wchar_t* displayName, const char* id, int32_t 
 }
 
 int32_t Host::addLayerParam(const wchar_t* displayName, const char* id, int32_t flags) {
-  log("AddLayerParam " + logText(displayName) + " " + logId(id) + " " + std::to_string(flags));
+  log([&] {
+    return std::string("AddLayerParam " + logText(displayName) + " " + logId(id) + " " +
+                       std::to_string(flags));
+  });
   if (declarationRefused()) return 1;
   Param param = declaredParam(ParamKind::Layer, displayName, id, flags);
   param.defaultValue = ParamValue::ofLayer(kNoLayer);
@@ -170,7 +191,10 @@ int32_t Host::addLayerParam(const wchar_t* displayName, const char* id, int32_t 
 }
 
 void Host::setParamEnabled(const char* id, const uint8_t* enabled) {
-  log("SetParamEnabled " + logId(id) + " " + (enabled ? std::to_string(*enabled) : "null"));
+  log([&] {
+    return std::string("SetParamEnabled " + logId(id) + " " +
+                       (enabled ? std::to_string(*enabled) : "null"));
+  });
   if (!id || !enabled) {
     problem("SetParamEnabled with a null pointer");
     return;

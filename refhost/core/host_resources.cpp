@@ -132,29 +132,14 @@ uint32_t Host::texture(const TextureKey& key, const void* pixels) {
   return id;
 }
 
-std::vector<uint8_t> Host::readTexture(uint32_t id, int32_t width, int32_t height) {
-  if (!gl_) throw std::logic_error("refhost::Host::readTexture: no GL context attached");
-  gl_->makeCurrent();
-  std::vector<uint8_t> pixels(static_cast<std::size_t>(width) * static_cast<std::size_t>(height) *
-                              4);
-  GLint previous = 0;
-  glGetIntegerv(GL_READ_FRAMEBUFFER_BINDING, &previous);
-  GLuint reader = 0;
-  glGenFramebuffers(1, &reader);
-  glBindFramebuffer(GL_READ_FRAMEBUFFER, reader);
-  glFramebufferTexture2D(GL_READ_FRAMEBUFFER, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D, id, 0);
-  glReadPixels(0, 0, width, height, GL_RGBA, GL_UNSIGNED_BYTE, pixels.data());
-  glBindFramebuffer(GL_READ_FRAMEBUFFER, static_cast<GLuint>(previous));
-  glDeleteFramebuffers(1, &reader);
-  return pixels;
-}
-
 uint32_t Host::allocateTexture(int32_t width, int32_t height, uint32_t internalFormat,
                                uint32_t pixelFormat, uint32_t pixelType, const void* data,
                                int32_t* allocatedWidth, int32_t* allocatedHeight) {
-  log("AllocateTexture " + std::to_string(width) + " " + std::to_string(height) + " " +
-      logHex(internalFormat) + " " + logHex(pixelFormat) + " " + logHex(pixelType) + " " +
-      (data ? "data" : "null"));
+  log([&] {
+    return std::string("AllocateTexture " + std::to_string(width) + " " + std::to_string(height) +
+                       " " + logHex(internalFormat) + " " + logHex(pixelFormat) + " " +
+                       logHex(pixelType) + " " + (data ? "data" : "null"));
+  });
   if (allocatedWidth) *allocatedWidth = 0;
   if (allocatedHeight) *allocatedHeight = 0;
   if (!requireGl("AllocateTexture")) return 0;
@@ -174,7 +159,7 @@ uint32_t Host::allocateTexture(int32_t width, int32_t height, uint32_t internalF
 }
 
 void Host::releaseTexture(uint32_t id) {
-  log("ReleaseTexture " + std::to_string(id));
+  log([&] { return std::string("ReleaseTexture " + std::to_string(id)); });
   // A fetched frame may be given back like an allocated texture, or left to the host.
   std::set<uint32_t>* owner = textures_.count(id) ? &textures_
                               : frames_.count(id) ? &frames_
@@ -189,7 +174,7 @@ void Host::releaseTexture(uint32_t id) {
 }
 
 uint32_t Host::createVertexArray() {
-  log("CreateVertexArray");
+  log([&] { return std::string("CreateVertexArray"); });
   if (!requireGl("CreateVertexArray")) return 0;
   if (vertexArray_ == 0) glGenVertexArrays(1, &vertexArray_);
   return vertexArray_;
@@ -197,8 +182,10 @@ uint32_t Host::createVertexArray() {
 
 uint32_t Host::acquireBuffer(uint32_t target, int64_t size, const void* data, uint32_t usage,
                              uint32_t* hostOutput) {
-  log("AcquireBuffer " + logHex(target) + " " + std::to_string(size) + " " +
-      (data ? "data" : "null") + " " + logHex(usage));
+  log([&] {
+    return std::string("AcquireBuffer " + logHex(target) + " " + std::to_string(size) + " " +
+                       (data ? "data" : "null") + " " + logHex(usage));
+  });
   if (!requireGl("AcquireBuffer")) return 0;
   if (size < 0) {
     problem("AcquireBuffer: negative size " + std::to_string(size) + ", 0 used");
@@ -215,7 +202,7 @@ uint32_t Host::acquireBuffer(uint32_t target, int64_t size, const void* data, ui
 }
 
 void Host::releaseBuffer(uint32_t id) {
-  log("ReleaseBuffer " + std::to_string(id));
+  log([&] { return std::string("ReleaseBuffer " + std::to_string(id)); });
   if (!buffers_.erase(id)) {
     problem("ReleaseBuffer: buffer " + std::to_string(id) +
             " is not one the host handed out, or was given back already");

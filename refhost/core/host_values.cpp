@@ -9,7 +9,9 @@
 namespace refhost {
 
 ParamValue Host::read(const char* operation, const char* id, int32_t time, ParamKind kind) {
-  log(std::string(operation) + " " + logId(id) + " " + std::to_string(time));
+  log([&] {
+    return std::string(std::string(operation) + " " + logId(id) + " " + std::to_string(time));
+  });
   const Param* param = id ? panel_.find(id) : nullptr;
   if (!param) {
     problem(std::string(operation) + ": unknown parameter id '" + logId(id) + "'");
@@ -20,6 +22,7 @@ ParamValue Host::read(const char* operation, const char* id, int32_t time, Param
             kindName(param->kind));
     return ParamValue{};
   }
+  if (readRecord_) readRecord_->push_back(param);
   return param->valueAt(time);
 }
 
@@ -94,8 +97,10 @@ void Host::checkReserved(const char* operation, int32_t reserved) {
 }
 
 void Host::setIntParam(const char* id, int32_t time, int32_t value, int32_t reserved) {
-  log("SetIntParam " + logId(id) + " " + std::to_string(time) + " " + std::to_string(value) + " " +
-      std::to_string(reserved));
+  log([&] {
+    return std::string("SetIntParam " + logId(id) + " " + std::to_string(time) + " " +
+                       std::to_string(value) + " " + std::to_string(reserved));
+  });
   checkReserved("SetIntParam", reserved);
   // The interface has no setter of its own for choices and booleans; they are integers here.
   write("SetIntParam", id, time, ParamValue::ofInt(value),
@@ -103,17 +108,21 @@ void Host::setIntParam(const char* id, int32_t time, int32_t value, int32_t rese
 }
 
 void Host::setFloatParam(const char* id, int32_t time, float value, int32_t reserved) {
-  log("SetFloatParam " + logId(id) + " " + std::to_string(time) + " " + formatFloat(value) + " " +
-      std::to_string(reserved));
+  log([&] {
+    return std::string("SetFloatParam " + logId(id) + " " + std::to_string(time) + " " +
+                       formatFloat(value) + " " + std::to_string(reserved));
+  });
   checkReserved("SetFloatParam", reserved);
   write("SetFloatParam", id, time, ParamValue::ofFloat(value), {ParamKind::Float});
 }
 
 void Host::setPointParam(const char* id, int32_t time, const float* x, const float* y,
                          int32_t reserved) {
-  log("SetPointParam " + logId(id) + " " + std::to_string(time) + " " +
-      (x ? formatFloat(*x) : "null") + " " + (y ? formatFloat(*y) : "null") + " " +
-      std::to_string(reserved));
+  log([&] {
+    return std::string("SetPointParam " + logId(id) + " " + std::to_string(time) + " " +
+                       (x ? formatFloat(*x) : "null") + " " + (y ? formatFloat(*y) : "null") + " " +
+                       std::to_string(reserved));
+  });
   checkReserved("SetPointParam", reserved);
   if (!x || !y) {
     problem("SetPointParam " + logId(id) + ": null coordinate pointer; nothing stored");
@@ -123,8 +132,10 @@ void Host::setPointParam(const char* id, int32_t time, const float* x, const flo
 }
 
 void Host::setAngleParam(const char* id, int32_t time, float degrees, int32_t reserved) {
-  log("SetAngleParam " + logId(id) + " " + std::to_string(time) + " " + formatFloat(degrees) + " " +
-      std::to_string(reserved));
+  log([&] {
+    return std::string("SetAngleParam " + logId(id) + " " + std::to_string(time) + " " +
+                       formatFloat(degrees) + " " + std::to_string(reserved));
+  });
   checkReserved("SetAngleParam", reserved);
   write("SetAngleParam", id, time, ParamValue::ofFloat(degrees), {ParamKind::Angle});
 }
@@ -132,11 +143,13 @@ void Host::setAngleParam(const char* id, int32_t time, float degrees, int32_t re
 void Host::setLayerParam(const char* id, int32_t time, const char* guid, int32_t reserved) {
   // A GUID text is 36 characters; the plug-in's buffer need not hold a terminator after them.
   std::string text = guid ? std::string(guid, strnlen(guid, 36)) : std::string();
-  log("SetLayerParam " + logId(id) + " " + std::to_string(time) + " " +
-      (!guid          ? "null"
-       : text.empty() ? "\"\""
-                      : text) +
-      " " + std::to_string(reserved));
+  log([&] {
+    return std::string("SetLayerParam " + logId(id) + " " + std::to_string(time) + " " +
+                       (!guid          ? "null"
+                        : text.empty() ? "\"\""
+                                       : text) +
+                       " " + std::to_string(reserved));
+  });
   checkReserved("SetLayerParam", reserved);
   if (!guid) {
     problem("SetLayerParam " + logId(id) + ": null GUID; nothing stored");

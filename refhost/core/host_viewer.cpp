@@ -5,28 +5,28 @@
 namespace refhost {
 
 void Host::beginUndo(const char* stepName) {
-  log("BeginUndo " + logText(stepName));
+  log([&] { return std::string("BeginUndo " + logText(stepName)); });
   undo_.begin(stepName ? stepName : "");
 }
 
 void Host::endUndo() {
-  log("EndUndo");
+  log([&] { return std::string("EndUndo"); });
   if (!undo_.end(panel_)) problem("EndUndo without BeginUndo");
 }
 
 void Host::redraw(int32_t reserved) {
-  log("Redraw " + std::to_string(reserved));
+  log([&] { return std::string("Redraw " + std::to_string(reserved)); });
   checkReserved("Redraw", reserved);
   ++redraws_;
 }
 
 void Host::setCursor(int32_t shape) {
-  log("SetCursor " + std::to_string(shape));
+  log([&] { return std::string("SetCursor " + std::to_string(shape)); });
   cursorShapes_.push_back(shape);
 }
 
 int32_t Host::showPopupMenu(const char* items) {
-  log("ShowPopupMenu " + logText(items));
+  log([&] { return std::string("ShowPopupMenu " + logText(items)); });
   popupMenus_.push_back(items ? items : "");
   if (popupChooser_) return popupChooser_(popupMenus_.back());
   if (popupAnswers_.empty()) return -1;  // the user dismissed the menu
@@ -36,16 +36,18 @@ int32_t Host::showPopupMenu(const char* items) {
 }
 
 void Host::requestFrames(const char* guid, int32_t count, const uint32_t* frames, bool ownSource) {
-  std::string line = ownSource ? "RequestFrames " : "RequestLayerFrames " + logId(guid) + " ";
-  line += std::to_string(count);
   FrameRequest request;
   request.layerGuid = ownSource || !guid ? "" : guid;
-  if (count > 0 && !frames) problem(line + ": null frame list");
-  for (int32_t i = 0; frames && i < count; ++i) {
-    request.frames.push_back(frames[i]);
-    line += " " + std::to_string(frames[i]);
-  }
-  log(line);
+  if (count > 0 && !frames)
+    problem((ownSource ? "RequestFrames " : "RequestLayerFrames " + logId(guid) + " ") +
+            std::to_string(count) + ": null frame list");
+  for (int32_t i = 0; frames && i < count; ++i) request.frames.push_back(frames[i]);
+  log([&] {
+    std::string line = ownSource ? "RequestFrames " : "RequestLayerFrames " + logId(guid) + " ";
+    line += std::to_string(count);
+    for (uint32_t frame : request.frames) line += " " + std::to_string(frame);
+    return line;
+  });
   frameRequests_.push_back(std::move(request));
 }
 

@@ -82,7 +82,7 @@ std::string formatValue(ParamKind kind, const ParamValue& value) {
     case ParamKind::Choice:
       return std::to_string(value.integer);
     case ParamKind::Layer:
-      return value.layer;
+      return std::string(value.layer);
   }
   return "";
 }
@@ -144,7 +144,7 @@ bool ParamPanel::endGroup() {
 }
 
 bool ParamPanel::add(Param param) {
-  if (index_.count(param.id)) return false;
+  if (index_.find(param.id) != index_.end()) return false;
   param.group = openGroups_.empty() ? -1 : openGroups_.back();
   PanelItem item{false, static_cast<int>(params_.size())};
   if (param.group < 0)
@@ -163,12 +163,12 @@ std::vector<std::string> ParamPanel::groupPath(const Param& param) const {
   return path;
 }
 
-Param* ParamPanel::find(const std::string& id) {
+Param* ParamPanel::find(std::string_view id) {
   auto found = index_.find(id);
   return found == index_.end() ? nullptr : &params_[found->second];
 }
 
-const Param* ParamPanel::find(const std::string& id) const {
+const Param* ParamPanel::find(std::string_view id) const {
   auto found = index_.find(id);
   return found == index_.end() ? nullptr : &params_[found->second];
 }

@@ -2,10 +2,13 @@
 // defaults, enabled state) and each parameter's animated value.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
+#include <cstring>
 #include <map>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace refhost {
@@ -17,12 +20,42 @@ const char* kindName(ParamKind kind);  // "float", "int", "bool", "choice", "poi
 // GUID text that stands for "no layer"; also every layer parameter's default.
 extern const char* const kNoLayer;
 
+// A layer reference: GUID text of at most 36 characters, held inline so that a value copies
+// without touching the heap (every parameter read copies one).
+class GuidText {
+ public:
+  static constexpr std::size_t kMaxLength = 36;
+  GuidText() : GuidText(kNoLayer) {}
+  // Longer text is cut to 36 characters, as the plug-in's buffers hold no more.
+  GuidText(std::string_view text) {  // NOLINT: converts like the text it holds
+    length_ = static_cast<uint8_t>(std::min(text.size(), kMaxLength));
+    std::memcpy(text_, text.data(), length_);
+    text_[length_] = '\0';
+  }
+  GuidText(const char* text) : GuidText(std::string_view(text ? text : "")) {}  // NOLINT
+  GuidText(const std::string& text) : GuidText(std::string_view(text)) {}       // NOLINT
+  operator std::string() const { return std::string(text_, length_); }          // NOLINT
+  operator std::string_view() const { return {text_, length_}; }                // NOLINT
+  const char* c_str() const { return text_; }
+  const char* data() const { return text_; }
+  std::size_t size() const { return length_; }
+  bool empty() const { return length_ == 0; }
+  friend bool operator==(const GuidText& a, const GuidText& b) {
+    return std::string_view(a) == std::string_view(b);
+  }
+  friend bool operator!=(const GuidText& a, const GuidText& b) { return !(a == b); }
+
+ private:
+  char text_[kMaxLength + 1];
+  uint8_t length_ = 0;
+};
+
 // One value of any kind. Float and angle use number[0], point number[0..1], colour
 // number[0..2] (red, green, blue); int, bool and choice use integer; layer uses layer.
 struct ParamValue {
   std::array<float, 3> number{};
   int32_t integer = 0;
-  std::string layer = kNoLayer;
+  GuidText layer;
 
   static ParamValue ofFloat(float value);
   static ParamValue ofInt(int32_t value);
@@ -104,16 +137,16 @@ class ParamPanel {
   // Display names from the outermost group down to the parameter's own group.
   std::vector<std::string> groupPath(const Param& param) const;
 
-  // Null when the id was never declared.
-  Param* find(const std::string& id);
-  const Param* find(const std::string& id) const;
+  // Null when the id was never declared. Looking up allocates nothing.
+  Param* find(std::string_view id);
+  const Param* find(std::string_view id) const;
 
  private:
   std::vector<Param> params_;
   std::vector<ParamGroup> groups_;
   std::vector<PanelItem> topLevel_;
   std::vector<int> openGroups_;
-  std::map<std::string, std::size_t> index_;
+  std::map<std::string, std::size_t, std::less<>> index_;
 };
 
 }  // namespace refhost

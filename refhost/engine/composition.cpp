@@ -1,6 +1,7 @@
 // Installing a composition into the host.
 #include "refhost/engine/composition.h"
 
+#include "refhost/engine.h"
 #include "refhost/pipeline/frame_prefetch.h"
 
 namespace refhost {
@@ -36,13 +37,20 @@ FrameSource frameSourceOf(std::shared_ptr<MediaSource> source) {
 
 const char* const kDefaultOwnLayerGuid = "5ec0a11e-0000-4000-8000-000000000001";
 
-InstalledComposition installComposition(Host& host, const Composition& composition) {
+InstalledComposition installComposition(Engine& engine, const Composition& composition) {
   InstalledComposition installed;
   installed.source = opened(composition.source);
   installed.sourceFrameCount =
       installed.source->frameCount() > 0 ? installed.source->frameCount() : composition.duration;
-  host.setTimeInfo(composition.width, composition.height, composition.frameRate);
-  host.setSourceFrames(frameSourceOf(installed.source));
+  FrameSettings settings;
+  settings.width = composition.width;
+  settings.height = composition.height;
+  settings.frameRate = composition.frameRate;
+  settings.pixelAspect = composition.pixelAspect;
+  settings.sourceFrameCount = installed.sourceFrameCount;
+  settings.ownLayerGuid = composition.ownLayerGuid;
+  engine.setFrameSettings(settings);
+  engine.setSourceFrames(frameSourceOf(installed.source));
 
   Layer own;
   own.guid = composition.ownLayerGuid;
@@ -53,12 +61,12 @@ InstalledComposition installComposition(Host& host, const Composition& compositi
   own.width = composition.width;
   own.height = composition.height;
   own.source = frameSourceOf(installed.source);
-  host.addLayer(own);
+  engine.addLayer(own);
 
   for (const CompositionLayer& entry : composition.layers) {
     Layer layer = entry.layer;
     layer.source = frameSourceOf(opened(entry.media));
-    host.addLayer(layer);
+    engine.addLayer(layer);
   }
   return installed;
 }

@@ -1,5 +1,5 @@
 // A composition: its size, rate, length and pixel aspect, the effect's own layer with its
-// media source, and the other layers with theirs; installing it fills a Host.
+// media source, and the other layers with theirs; installing it fills an engine.
 #pragma once
 
 #include <cstdint>
@@ -9,6 +9,10 @@
 
 #include "refhost/core/host.h"
 #include "refhost/media/media_source.h"
+
+namespace refhost {
+class Engine;
+}
 
 namespace refhost {
 
@@ -43,10 +47,10 @@ struct InstalledComposition {
 // source that does not change over time is converted once per size.
 FrameSource frameSourceOf(std::shared_ptr<MediaSource> source);
 
-// Sets the host's timing to the composition's size and rate, lists the own layer first (kind
-// 0, frames 0 to duration - 1, the composition's size, identity placement) and then the other
-// layers in order, and feeds the own source and each layer from its media. Throws
-// std::runtime_error naming the file when a media file cannot be opened.
-InstalledComposition installComposition(Host& host, const Composition& composition);
+// Sets the engine's frame to the composition's size, rate and pixel aspect, lists the own
+// layer first (kind 0, frames 0 to duration - 1, the composition's size, identity placement)
+// and then the other layers in order, and feeds the own source and each layer from its media.
+// Throws std::runtime_error naming the file when a media file cannot be opened.
+InstalledComposition installComposition(Engine& engine, const Composition& composition);
 
 }  // namespace refhost

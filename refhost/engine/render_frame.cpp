@@ -32,13 +32,26 @@ int32_t frameToMilliseconds(int32_t frame, double frameRate) {
 
 RenderFrame::RenderFrame(Host& host, const FrameSettings& settings, int32_t frame)
     : host_(host), ownLayerGuid_(settings.ownLayerGuid) {
+  std::vector<uint8_t> pixels = host.sourceFrames()(frame, settings.width, settings.height);
+  context_.source = host.createTexture(settings.width, settings.height, pixels.data());
+  context_.output = host.createTexture(settings.width, settings.height);
+  context_.second = host.createTexture(settings.width, settings.height);
+  fill(settings, frame);
+}
+
+RenderFrame::RenderFrame(Host& host, const FrameSettings& settings, int32_t frame,
+                         const TextureRecord& source, const TextureRecord& output)
+    : host_(host), ownLayerGuid_(settings.ownLayerGuid), ownsSourceAndOutput_(false) {
+  context_.source = source;
+  context_.output = output;
+  context_.second = host.createTexture(settings.width, settings.height);
+  fill(settings, frame);
+}
+
+void RenderFrame::fill(const FrameSettings& settings, int32_t frame) {
   WispRenderContext& c = context_;
   c.width = settings.width;
   c.height = settings.height;
-  std::vector<uint8_t> pixels = host.sourceFrames()(frame, settings.width, settings.height);
-  c.source = host.createTexture(settings.width, settings.height, pixels.data());
-  c.output = host.createTexture(settings.width, settings.height);
-  c.second = host.createTexture(settings.width, settings.height);
   c.time = frame;
   c.frameNumber = static_cast<uint32_t>(frame);
   c.sourceFrameIndex = frame;
@@ -60,18 +73,11 @@ RenderFrame::RenderFrame(Host& host, const FrameSettings& settings, int32_t fram
 }
 
 RenderFrame::~RenderFrame() {
-  host_.deleteTexture(context_.source.id);
-  host_.deleteTexture(context_.output.id);
+  if (ownsSourceAndOutput_) {
+    host_.deleteTexture(context_.source.id);
+    host_.deleteTexture(context_.output.id);
+  }
   host_.deleteTexture(context_.second.id);
-}
-
-RgbaImage RenderFrame::readOutput() {
-  RgbaImage image;
-  image.width = context_.width;
-  image.height = context_.height;
-  image.pixels = flipRows(host_.readTexture(context_.output.id, context_.width, context_.height),
-                          context_.width, context_.height);
-  return image;
 }
 
 WispViewerContext makeViewerContext(int32_t width, int32_t height, double viewScaleX,

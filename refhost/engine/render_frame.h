@@ -7,7 +7,6 @@
 #include <string>
 
 #include "refhost/core/host.h"
-#include "refhost/media/rgba_image.h"
 
 namespace refhost {
 
@@ -28,26 +27,34 @@ struct FrameSettings {
   std::string ownLayerGuid;
 };
 
-// One frame's render context. Its three textures (the own source's frame from the host's
-// frame source, the output and a second texture of the frame's size) are host textures, not
-// counted as the plug-in's, and are deleted with this object. Parameter time, frame number and
-// source frame index are all the frame number; the layer-space matrix and both view matrices
-// are the identity (the lens term of a 50 mm camera in element 5).
+// One frame's render context. Parameter time, frame number and source frame index are all the
+// frame number; the layer-space matrix and both view matrices are the identity (the lens term
+// of a 50 mm camera in element 5). Its textures are host textures, not counted as the
+// plug-in's: the ones this object made (the own source's frame from the host's frame source,
+// the output, a second texture of the frame's size) are deleted with it; a caller's are only
+// borrowed.
 class RenderFrame {
  public:
+  // Makes all three textures.
   RenderFrame(Host& host, const FrameSettings& settings, int32_t frame);
+  // Borrows the caller's source and output and makes the second texture.
+  RenderFrame(Host& host, const FrameSettings& settings, int32_t frame, const TextureRecord& source,
+              const TextureRecord& output);
   ~RenderFrame();
   RenderFrame(const RenderFrame&) = delete;
   RenderFrame& operator=(const RenderFrame&) = delete;
 
   WispRenderContext& context() { return context_; }
-  // The output texture's pixels, top row first (the frame's top edge, t = 1, comes first).
-  RgbaImage readOutput();
+  const WispRenderContext& context() const { return context_; }
+  int32_t frame() const { return static_cast<int32_t>(context_.frameNumber); }
 
  private:
+  void fill(const FrameSettings& settings, int32_t frame);
+
   Host& host_;
   std::string ownLayerGuid_;
   WispRenderContext context_{};
+  bool ownsSourceAndOutput_ = true;
 };
 
 // The viewer context of messages 1003 to 1006: no name, the frame size, the scales, the time

@@ -30,7 +30,7 @@ class AsyncFrameSink : public FrameSink {
   // exception the sink underneath threw), and by every later call.
   void write(int32_t frame, const RgbaImage& picture) override;
   // The same without the copy.
-  void write(int32_t frame, RgbaImage&& picture);
+  void write(int32_t frame, RgbaImage&& picture) override;
   // Waits until every frame is written, throws the first error if there was one, then commits
   // the sink underneath.
   std::vector<std::string> commit() override;

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "refhost/media/image_files.h"
@@ -36,6 +37,8 @@ class FrameSink {
   virtual ~FrameSink() = default;  // deletes whatever was not committed
   // A picture of the sink's size, top row first.
   virtual void write(int32_t frame, const RgbaImage& picture) = 0;
+  // The same for a picture the caller is done with; a sink that keeps pictures takes it over.
+  virtual void write(int32_t frame, RgbaImage&& picture) { write(frame, std::as_const(picture)); }
   // Moves everything written into place, all or nothing; returns the final names. Every write
   // and the flush at the end is checked: errors name the final name and the system's reason.
   virtual std::vector<std::string> commit() = 0;

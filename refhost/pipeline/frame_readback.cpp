@@ -86,4 +86,10 @@ RgbaImage FrameReadback::collect() {
   return picture;
 }
 
+RgbaImage readBack(uint32_t texture, int32_t width, int32_t height) {
+  FrameReadback readback(width, height, 1);
+  readback.start(texture);
+  return readback.collect();
+}
+
 }  // namespace refhost

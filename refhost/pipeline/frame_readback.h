@@ -42,4 +42,9 @@ class FrameReadback {
   std::deque<Pending> pending_;
 };
 
+// One texture read back at once through a FrameReadback of depth 1, top row first: for a
+// picture wanted now (a test, a still the viewer saves), on the same path a render's frames
+// take. Needs the GL context current.
+RgbaImage readBack(uint32_t texture, int32_t width, int32_t height);
+
 }  // namespace refhost

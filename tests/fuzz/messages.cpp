@@ -73,6 +73,7 @@ Warm warmStates[2];
 class Session {
  public:
   explicit Session(Warm& warm) : warm_(warm), host_(*module) {
+    host_.setCallLogging(true);  // what a failing input made the plug-in call is printed
     host_.shareGl(warm.gl);
     registry_ = warm.registry;
     registries_.push_back(registry_);

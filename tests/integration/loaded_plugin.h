@@ -20,6 +20,7 @@ class LoadedPlugin : public ::testing::Test {
  protected:
   void SetUp() override {
     host_ = std::make_unique<refhost::Host>(module_);
+    host_->setCallLogging(true);
     ASSERT_EQ(host_->send(0), 1);
     ASSERT_EQ(host_->send(2), 1);
     ASSERT_EQ(host_->send(3), 1);

@@ -37,7 +37,8 @@ class Viewer : public ViewerEvents {
     EXPECT_EQ(host_.outstandingTextures() + host_.outstandingBuffers(), 0);
     for (const auto& error : host_.gl()->errors()) ADD_FAILURE() << "GL error: " << error.text;
     host_.gl()->clearErrors();
-    return host_.readTexture(target_.id, kW, kH);
+    // In GL's row order, so that row 0 is the frame's bottom as in corner space.
+    return refhost::flipRows(refhost::readBack(target_.id, kW, kH).pixels, kW, kH);
   }
 
   // Largest alpha inside a box of corner pixels.

@@ -137,6 +137,7 @@ TEST(ParameterDeclaration, LayerLabelsFollowTheHostProductCode) {
   for (const auto& row : table) {
     SCOPED_TRACE(row.hostId);
     refhost::Host host(module);
+    host.setCallLogging(true);
     host.setHostId(row.hostId);
     ASSERT_EQ(host.send(0), 1);
     ASSERT_EQ(host.send(2), 1);

@@ -15,6 +15,7 @@
 #include "refhost/core/host.h"
 #include "refhost/core/module.h"
 #include "refhost/engine/render_frame.h"
+#include "refhost/pipeline/frame_readback.h"
 
 using Rgba = std::array<uint8_t, 4>;
 
@@ -55,6 +56,7 @@ class RenderFixture {
                          int32_t width = kWidth, int32_t height = kHeight)
       : width_(width), height_(height) {
     host_ = std::make_unique<refhost::Host>(module_);
+    host_->setCallLogging(true);
     host_->attachGl(profile);
     host_->setTimeInfo(width, height, 25.0);
     refhost::Layer own;
@@ -118,7 +120,9 @@ class RenderFixture {
       EXPECT_EQ(static_cast<uint32_t>(bound), target.context().source.id);
       EXPECT_EQ(minifying, GL_NEAREST);
       EXPECT_EQ(magnifying, GL_NEAREST);
-      pixels = host_->readTexture(target.context().output.id, width_, height_);
+      // Read back as the host reads its frames, then in GL's row order like the sources.
+      pixels = refhost::flipRows(
+          refhost::readBack(target.context().output.id, width_, height_).pixels, width_, height_);
     }
     EXPECT_EQ(host_->outstandingTextures(), 0);
     EXPECT_EQ(host_->outstandingBuffers(), 0);

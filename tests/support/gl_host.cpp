@@ -12,6 +12,7 @@ bool GlHostTest::startHost(refhost::GlProfile profile, int width, int height) {
   // tests of printed logs need every compile to speak. Read when the driver starts.
   setenv("MESA_SHADER_CACHE_DISABLE", "true", 1);
   host_ = std::make_unique<refhost::Host>();
+  host_->setCallLogging(true);
   try {
     host_->attachGl(profile);
   } catch (const std::exception& e) {

@@ -8,6 +8,7 @@
 namespace testsupport {
 
 InMemoryHost::InMemoryHost(int32_t hostId) {
+  setCallLogging(true);
   setHostId(hostId);
   veltrane::declareParameters(handle(), &api());
   clearCallLog();

@@ -1,5 +1,5 @@
 // The cursor table; docs/viewer.md shows it to users.
-#include "cursor_shapes.h"
+#include "viewer/cursor_shapes.h"
 
 #include <GLFW/glfw3.h>
 

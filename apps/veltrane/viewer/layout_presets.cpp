@@ -4,7 +4,7 @@
 // direction and takes the cut's number as its input, the region it divides keeps its own. A
 // Radial layout numbers each sector by the cut at its end in the direction of increasing
 // angle and never shows input 0.
-#include "layout_presets.h"
+#include "viewer/layout_presets.h"
 
 #include <cmath>
 #include <stdexcept>

@@ -1,5 +1,5 @@
 // Widget choice, ranges, formats, layer options, keyframe toggles and edit step names.
-#include "panel_values.h"
+#include "viewer/panel_values.h"
 
 #include <algorithm>
 #include <cfloat>

@@ -1,5 +1,5 @@
 // Canvas texture, picture copy and presentation through framebuffer blits.
-#include "view_canvas.h"
+#include "viewer/view_canvas.h"
 
 #include <GL/glew.h>
 

@@ -5,7 +5,7 @@
 
 #include <cstdint>
 
-#include "view_mapping.h"
+#include "viewer/view_mapping.h"
 
 namespace veltrane_viewer {
 

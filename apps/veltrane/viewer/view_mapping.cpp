@@ -1,5 +1,5 @@
 // Zoom, pan and the framebuffer <-> corner-space conversions of the viewer.
-#include "view_mapping.h"
+#include "viewer/view_mapping.h"
 
 #include <algorithm>
 #include <cmath>

@@ -1,5 +1,5 @@
 // Menu bar, side panel (parameters and history), timeline and status line.
-#include "viewer_chrome.h"
+#include "viewer/viewer_chrome.h"
 
 #include <imgui.h>
 
@@ -7,8 +7,8 @@
 #include <cmath>
 #include <cstdio>
 
-#include "layout_presets.h"
-#include "viewer_panel.h"
+#include "viewer/layout_presets.h"
+#include "viewer/viewer_panel.h"
 
 namespace veltrane_viewer {
 namespace {

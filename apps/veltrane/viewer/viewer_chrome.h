@@ -7,8 +7,8 @@
 #include <string>
 #include <vector>
 
-#include "panel_values.h"
-#include "viewer_session.h"
+#include "viewer/panel_values.h"
+#include "viewer/viewer_session.h"
 
 namespace veltrane_viewer {
 

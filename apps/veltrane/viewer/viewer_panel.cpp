@@ -1,5 +1,5 @@
 // Groups, widgets and keyframe toggles of the parameter panel.
-#include "viewer_panel.h"
+#include "viewer/viewer_panel.h"
 
 #include <imgui.h>
 

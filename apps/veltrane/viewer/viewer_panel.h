@@ -4,8 +4,8 @@
 
 #include <vector>
 
-#include "panel_values.h"
-#include "viewer_session.h"
+#include "viewer/panel_values.h"
+#include "viewer/viewer_session.h"
 
 namespace veltrane_viewer {
 

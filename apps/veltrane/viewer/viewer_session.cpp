@@ -1,16 +1,15 @@
-// The viewer's messages to the plug-in, its change reports, renders and panel edits.
-#include "viewer_session.h"
+// The viewer's scene on the engine: its events, renders, panel edits and saving.
+#include "viewer/viewer_session.h"
 
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <filesystem>
-#include <fstream>
 #include <stdexcept>
 
-#include "layout_presets.h"
-#include "panel_values.h"
-#include "scene_saving.h"
+#include "scene/scene_engine.h"
+#include "viewer/layout_presets.h"
+#include "viewer/panel_values.h"
 
 namespace veltrane_viewer {
 namespace {
@@ -19,11 +18,6 @@ using Clock = std::chrono::steady_clock;
 
 double secondsSince(Clock::time_point start) {
   return std::chrono::duration<double>(Clock::now() - start).count();
-}
-
-nlohmann::ordered_json readDocument(const std::string& path) {
-  std::ifstream in(path);
-  return nlohmann::ordered_json::parse(in);
 }
 
 std::string directoryOf(const std::string& path) {
@@ -36,19 +30,19 @@ std::string directoryOf(const std::string& path) {
 ViewerSession::ViewerSession(const veltrane_cli::Scene& scene, const std::string& modulePath,
                              refhost::GlProfile profile,
                              std::unique_ptr<refhost::GlContext> context, int32_t frame)
-    : scene_(scene),
-      document_(readDocument(scene.file)),
-      session_(scene, modulePath, profile, 0, std::move(context)) {
-  const refhost::FrameSettings& settings = session_.frameSettings();
-  viewer_ = refhost::makeViewerContext(settings.width, settings.height, 1, 1, 1, frame);
+    : scene_(scene) {
+  veltrane_cli::SceneEngineOptions options;
+  options.modulePath = modulePath;
+  options.profile = profile;
+  options.context = std::move(context);
+  engine_ = veltrane_cli::startScene(scene_, std::move(options));
   setFrame(frame);
-  reported_ = snapshot();
-  saved_ = reported_;
+  saved_ = snapshot();
 }
 
 std::vector<refhost::ParamState> ViewerSession::snapshot() {
   std::vector<refhost::ParamState> states;
-  for (const refhost::Param& param : host().panel().params()) states.push_back(param.state);
+  for (const refhost::Param& param : engine_->panel().params()) states.push_back(param.state);
   return states;
 }
 
@@ -62,122 +56,76 @@ void ViewerSession::attempt(const std::string& what, Action&& action) {
   }
 }
 
-int32_t ViewerSession::send(int32_t message, void* context, void* event,
-                            std::initializer_list<int32_t> expected) {
-  try {
-    int32_t result = session_.plugin().send(message, context, event, expected);
-    collectViewerRecords();
-    return result;
-  } catch (...) {
-    collectViewerRecords();
-    throw;
-  }
-}
-
-void ViewerSession::collectViewerRecords() {
-  refhost::Host& host = this->host();
-  if (!host.cursorShapes().empty()) cursor_ = host.cursorShapes().back();
-  redrawRequested_ = redrawRequested_ || host.redrawCount() > 0;
-  host.clearViewerRecords();
-}
-
-bool ViewerSession::takeRedrawRequest() {
-  bool requested = redrawRequested_;
-  redrawRequested_ = false;
-  return requested;
-}
-
-// Every parameter whose state changed since the last report is reported once with message 7,
-// in declaration order, as the host does after any edit.
-void ViewerSession::reportChanges() {
-  const std::vector<refhost::Param>& params = host().panel().params();
-  for (std::size_t i = 0; i < params.size() && i < reported_.size(); ++i) {
-    if (params[i].state == reported_[i]) continue;
-    reported_[i] = params[i].state;
-    changedSinceRender_ = true;
-    WispParamEvent event{params[i].id.c_str()};
-    attempt("message 7 for " + params[i].id, [&] { send(7, nullptr, &event, {1}); });
-  }
+template <typename Event>
+refhost::ViewerOutcome ViewerSession::event(const std::string& what, Event&& run) {
+  refhost::ViewerOutcome outcome;
+  attempt(what, [&] { outcome = run(); });
+  return outcome;
 }
 
 void ViewerSession::setFrame(int32_t frame) {
   int32_t last = std::max(scene_.composition.duration - 1, 0);
   frame_ = std::clamp(frame, 0, last);
   viewer_.time = frame_;
+  engine_->setViewer(viewer_);
 }
 
 void ViewerSession::setView(double viewScale, double uiScale, const refhost::Matrix4& projection) {
   viewer_.viewScaleX = viewer_.viewScaleY = viewScale;
   viewer_.uiScale = uiScale;
-  std::copy(projection.begin(), projection.end(), viewer_.projection);
-}
-
-int32_t ViewerSession::sendPointer(int32_t message, EventPosition position, double button) {
-  WispPointerEvent event{position.x, position.y, button};
-  int32_t result = 0;
-  attempt("message " + std::to_string(message),
-          [&] { result = send(message, &viewer_, &event, {}); });
-  reportChanges();
-  return result;
+  viewer_.projection = projection;
+  engine_->setViewer(viewer_);
 }
 
 void ViewerSession::pointerMove(EventPosition position, bool held) {
-  sendPointer(1004, position, held ? 1.0 : 0.0);
+  event("message 1004", [&] { return engine_->pointerMove(position.x, position.y, held); });
 }
 
 bool ViewerSession::pointerPress(EventPosition position) {
   finishEdit();
-  return sendPointer(1005, position, 1.0) != 0;
+  return event("message 1005", [&] {
+           return engine_->pointerPress(position.x, position.y);
+         }).result != 0;
 }
 
-void ViewerSession::pointerRelease(EventPosition position) { sendPointer(1006, position, 0.0); }
+void ViewerSession::pointerRelease(EventPosition position) {
+  event("message 1006", [&] { return engine_->pointerRelease(position.x, position.y); });
+}
 
 bool ViewerSession::key(uint32_t keysym, bool down) {
-  WispKeyEvent event{keysym};
-  int32_t message = down ? 1007 : 1008;
-  int32_t result = 0;
-  attempt("message " + std::to_string(message), [&] {
-    result = send(message, &viewer_, &event, {0, 1});
-  });
-  return result == 1;
+  const char* what = down ? "message 1007" : "message 1008";
+  return event(what, [&] { return engine_->key(keysym, down); }).result == 1;
 }
 
 void ViewerSession::openLayerMenu() {
   finishEdit();
-  attempt("the layer menu", [&] {
-    if (send(1012, &viewer_, nullptr, {0, 1}) != 1) return;
-    WispLayerPickerContext picker{session_.frameSettings().ownLayerGuid.c_str()};
-    send(1013, &picker, nullptr, {0, 1});
-  });
-  reportChanges();
+  event("the layer menu", [&] { return engine_->openLayerMenu(); });
 }
 
 void ViewerSession::editValue(const std::string& id, const refhost::ParamValue& value) {
-  const refhost::Param& param = host().param(id);
+  const refhost::Param& param = engine_->param(id);
   refhost::ParamState state = stateAfterEdit(param, frame_, value);
   if (state == param.state) return;
   if (editing_ != id) {
     finishEdit();
-    host().beginEdit(editStepName(host().panel(), param));
+    engine_->beginEdit(editStepName(engine_->panel(), param));
     editing_ = id;
   }
-  host().editState(id, state);
-  reportChanges();
+  attempt("message 7 for " + id, [&] { engine_->edit(id, state); });
 }
 
 void ViewerSession::finishEdit() {
   if (editing_.empty()) return;
-  host().endEdit();
+  engine_->endEdit();
   editing_.clear();
 }
 
 void ViewerSession::toggleKey(const std::string& id) {
   finishEdit();
-  const refhost::Param& param = host().param(id);
-  host().beginEdit(keyToggleStepName(host().panel(), param, frame_));
-  host().editState(id, stateAfterKeyToggle(param, frame_));
-  host().endEdit();
-  reportChanges();
+  const refhost::Param& param = engine_->param(id);
+  engine_->beginEdit(keyToggleStepName(engine_->panel(), param, frame_));
+  attempt("message 7 for " + id, [&] { engine_->edit(id, stateAfterKeyToggle(param, frame_)); });
+  engine_->endEdit();
 }
 
 void ViewerSession::applyPreset(std::size_t index) {
@@ -187,37 +135,35 @@ void ViewerSession::applyPreset(std::size_t index) {
     sources.push_back(layer.layer.guid);
   const refhost::Composition& composition = scene_.composition;
   std::vector<ParamEdit> edits = presetEdits(index, composition.width, composition.height, sources);
-  host().beginEdit(std::string("Preset ") + layoutPresets().at(index).name);
-  for (const ParamEdit& edit : edits) {
-    refhost::ParamState state;  // a preset's values hold at every frame
-    state.value = edit.value;
-    host().editState(edit.id, state);
-  }
-  host().endEdit();
-  reportChanges();
+  engine_->beginEdit(std::string("Preset ") + layoutPresets().at(index).name);
+  attempt("the preset", [&] {
+    for (const ParamEdit& edit : edits) {
+      refhost::ParamState state;  // a preset's values hold at every frame
+      state.value = edit.value;
+      engine_->host().editState(edit.id, state);
+    }
+    engine_->reportChanges();
+  });
+  engine_->endEdit();
 }
 
 bool ViewerSession::undo() {
   finishEdit();
-  bool done = host().undo();
-  reportChanges();
-  return done;
+  return event("undo", [&] { return engine_->undoSteps(1); }).result == 1;
 }
 
 bool ViewerSession::redo() {
   finishEdit();
-  bool done = host().redo();
-  reportChanges();
-  return done;
+  return event("redo", [&] { return engine_->redoSteps(1); }).result == 1;
 }
 
 bool ViewerSession::renderIfChanged() {
-  if (!changedSinceRender_ && renderedFrame_ == frame_) return false;
-  changedSinceRender_ = false;
+  std::vector<refhost::ParamState> now = snapshot();
+  if (renderedFrame_ == frame_ && now == shown_) return false;
+  shown_ = std::move(now);
   renderedFrame_ = frame_;
   Clock::time_point start = Clock::now();
-  attempt("render of frame " + std::to_string(frame_),
-          [&] { picture_ = session_.renderFrame(frame_); });
+  attempt("render of frame " + std::to_string(frame_), [&] { picture_ = engine_->render(frame_); });
   stats_.renderSeconds += secondsSince(start);
   ++stats_.renders;
   return true;
@@ -225,26 +171,17 @@ bool ViewerSession::renderIfChanged() {
 
 void ViewerSession::drawOverlay(uint32_t texture, int32_t width, int32_t height) {
   Clock::time_point start = Clock::now();
-  refhost::Host& host = this->host();
-  host.setDrawTarget(texture, width, height);
-  attempt("overlay", [&] { send(1003, &viewer_, nullptr, {1}); });
-  host.setDrawTarget(0, 0, 0);
+  attempt("overlay", [&] { engine_->drawOverlay(texture, width, height); });
   stats_.overlaySeconds += secondsSince(start);
   ++stats_.overlays;
 }
 
-bool ViewerSession::modified() {
-  const std::vector<refhost::Param>& params = host().panel().params();
-  for (std::size_t i = 0; i < params.size() && i < saved_.size(); ++i) {
-    if (!(params[i].state == saved_[i])) return true;
-  }
-  return false;
-}
+bool ViewerSession::modified() { return snapshot() != saved_; }
 
 void ViewerSession::save(const std::string& path) {
   finishEdit();
-  std::string to = directoryOf(path);
-  writeScene(path, savedScene(document_, host().panel(), directoryOf(scene_.file), to));
+  veltrane_cli::writeScene(path,
+                           veltrane_cli::savedScene(scene_, engine_->panel(), directoryOf(path)));
   saved_ = snapshot();
 }
 

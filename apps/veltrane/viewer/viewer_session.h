@@ -12,10 +12,9 @@
 #include <string>
 #include <vector>
 
-#include "refhost/engine/render_frame.h"
-#include "scene_file.h"
-#include "scene_session.h"
-#include "view_mapping.h"
+#include "refhost/engine.h"
+#include "scene/scene_document.h"
+#include "viewer/view_mapping.h"
 
 namespace veltrane_viewer {
 
@@ -29,7 +28,7 @@ struct ViewerStats {
 class ViewerSession {
  public:
   // Sets the scene up in the plug-in (as `veltrane render` does) drawing in `context`, the
-  // window's. Throws what SceneSession throws: FieldError for a bad parameter value, a runtime
+  // window's. Throws what startScene throws: FieldError for a bad parameter value, a runtime
   // error naming the module or the message that failed.
   ViewerSession(const veltrane_cli::Scene& scene, const std::string& modulePath,
                 refhost::GlProfile profile, std::unique_ptr<refhost::GlContext> context,
@@ -37,7 +36,8 @@ class ViewerSession {
   ViewerSession(const ViewerSession&) = delete;
   ViewerSession& operator=(const ViewerSession&) = delete;
 
-  refhost::Host& host() { return session_.host(); }
+  refhost::Engine& engine() { return *engine_; }
+  refhost::Host& host() { return engine_->host(); }
   const refhost::Composition& composition() const { return scene_.composition; }
 
   int32_t frame() const { return frame_; }
@@ -76,9 +76,9 @@ class ViewerSession {
   void drawOverlay(uint32_t texture, int32_t width, int32_t height);
 
   // The cursor number the plug-in asked for last.
-  int32_t cursor() const { return cursor_; }
+  int32_t cursor() const { return engine_->cursor(); }
   // True once after the plug-in asked for a redraw.
-  bool takeRedrawRequest();
+  bool takeRedrawRequest() { return engine_->takeRedrawRequest(); }
   // What the status line shows: the last failure, or a note such as where the scene was saved.
   const std::string& status() const { return status_; }
   bool statusIsFailure() const { return statusIsFailure_; }
@@ -94,31 +94,25 @@ class ViewerSession {
   void save(const std::string& path);
 
   // Messages 4 and 1.
-  void finish() { session_.finish(); }
+  void finish() { engine_->finish(); }
 
  private:
   template <typename Action>
   void attempt(const std::string& what, Action&& action);
-  int32_t send(int32_t message, void* context, void* event,
-               std::initializer_list<int32_t> expected);
-  int32_t sendPointer(int32_t message, EventPosition position, double button);
-  void reportChanges();
-  void collectViewerRecords();
+  // Runs a viewer event; a failure becomes the status, and any change asks for a new render.
+  template <typename Event>
+  refhost::ViewerOutcome event(const std::string& what, Event&& run);
   std::vector<refhost::ParamState> snapshot();
 
   veltrane_cli::Scene scene_;
-  nlohmann::ordered_json document_;  // the scene file as written, for saving
-  veltrane_cli::SceneSession session_;
-  WispViewerContext viewer_{};
+  std::unique_ptr<refhost::Engine> engine_;
+  refhost::ViewerSettings viewer_;
   int32_t frame_ = 0;
   int32_t renderedFrame_ = -1;
-  bool changedSinceRender_ = true;
   std::unique_ptr<refhost::RenderFrame> picture_;
-  std::vector<refhost::ParamState> reported_;
+  std::vector<refhost::ParamState> shown_;  // the values of the picture on screen
   std::vector<refhost::ParamState> saved_;
   std::string editing_;  // the parameter whose edit step is open
-  int32_t cursor_ = 0;
-  bool redrawRequested_ = false;
   std::string status_;
   bool statusIsFailure_ = false;
   ViewerStats stats_;

@@ -1,6 +1,6 @@
 // The window, its event loop, the pointer and key bindings, and the popup menu the layer
 // picker asks for.
-#include "viewer_window.h"
+#include "viewer/viewer_window.h"
 
 #include <imgui.h>
 #include <imgui_impl_glfw.h>
@@ -15,11 +15,11 @@
 #include <stdexcept>
 #include <vector>
 
-#include "cursor_shapes.h"
-#include "view_canvas.h"
-#include "viewer_chrome.h"
-#include "viewer_session.h"
-#include "window_system.h"
+#include "viewer/cursor_shapes.h"
+#include "viewer/view_canvas.h"
+#include "viewer/viewer_chrome.h"
+#include "viewer/viewer_session.h"
+#include "viewer/window_system.h"
 
 namespace veltrane_viewer {
 namespace {

@@ -7,7 +7,7 @@
 #include <string>
 
 #include "refhost/gl/gl_context.h"
-#include "scene_file.h"
+#include "scene/scene_document.h"
 
 namespace veltrane_viewer {
 

@@ -1,5 +1,5 @@
 // GLFW and Dear ImGui set-up, and the key and menu translations of the viewer window.
-#include "window_system.h"
+#include "viewer/window_system.h"
 
 #include <imgui.h>
 #include <imgui_impl_glfw.h>

@@ -73,9 +73,9 @@ TEST(RenderCommand, TheShippedDemoSceneRenders) {
 
 // The bare-GL replica of `--floor` draws the effect's own picture (the bench stops when it does
 // not); every case gets its times.
-TEST(BenchCommand, ReportsEveryCaseWithItsFloor) {
+TEST(BenchCommand, ReportsEveryCase) {
   CliRun run = runCli({"bench", "--sizes", "64x36,96x54", "--cuts", "1,3,8", "--repeat", "1",
-                       "--warmup", "0", "--floor", "--json"});
+                       "--warmup", "0", "--json"});
   ASSERT_EQ(run.status, 0) << run.err;
   nlohmann::json rows = nlohmann::json::parse(run.out)["results"];
   ASSERT_EQ(rows.size(), 12u);  // 2 sizes x 3 cut counts x 2 input kinds
@@ -83,15 +83,7 @@ TEST(BenchCommand, ReportsEveryCaseWithItsFloor) {
   EXPECT_EQ(rows.back()["cuts"], 8);
   EXPECT_EQ(rows.back()["inputs"], "layers");
   EXPECT_GT(rows.back()["fetchMs"].get<double>(), 0.0);  // nine layers were fetched
-  for (const nlohmann::json& row : rows) {
-    for (const char* time : {"renderMs", "floorMs", "floorCpuMs"})
-      EXPECT_GT(row[time].get<double>(), 0.0) << time << " " << row;
-    // Layer rows show other pictures than the replica's own source; only own rows compare.
-    EXPECT_EQ(row.contains("floorDifference"), row["inputs"] == "own") << row;
-    if (row["inputs"] == "own") {
-      EXPECT_LE(row["floorDifference"].get<int>(), 8) << row;
-    }
-  }
+  for (const nlohmann::json& row : rows) EXPECT_GT(row["renderMs"].get<double>(), 0.0) << row;
 }
 
 }  // namespace

@@ -17,6 +17,7 @@ const char* const kLayerB = "aaaaaaaa-bbbb-cccc-dddd-eeeeeeeeeeee";
 class HostPanel : public ::testing::Test {
  protected:
   void SetUp() override {
+    host.setCallLogging(true);
     int32_t second = 1;
     const int32_t results[] = {
         api.AddChoiceParam(h, L"Preset", "c", 98, L"A|B|C", &second, 0),

@@ -6,6 +6,7 @@
 
 #include <cstring>
 
+#include "refhost/pipeline/frame_readback.h"
 #include "support/gl_host.h"
 
 namespace refhost {
@@ -121,7 +122,7 @@ TEST_F(HostResources, FramesCarryTheirIndexAndAreTheHosts) {
   TextureRecord source{};
   ASSERT_EQ(api()->GetSourceFrame(handle(), &context, 300, &source), 0);
   EXPECT_EQ(source.imageWidth, 32);
-  const std::vector<uint8_t> pixels = host().readTexture(source.id, 32, 18);
+  const std::vector<uint8_t> pixels = refhost::readBack(source.id, 32, 18).pixels;
   EXPECT_EQ(pixels[0], 300 % 256);
   EXPECT_EQ(pixels[1], 300 / 256);
   EXPECT_EQ(pixels[2], 0);
@@ -129,7 +130,7 @@ TEST_F(HostResources, FramesCarryTheirIndexAndAreTheHosts) {
   TextureRecord layer{};
   ASSERT_EQ(api()->RenderLayerFrame(handle(), &context, kClip, 7, &layer), 0);
   EXPECT_EQ(layer.imageWidth, 16);
-  EXPECT_EQ(host().readTexture(layer.id, 16, 8)[2], 1);  // the first layer's tag
+  EXPECT_EQ(refhost::readBack(layer.id, 16, 8).pixels[2], 1);  // the first layer's tag
   EXPECT_EQ(host().outstandingTextures(), 0);
   EXPECT_EQ(host().outstandingFrames(), 2);
   api()->ReleaseTexture(handle(), nullptr, layer.id);

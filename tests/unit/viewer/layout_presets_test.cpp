@@ -1,6 +1,6 @@
 // Each layout preset, read back through the plug-in's own cut model and partition, divides the
 // frame into the regions it promises, each showing a different picture.
-#include "layout_presets.h"
+#include "viewer/layout_presets.h"
 
 #include <gtest/gtest.h>
 
@@ -10,8 +10,8 @@
 
 #include "geometry/cut_model.h"
 #include "geometry/region_partition.h"
-#include "scene_file.h"
-#include "scene_session.h"
+#include "scene/scene_document.h"
+#include "scene/scene_engine.h"
 #include "support/in_memory_host.h"
 
 namespace veltrane_viewer {
@@ -95,11 +95,13 @@ TEST(LayoutPresets, ExampleScenesHoldThePresets) {
     std::vector<std::string> sources{refhost::kNoLayer};
     for (const refhost::CompositionLayer& layer : scene.composition.layers)
       sources.push_back(layer.layer.guid);
-    veltrane_cli::SceneSession session(scene, VELTRANE_MODULE_PATH, refhost::GlProfile::Core);
+    veltrane_cli::SceneEngineOptions options;
+    options.modulePath = VELTRANE_MODULE_PATH;
+    std::unique_ptr<refhost::Engine> engine = veltrane_cli::startScene(scene, std::move(options));
     for (const ParamEdit& edit :
          presetEdits(index, scene.composition.width, scene.composition.height, sources))
-      EXPECT_TRUE(session.host().valueAt(edit.id, 0) == edit.value) << path << ": " << edit.id;
-    session.finish();
+      EXPECT_TRUE(engine->valueAt(edit.id, 0) == edit.value) << path << ": " << edit.id;
+    engine->finish();
   }
 }
 

@@ -1,6 +1,6 @@
 // The parameter panel's value conversions: widgets, ranges and formats per declared kind, and
 // keyframe toggles and edits of static and animated parameters.
-#include "panel_values.h"
+#include "viewer/panel_values.h"
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,6 @@
 // The viewer's window <-> frame mapping: the projection handed to the overlay must land corner
 // points where pointer conversion says they are, under every zoom and pan.
-#include "view_mapping.h"
+#include "viewer/view_mapping.h"
 
 #include <gtest/gtest.h>
 

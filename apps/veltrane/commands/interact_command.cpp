@@ -1,0 +1,138 @@
+// `veltrane interact`: replays scripted viewer events (pointer, keys, the layer menu, undo and
+// redo) on a scene running in the plug-in and writes what came of them as JSON.
+#include <cstdio>
+#include <filesystem>
+#include <optional>
+#include <stdexcept>
+
+#include "cli/cli_support.h"
+#include "cli/stop_signals.h"
+#include "commands/commands.h"
+#include "events/event_replay.h"
+#include "events/event_script.h"
+#include "output/call_log.h"
+#include "refhost/platform/staged_file.h"
+#include "scene/scene_document.h"
+#include "scene/scene_engine.h"
+
+namespace veltrane_cli {
+namespace {
+
+namespace fs = std::filesystem;
+
+const char kInteractHelp[] =
+    "Usage: veltrane interact SCENE.json --events EVENTS.json -o RESULT.json [--overlay DIR]\n"
+    "                         [--profile core|compat] [--plugin PATH]\n"
+    "\n"
+    "Sets up the scene as 'veltrane render' does, then delivers the events of EVENTS.json\n"
+    "(see docs/events-format.md) to the plug-in as a viewer would: pointer press, move and\n"
+    "release (1005, 1004, 1006), key down and up (1007, 1008), the layer menu (1012, 1013)\n"
+    "with scripted answers, and the host's undo and redo. After each event the host reports\n"
+    "changed parameters with message 7. RESULT.json receives every parameter's value in the\n"
+    "scene's form, the undo steps (and one left open), the cursor, the selected input and\n"
+    "whether the pointer hovers over it after each event, the menus shown and each message's\n"
+    "answer. The outputs appear only when all are complete, as with 'render'.\n"
+    "\n"
+    "Options:\n"
+    "  --events FILE   the event script (required)\n"
+    "  -o, --output F  where the result goes (required)\n"
+    "  --overlay DIR   also write DIR/event_0000.png, ...: the frame at the script's time with\n"
+    "                  the plug-in's overlay (message 1003) over it, after each event\n"
+    "  --profile P     GL profile: core (default) or compat\n"
+    "  --plugin PATH   the module to load\n"
+    "  --call-log FILE write every message and the host operations the plug-in called\n"
+    "                  during it to FILE\n"
+    "  -h, --help      show this help\n";
+
+// The --overlay folder, made where it is missing; a run that fails removes the folders it made.
+class OverlayFolder {
+ public:
+  explicit OverlayFolder(const std::string& path) {
+    std::error_code error;
+    if (fs::exists(path, error) && !fs::is_directory(path, error))
+      throw UsageError("option '--overlay' expects a folder, '" + path + "' is a file");
+    for (fs::path missing = path; !missing.empty() && !fs::exists(missing, error);
+         missing = missing.parent_path())
+      made_.push_back(missing);  // deepest first
+    fs::create_directories(path, error);
+    if (error) throw std::runtime_error(path + ": cannot create the folder: " + error.message());
+  }
+  ~OverlayFolder() {
+    std::error_code ignored;
+    if (!kept_)
+      for (const fs::path& folder : made_) fs::remove(folder, ignored);
+  }
+  OverlayFolder(const OverlayFolder&) = delete;
+  OverlayFolder& operator=(const OverlayFolder&) = delete;
+  void keep() { kept_ = true; }
+
+ private:
+  std::vector<fs::path> made_;
+  bool kept_ = false;
+};
+
+}  // namespace
+
+int runInteract(const std::vector<std::string>& args) {
+  if (wantsHelp(args)) {
+    std::fputs(kInteractHelp, stdout);
+    return 0;
+  }
+  Arguments parsed = parseArguments(args, {{"--events", true},
+                                           {"-o", true},
+                                           {"--output", true},
+                                           {"--overlay", true},
+                                           {"--profile", true},
+                                           {"--plugin", true},
+                                           {"--call-log", true}});
+  auto& options = parsed.options;
+  if (parsed.positional.size() != 1) throw UsageError("expects one scene file");
+  if (!options.count("--events")) throw UsageError("needs --events EVENTS.json");
+  if (options.count("-o") == options.count("--output"))
+    throw UsageError("needs -o RESULT.json once");
+  std::string output = options.count("-o") ? options["-o"] : options["--output"];
+  refhost::GlProfile profile = glProfile(options);
+  std::string module = pluginPath(options);
+
+  noteStopSignals();
+  Scene scene = loadScene(parsed.positional.front());
+  EventScript script = loadEventScript(options["--events"]);
+  std::optional<OverlayFolder> overlayFolder;
+  std::unique_ptr<refhost::FrameSink> overlays;
+  if (options.count("--overlay")) {
+    overlayFolder.emplace(options["--overlay"]);
+    refhost::OutputTarget target =
+        refhost::parseOutputTarget(options["--overlay"] + "/event_%04d.png");
+    overlays = refhost::openFrameSink(target, scene.composition.width, scene.composition.height,
+                                      scene.composition.frameRate);
+  }
+  SceneEngineOptions engineOptions;
+  engineOptions.modulePath = module;
+  engineOptions.profile = profile;
+  engineOptions.hostId = script.hostId;
+  std::optional<CallLogFile> callLog;
+  if (options.count("--call-log")) {
+    callLog.emplace(options["--call-log"]);
+    engineOptions.onMessage = callLog->recorder();
+  }
+  std::unique_ptr<refhost::Engine> engine = startScene(scene, std::move(engineOptions));
+  nlohmann::ordered_json result = replayEvents(*engine, script, overlays.get());
+  engine->finish();
+  throwIfStopped();
+  // The result is written whole, under its temporary name, before the pictures move into
+  // place: a write that fails leaves neither. Only the result's rename comes after them.
+  refhost::StagedFile resultFile(output);
+  resultFile.write(result.dump(2) + "\n");
+  std::size_t pictures = overlays ? overlays->commit().size() : 0;
+  resultFile.commit();
+  if (overlayFolder) overlayFolder->keep();
+  std::printf("wrote %s (%zu event%s)", output.c_str(), script.events.size(),
+              script.events.size() == 1 ? "" : "s");
+  if (overlays)
+    std::printf(" and %zu overlay picture%s in %s", pictures, pictures == 1 ? "" : "s",
+                options["--overlay"].c_str());
+  std::printf("\n");
+  return 0;
+}
+
+}  // namespace veltrane_cli

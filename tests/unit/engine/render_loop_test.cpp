@@ -1,0 +1,104 @@
+// The render loop through the engine: pictures reach the sink in order as single renders give
+// them, the texture pool stops growing, decoding ahead gives the wrapped source's frames in any
+// order of asking, and a failure anywhere stops the run with its own message, leaving nothing.
+#include "refhost/engine/render_loop.h"
+
+#include <gtest/gtest.h>
+
+#include <filesystem>
+
+#include "refhost/engine/composition.h"
+#include "refhost/media/image_files.h"
+#include "refhost/pipeline/async_frame_sink.h"
+#include "refhost/pipeline/frame_prefetch.h"
+#include "support/temp_paths.h"
+
+namespace refhost {
+namespace {
+
+// Frame i at width w is (i, w, 0, 255) everywhere; fails at `failAt`.
+class NumberedSource : public MediaSource {
+ public:
+  explicit NumberedSource(int32_t failAt = -1) : failAt_(failAt) {}
+  RgbaImage frame(int32_t index, int32_t width, int32_t height) override {
+    if (index == failAt_)
+      throw std::runtime_error("clip.mp4: cannot decode video: frame " + std::to_string(index));
+    return RgbaImage(width, height,
+                     {static_cast<uint8_t>(index), static_cast<uint8_t>(width), 0, 255});
+  }
+
+ private:
+  int32_t failAt_;
+};
+
+TEST(PrefetchingSource, GivesTheWrappedSourcesFramesWhateverTheOrder) {
+  NumberedSource direct(7);
+  PrefetchingSource ahead(std::make_shared<NumberedSource>(7), 3);
+  const int32_t requests[][2] = {{0, 4}, {1, 4},  {2, 4},  {2, 4}, {1, 4}, {5, 4},
+                                 {6, 4}, {12, 4}, {13, 2}, {3, 2}, {6, 2}, {8, 2}};
+  for (const auto& r : requests)
+    EXPECT_EQ(ahead.glRows(r[0], r[1], 2), direct.glRows(r[0], r[1], 2)) << r[0] << " " << r[1];
+  // The worker has met the failing frame by now; it surfaces when asked for, and again.
+  for (int attempt = 0; attempt < 2; ++attempt)
+    EXPECT_THROW(ahead.glRows(7, 2, 2), std::runtime_error);
+  EXPECT_EQ(ahead.glRows(8, 2, 2), direct.glRows(8, 2, 2));
+}
+
+std::unique_ptr<Engine> engineOver(std::shared_ptr<MediaSource> source) {
+  EngineOptions options;
+  options.modulePath = VELTRANE_MODULE_PATH;
+  auto engine = std::make_unique<Engine>(std::move(options));
+  engine->setFrameSettings({32, 18, 25.0, 1.0f, 12, ""});
+  engine->setSourceFrames(frameSourceOf(std::move(source)));
+  engine->start();
+  engine->createInstance();
+  // No border: every picture is its own source frame.
+  engine->setParam("borderWidth", ParamValue::ofFloat(0));
+  return engine;
+}
+
+// A failed write stops the run the same way; the command line's tests fill a disk to show it.
+TEST(RenderLoop, PicturesComeInOrderAndAFailureAnywhereStopsTheRunLeavingNothing) {
+  enum class Stage { None, Decoding, Stopping };
+  for (Stage stage : {Stage::None, Stage::Decoding, Stage::Stopping}) {
+    const std::string folder = testsupport::makeTempDirectory("loop");
+    std::unique_ptr<Engine> engine = engineOver(std::make_shared<PrefetchingSource>(
+        std::make_shared<NumberedSource>(stage == Stage::Decoding ? 5 : -1), 3));
+    auto sink = std::make_unique<AsyncFrameSink>(
+        openFrameSink(parseOutputTarget(folder + "/out_%04d.png"), 32, 18, 25.0), 2, 3);
+    RenderRun run = framesFromTo(0, 11);
+    std::vector<int32_t> written;
+    int32_t started = 0;
+    run.beforeFrame = [&] {
+      if (stage == Stage::Stopping && started == 5) throw std::runtime_error("stopped");
+      ++started;
+    };
+    run.written = [&](int32_t n) { written.push_back(n); };
+    std::string error;
+    try {
+      renderFrames(*engine, run, *sink);
+      std::vector<std::string> names = sink->commit();
+      ASSERT_EQ(names.size(), 12u);
+      for (int32_t frame : {0, 6, 11})
+        EXPECT_EQ(readImageFile(names[static_cast<std::size_t>(frame)]).pixel(2, 3),
+                  (Rgba8{static_cast<uint8_t>(frame), 32, 0, 255}));
+    } catch (const std::runtime_error& failure) {
+      error = failure.what();
+    }
+    const char* expected[] = {"", "clip.mp4: cannot decode video: frame 5", "stopped"};
+    EXPECT_EQ(error, expected[static_cast<int>(stage)]);
+    if (stage == Stage::None) {
+      EXPECT_EQ(written, (std::vector<int32_t>{1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12}));
+      // Three textures a frame, two frames in flight: the pool stops growing after the start.
+      EXPECT_LE(engine->host().texturePool().created(), 9u);
+    } else {
+      sink.reset();  // as the command line's unwinding does
+      EXPECT_TRUE(std::filesystem::is_empty(folder)) << expected[static_cast<int>(stage)];
+    }
+    engine.reset();
+    std::filesystem::remove_all(folder);
+  }
+}
+
+}  // namespace
+}  // namespace refhost
