@@ -144,15 +144,19 @@ bool ParamPanel::endGroup() {
 }
 
 bool ParamPanel::add(Param param) {
-  if (index_.find(param.id) != index_.end()) return false;
+  if (find(param.id)) return false;
   param.group = openGroups_.empty() ? -1 : openGroups_.back();
   PanelItem item{false, static_cast<int>(params_.size())};
   if (param.group < 0)
     topLevel_.push_back(item);
   else
     groups_[static_cast<std::size_t>(param.group)].items.push_back(item);
-  index_[param.id] = params_.size();
   params_.push_back(std::move(param));
+  if (slots_.size() < 2 * params_.size()) {
+    rebuildIndex();
+  } else {
+    slots_[slotOf(params_.back().id)] = static_cast<int32_t>(params_.size() - 1);
+  }
   return true;
 }
 
@@ -163,14 +167,55 @@ std::vector<std::string> ParamPanel::groupPath(const Param& param) const {
   return path;
 }
 
+namespace {
+
+// FNV-1a: short ids that differ in their last character (cut and input numbers) spread well.
+constexpr uint64_t kHashStart = 14695981039346656037ull;
+constexpr uint64_t kHashFactor = 1099511628211ull;
+
+}  // namespace
+
+std::size_t ParamPanel::hashOf(std::string_view text) {
+  uint64_t hash = kHashStart;
+  for (char c : text) hash = (hash ^ static_cast<uint8_t>(c)) * kHashFactor;
+  return static_cast<std::size_t>(hash);
+}
+
+// The slot holding the id, or the empty slot where it would go.
+std::size_t ParamPanel::slotOf(std::string_view id, std::size_t hash) const {
+  const std::size_t mask = slots_.size() - 1;
+  for (std::size_t slot = hash & mask;; slot = (slot + 1) & mask) {
+    const int32_t held = slots_[slot];
+    if (held < 0 || params_[static_cast<std::size_t>(held)].id == id) return slot;
+  }
+}
+
+void ParamPanel::rebuildIndex() {
+  std::size_t size = 16;
+  while (size < 2 * params_.size()) size *= 2;
+  slots_.assign(size, -1);
+  for (std::size_t i = 0; i < params_.size(); ++i)
+    slots_[slotOf(params_[i].id)] = static_cast<int32_t>(i);
+}
+
 Param* ParamPanel::find(std::string_view id) {
-  auto found = index_.find(id);
-  return found == index_.end() ? nullptr : &params_[found->second];
+  return const_cast<Param*>(static_cast<const ParamPanel*>(this)->find(id));
+}
+
+const Param* ParamPanel::find(const char* id) const {
+  if (slots_.empty() || !id) return nullptr;
+  uint64_t hash = kHashStart;
+  const char* end = id;
+  for (; *end; ++end) hash = (hash ^ static_cast<uint8_t>(*end)) * kHashFactor;
+  const int32_t held = slots_[slotOf(std::string_view(id, static_cast<std::size_t>(end - id)),
+                                     static_cast<std::size_t>(hash))];
+  return held < 0 ? nullptr : &params_[static_cast<std::size_t>(held)];
 }
 
 const Param* ParamPanel::find(std::string_view id) const {
-  auto found = index_.find(id);
-  return found == index_.end() ? nullptr : &params_[found->second];
+  if (slots_.empty()) return nullptr;
+  const int32_t held = slots_[slotOf(id)];
+  return held < 0 ? nullptr : &params_[static_cast<std::size_t>(held)];
 }
 
 }  // namespace refhost

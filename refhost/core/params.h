@@ -140,13 +140,25 @@ class ParamPanel {
   // Null when the id was never declared. Looking up allocates nothing.
   Param* find(std::string_view id);
   const Param* find(std::string_view id) const;
+  // The same for the zero-terminated ids the plug-in passes, read in one pass.
+  const Param* find(const char* id) const;
+  Param* find(const char* id) {
+    return const_cast<Param*>(static_cast<const ParamPanel*>(this)->find(id));
+  }
 
  private:
   std::vector<Param> params_;
   std::vector<ParamGroup> groups_;
   std::vector<PanelItem> topLevel_;
   std::vector<int> openGroups_;
-  std::map<std::string, std::size_t, std::less<>> index_;
+  // Open addressing over the ids' hashes: a read by id hashes the id once and compares it with
+  // one declared id in the usual case. Slots hold an index into params_, or -1; there are
+  // always at least twice as many slots as parameters.
+  std::size_t slotOf(std::string_view id) const { return slotOf(id, hashOf(id)); }
+  std::size_t slotOf(std::string_view id, std::size_t hash) const;
+  static std::size_t hashOf(std::string_view text);
+  void rebuildIndex();
+  std::vector<int32_t> slots_;
 };
 
 }  // namespace refhost
