@@ -136,7 +136,11 @@ class Engine {
   // ---- The composition ---------------------------------------------------------------------
   void setFrameSettings(const FrameSettings& settings);
   const FrameSettings& frameSettings() const { return settings_; }
-  void setSourceFrames(FrameSource source) { host_->setSourceFrames(std::move(source)); }
+  // `openStream` (optional) opens further readers for frames asked at other offsets from the
+  // frame being rendered (see Layer::openStream).
+  void setSourceFrames(FrameSource source, std::function<FrameSource()> openStream = {}) {
+    host_->setSourceFrames(std::move(source), std::move(openStream));
+  }
   void addLayer(const Layer& layer) { host_->addLayer(layer); }
   const std::vector<Layer>& layers() const { return host_->layers(); }
 

@@ -8,6 +8,7 @@
 #include <deque>
 #include <functional>
 #include <initializer_list>
+#include <map>
 #include <memory>
 #include <set>
 #include <string>
@@ -46,7 +47,16 @@ struct Layer {
   Matrix4 secondMatrix = identityMatrix();
   bool is3D = false;
   FrameSource source;  // empty: frameCounterSource tagged with the layer's position + 1
+  // Opens another reader of the layer's media. Frames asked at different offsets from the
+  // frame being rendered (time-shifted copies) then each come from a reader of their own that
+  // reads on in order, instead of one reader seeking back and forth between them. Empty: every
+  // request goes to `source`.
+  std::function<FrameSource()> openStream;
 };
+
+// Readers of one media at most kept per source, one for each offset first asked for; later
+// offsets share the reader of offset 0.
+constexpr std::size_t kStreamsPerSource = 4;
 
 struct FrameRequest {
   std::string layerGuid;  // empty for the effect's own source
@@ -162,7 +172,13 @@ class Host {
   // ---- Layers and media ------------------------------------------------------------------
   void addLayer(const Layer& layer) { layers_.push_back(layer); }
   std::vector<Layer>& layers() { return layers_; }
-  void setSourceFrames(FrameSource source) { sourceFrames_ = std::move(source); }
+  // The effect's own source: `source` serves the frame being rendered; `openStream`, when
+  // given, opens readers for the frames asked at other offsets (see Layer::openStream).
+  void setSourceFrames(FrameSource source, std::function<FrameSource()> openStream = {}) {
+    sourceFrames_ = std::move(source);
+    sourceStreamOpener_ = std::move(openStream);
+    streams_.clear();
+  }
   const FrameSource& sourceFrames() const { return sourceFrames_; }
 
   // ---- Call log and problems -------------------------------------------------------------
@@ -320,6 +336,9 @@ class Host {
   int32_t renderLayerFrame(void* renderContext, const char* guid, int32_t frame,
                            TextureRecord* out);
   const Layer* findLayer(const char* guid) const;
+  // The reader for frames `offset` away from the frame being rendered, of the own source
+  // (`layer` null) or of a layer.
+  const FrameSource& stream(const Layer* layer, int32_t offset);
   int32_t deliverFrame(const FrameSource& source, int32_t frame, int32_t width, int32_t height,
                        TextureRecord* out);
 
@@ -347,6 +366,10 @@ class Host {
   std::vector<ImmediateEdit> immediateEdits_;
   std::vector<Layer> layers_;
   FrameSource sourceFrames_;
+  std::function<FrameSource()> sourceStreamOpener_;
+  // Readers opened for offsets other than 0, by source (the layer's GUID, empty for the own
+  // source) and offset.
+  std::map<std::pair<std::string, int32_t>, FrameSource> streams_;
 
   std::vector<std::string> callLog_;
   bool callLogging_ = false;

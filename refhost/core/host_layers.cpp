@@ -99,16 +99,35 @@ int32_t Host::getSourceFrame(void* renderContext, int32_t frameIndex, TextureRec
     width = hasSource ? context->source.imageWidth : context->width;
     height = hasSource ? context->source.imageHeight : context->height;
   }
-  return deliverFrame(sourceFrames_, frameIndex, width, height, out);
+  const auto* context = static_cast<const WispRenderContext*>(renderContext);
+  const int32_t offset = context ? frameIndex - context->sourceFrameIndex : 0;
+  return deliverFrame(stream(nullptr, offset), frameIndex, width, height, out);
 }
 
-int32_t Host::renderLayerFrame(void*, const char* guid, int32_t frame, TextureRecord* out) {
+const FrameSource& Host::stream(const Layer* layer, int32_t offset) {
+  const FrameSource& first = layer ? layer->source : sourceFrames_;
+  const std::function<FrameSource()>& open = layer ? layer->openStream : sourceStreamOpener_;
+  if (offset == 0 || !open) return first;
+  const std::string key = layer ? layer->guid : std::string();
+  auto found = streams_.find({key, offset});
+  if (found != streams_.end()) return found->second;
+  std::size_t opened = 0;
+  for (const auto& entry : streams_) opened += entry.first.first == key ? 1 : 0;
+  if (opened + 1 >= kStreamsPerSource) return first;
+  return streams_.emplace(std::make_pair(key, offset), open()).first->second;
+}
+
+int32_t Host::renderLayerFrame(void* renderContext, const char* guid, int32_t frame,
+                               TextureRecord* out) {
   log([&] { return std::string("RenderLayerFrame " + logId(guid) + " " + std::to_string(frame)); });
   const Layer* layer = findLayer(guid);
   if (refuseLayerFrames_ || !layer) return 1;
-  FrameSource source = layer->source;
-  if (!source) source = frameCounterSource(static_cast<uint8_t>(layer - layers_.data() + 1));
-  return deliverFrame(source, frame, layer->width, layer->height, out);
+  if (!layer->source)
+    return deliverFrame(frameCounterSource(static_cast<uint8_t>(layer - layers_.data() + 1)), frame,
+                        layer->width, layer->height, out);
+  const auto* context = static_cast<const WispRenderContext*>(renderContext);
+  const int32_t offset = context ? frame - static_cast<int32_t>(context->frameNumber) : 0;
+  return deliverFrame(stream(layer, offset), frame, layer->width, layer->height, out);
 }
 
 int32_t Host::deliverFrame(const FrameSource& source, int32_t frame, int32_t width, int32_t height,

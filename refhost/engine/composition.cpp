@@ -18,6 +18,20 @@ std::shared_ptr<MediaSource> opened(const MediaSpec& spec) {
   return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead);
 }
 
+// Another reader of the same media, opened when its first frame is asked for; a media that
+// looks the same at every frame shares the one it has.
+std::function<FrameSource()> streamOpener(const MediaSpec& spec,
+                                          const std::shared_ptr<MediaSource>& first) {
+  if (!first->changesOverTime()) return [first] { return frameSourceOf(first); };
+  return [spec] {
+    auto source = std::make_shared<std::shared_ptr<MediaSource>>();
+    return FrameSource([spec, source](int32_t frame, int32_t width, int32_t height) {
+      if (!*source) *source = opened(spec);
+      return (*source)->glRows(frame, width, height);
+    });
+  };
+}
+
 }  // namespace
 
 FrameSource frameSourceOf(std::shared_ptr<MediaSource> source) {
@@ -50,7 +64,9 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
   settings.sourceFrameCount = installed.sourceFrameCount;
   settings.ownLayerGuid = composition.ownLayerGuid;
   engine.setFrameSettings(settings);
-  engine.setSourceFrames(frameSourceOf(installed.source));
+  const std::function<FrameSource()> sourceStreams =
+      streamOpener(composition.source, installed.source);
+  engine.setSourceFrames(frameSourceOf(installed.source), sourceStreams);
 
   Layer own;
   own.guid = composition.ownLayerGuid;
@@ -60,12 +76,17 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
   own.frameCount = composition.duration;
   own.width = composition.width;
   own.height = composition.height;
-  own.source = frameSourceOf(installed.source);
+  // The own layer reads on its own: it is asked for the frame being rendered, which the render
+  // context's source has just taken from the first reader.
+  own.source = sourceStreams();
+  own.openStream = sourceStreams;
   engine.addLayer(own);
 
   for (const CompositionLayer& entry : composition.layers) {
     Layer layer = entry.layer;
-    layer.source = frameSourceOf(opened(entry.media));
+    std::shared_ptr<MediaSource> media = opened(entry.media);
+    layer.source = frameSourceOf(media);
+    layer.openStream = streamOpener(entry.media, media);
     engine.addLayer(layer);
   }
   return installed;

@@ -100,5 +100,43 @@ TEST(RenderLoop, PicturesComeInOrderAndAFailureAnywhereStopsTheRunLeavingNothing
   }
 }
 
+// Records the frames each of its readers was asked for.
+struct ReaderLog {
+  std::vector<std::vector<int32_t>> asked;
+  FrameSource open() {
+    asked.emplace_back();
+    const std::size_t reader = asked.size() - 1;
+    return [this, reader](int32_t frame, int32_t width, int32_t height) {
+      asked[reader].push_back(frame);
+      return std::vector<uint8_t>(static_cast<std::size_t>(width) * height * 4, 255);
+    };
+  }
+};
+
+TEST(RenderLoop, ATimeShiftedCopyReadsOnInOrderWithAReaderOfItsOwn) {
+  ReaderLog log;
+  EngineOptions options;
+  options.modulePath = VELTRANE_MODULE_PATH;
+  Engine engine(std::move(options));
+  engine.setFrameSettings({32, 18, 25.0, 1.0f, 40, ""});
+  engine.setSourceFrames(log.open(), [&] { return log.open(); });
+  engine.start();
+  engine.createInstance();
+  engine.setParam("inputFrameShift1", ParamValue::ofInt(5));
+  class Dropping : public FrameSink {
+    void write(int32_t, const RgbaImage&) override {}
+    std::vector<std::string> commit() override { return {}; }
+  } sink;
+  renderFrames(engine, framesFromTo(0, 9), sink);
+  // The frame rendered and the frame five ahead, each from a reader going forward only.
+  ASSERT_EQ(log.asked.size(), 2u);
+  std::vector<int32_t> expected;
+  for (int32_t frame = 0; frame <= 9; ++frame) expected.push_back(frame);
+  EXPECT_EQ(log.asked[0], expected);
+  for (int32_t& frame : expected) frame += 5;
+  EXPECT_EQ(log.asked[1], expected);
+  engine.finish();
+}
+
 }  // namespace
 }  // namespace refhost
