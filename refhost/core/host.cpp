@@ -37,7 +37,8 @@ Host::~Host() { releaseGl(); }
 int32_t Host::send(int32_t message) {
   if (!module_) throw std::logic_error("refhost::Host::send: no module loaded");
   bool draws = isDrawingMessage(message);
-  if (gl_ && (message == 0 || message == 1 || message == 8 || draws)) {
+  if (gl_ && (message == kMessageLoad || message == kMessageUnload ||
+              message == kMessagePrepareGl || draws)) {
     gl_->makeCurrent();
     if (draws) bindFramebuffer();
   }

@@ -95,7 +95,9 @@ class Host {
   // framebuffer. After the message, fetched frames not given back are reclaimed and the
   // resource balance is recorded. Throws std::logic_error without a module.
   int32_t send(int32_t message);
-  static bool isDrawingMessage(int32_t message) { return message == 10 || message == 1003; }
+  static bool isDrawingMessage(int32_t message) {
+    return message == kMessageRender || message == kMessageDrawOverlay;
+  }
   const std::vector<MessageRecord>& messageHistory() const { return messages_; }
   void clearMessageHistory() { messages_.clear(); }
 

@@ -80,12 +80,12 @@ class Session {
   }
 
   ~Session() {
-    for (void* instance : std::vector<void*>(instances_)) send(4, instance);
+    for (void* instance : std::vector<void*>(instances_)) send(kMessageDestroyInstance, instance);
     for (void* registry : std::vector<void*>(registries_))
-      if (registry != warm_.registry || grown_) send(1, nullptr, registry);
+      if (registry != warm_.registry || grown_) send(kMessageUnload, nullptr, registry);
     if (registries_.empty()) {
-      send(0, nullptr, nullptr);
-      if (send(8, nullptr) != 1) fail(host_, 8, "the plug-in did not start again");
+      send(kMessageLoad, nullptr, nullptr);
+      if (send(kMessagePrepareGl, nullptr) != 1) fail(host_, 8, "the plug-in did not start again");
       warm_.registry = registry_;
     }
   }
@@ -261,7 +261,8 @@ extern "C" int LLVMFuzzerInitialize(int* argc, char*** argv) {
     warm.gl = std::make_shared<refhost::GlContext>(profile);
     refhost::Host host(*module);
     host.shareGl(warm.gl);
-    if (host.send(0) != 1 || host.send(8) != 1) fail(host, 8, "the plug-in did not start");
+    if (host.send(kMessageLoad) != 1 || host.send(kMessagePrepareGl) != 1)
+      fail(host, 8, "the plug-in did not start");
     warm.registry = host.api().pluginData;
   }
   return 0;
@@ -271,8 +272,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
   FuzzedDataProvider data(bytes, size);
   Session session(warmStates[data.ConsumeBool() ? 1 : 0]);
   configureHost(data, session.host());
-  session.send(2, nullptr);
-  session.send(3, nullptr);
+  session.send(kMessageDeclareParameters, nullptr);
+  session.send(kMessageCreateInstance, nullptr);
   for (int step = 0; step < 48 && data.remaining_bytes() > 0; ++step) {
     for (int edits = data.ConsumeIntegralInRange(0, 2); edits > 0; --edits)
       editParameter(data, session.host());

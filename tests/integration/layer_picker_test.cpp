@@ -24,13 +24,13 @@ class LayerPicker : public LoadedPlugin {
     ViewerEvents viewer(host(), 160, 90);
     viewer.press(20, 45);
     viewer.release(20, 45);
-    ASSERT_EQ(host().send(1012), 1);
+    ASSERT_EQ(host().send(kMessagePointerOverSelection), 1);
   }
   int32_t pick(int32_t answer) {
     host().queuePopupAnswer(answer);
     WispLayerPickerContext context{kOwn.c_str()};
     host().setRenderContext(&context);
-    const int32_t result = host().send(1013);
+    const int32_t result = host().send(kMessagePickLayer);
     host().setRenderContext(nullptr);
     return result;
   }

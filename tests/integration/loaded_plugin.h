@@ -21,16 +21,16 @@ class LoadedPlugin : public ::testing::Test {
   void SetUp() override {
     host_ = std::make_unique<refhost::Host>(module_);
     host_->setCallLogging(true);
-    ASSERT_EQ(host_->send(0), 1);
-    ASSERT_EQ(host_->send(2), 1);
-    ASSERT_EQ(host_->send(3), 1);
+    ASSERT_EQ(host_->send(kMessageLoad), 1);
+    ASSERT_EQ(host_->send(kMessageDeclareParameters), 1);
+    ASSERT_EQ(host_->send(kMessageCreateInstance), 1);
     host_->clearCallLog();
   }
   void TearDown() override {
     // Unknown ids, kind mismatches and stray releases are the plug-in misusing the host.
     for (const std::string& problem : host_->problems()) ADD_FAILURE() << "host: " << problem;
-    if (host_->api().instanceData) host_->send(4);
-    host_->send(1);
+    if (host_->api().instanceData) host_->send(kMessageDestroyInstance);
+    host_->send(kMessageUnload);
     host_.reset();
   }
 

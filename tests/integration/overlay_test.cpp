@@ -31,7 +31,7 @@ class Viewer : public ViewerEvents {
     target_ = host_.createTexture(kW, kH, transparent.data());
     host_.setDrawTarget(target_.id, kW, kH);
     glClearColor(0.25f, 0.5f, 0.75f, 1.0f);
-    EXPECT_EQ(send(1003, nullptr), 1);
+    EXPECT_EQ(send(kMessageDrawOverlay, nullptr), 1);
     expectGlStateLeftForTheHost({0.25f, 0.5f, 0.75f, 1.0f});
     context().name = nullptr;
     EXPECT_EQ(host_.outstandingTextures() + host_.outstandingBuffers(), 0);

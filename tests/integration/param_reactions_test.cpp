@@ -43,7 +43,7 @@ TEST_F(LoadedPlugin, CutCountAndTypeChangesSetEveryEnabledState) {
     host().setValue("numberOfCuts", ParamValue::ofInt(row.cuts));
     host().setValue("cutType", ParamValue::ofInt(row.radial ? 1 : 0));
     host().clearCallLog();
-    EXPECT_EQ(sendParamEvent(7, row.changed), 1);
+    EXPECT_EQ(sendParamEvent(kMessageParameterChanged, row.changed), 1);
     const std::vector<std::string> calls = host().callsTo("SetParamEnabled");
     ASSERT_EQ(calls.size(), 62u);
     EXPECT_EQ(calls, expectedEnabledCalls(row.cuts, row.radial));
@@ -56,11 +56,11 @@ TEST_F(LoadedPlugin, CutCountAndTypeChangesSetEveryEnabledState) {
 TEST_F(LoadedPlugin, OtherChangesCallNothing) {
   for (const char* id : {"borderWidth", "cutTypeX", "numberOfCutsY", "cutPosition_0", ""}) {
     host().clearCallLog();
-    EXPECT_EQ(sendParamEvent(7, id), 1) << id;
+    EXPECT_EQ(sendParamEvent(kMessageParameterChanged, id), 1) << id;
     EXPECT_TRUE(host().callLog().empty()) << id;
   }
   host().setEvent(nullptr);
-  EXPECT_EQ(host().send(7), 1);
+  EXPECT_EQ(host().send(kMessageParameterChanged), 1);
   EXPECT_TRUE(host().callLog().empty());
 }
 
@@ -93,7 +93,7 @@ TEST_F(LoadedPlugin, FrameRequestsNameTheCurrentFrameOfEveryLayerInUse) {
     context.frameNumber = 42;
     context.time = 42;
     host().setRenderContext(&context);
-    EXPECT_EQ(host().send(12), 1);
+    EXPECT_EQ(host().send(kMessageRequestFrames), 1);
     host().setRenderContext(nullptr);
 
     const std::vector<refhost::FrameRequest>& requests = host().frameRequests();

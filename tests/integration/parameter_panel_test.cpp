@@ -117,13 +117,13 @@ TEST(ParameterDeclaration, StopsAtTheFirstRefusedCall) {
   for (const auto& row : table) {
     SCOPED_TRACE(row.refusedCall);
     refhost::Host host(module);
-    ASSERT_EQ(host.send(0), 1);
+    ASSERT_EQ(host.send(kMessageLoad), 1);
     host.failDeclarationCall(row.refusedCall);
-    EXPECT_EQ(host.send(2), 5);
+    EXPECT_EQ(host.send(kMessageDeclareParameters), 5);
     EXPECT_EQ(host.declarationCallCount(), row.refusedCall);
     EXPECT_EQ(host.panel().params().size(), row.paramsDeclared);
     EXPECT_EQ(host.panel().openGroupDepth(), row.openGroups);
-    EXPECT_EQ(host.send(1), 1);
+    EXPECT_EQ(host.send(kMessageUnload), 1);
   }
 }
 
@@ -139,15 +139,15 @@ TEST(ParameterDeclaration, LayerLabelsFollowTheHostProductCode) {
     refhost::Host host(module);
     host.setCallLogging(true);
     host.setHostId(row.hostId);
-    ASSERT_EQ(host.send(0), 1);
-    ASSERT_EQ(host.send(2), 1);
+    ASSERT_EQ(host.send(kMessageLoad), 1);
+    ASSERT_EQ(host.send(kMessageDeclareParameters), 1);
     for (int j = 0; j < 9; ++j) {
       const std::string label = host.param("inputLayer" + std::to_string(j)).displayName;
       EXPECT_EQ(label, row.numbered ? "Layer " + std::to_string(j) : "Layer");
     }
     // The label rule is asked just before each layer parameter.
     EXPECT_EQ(host.callsTo("GetHostId").size(), 9u);
-    EXPECT_EQ(host.send(1), 1);
+    EXPECT_EQ(host.send(kMessageUnload), 1);
   }
 }
 

@@ -77,34 +77,34 @@ TEST_F(LoadedPlugin, MessageResultTable) {
     EXPECT_EQ(host().send(row.message), row.expected) << "message " << row.message;
     EXPECT_EQ(host().messageHistory().back().result, row.expected) << "as the host recorded";
   }
-  EXPECT_EQ(sendParamEvent(7, "borderWidth"), 1);
+  EXPECT_EQ(sendParamEvent(kMessageParameterChanged, "borderWidth"), 1);
   EXPECT_EQ(sendParamEvent(13, "borderWidth"), 1);
   EXPECT_EQ(sendParamEvent(14, "cutType"), 1);
 
   WispKeyEvent otherKey{97};
   host().setEvent(&otherKey);
-  EXPECT_EQ(host().send(1007), 0);
-  EXPECT_EQ(host().send(1008), 0);
+  EXPECT_EQ(host().send(kMessageKeyDown), 0);
+  EXPECT_EQ(host().send(kMessageKeyUp), 0);
   host().setEvent(nullptr);
 
   // Nothing selected: the layer picker declines, and a copy from no record changes nothing.
   WispLayerPickerContext picker{"11111111-1111-1111-1111-111111111111"};
   host().setRenderContext(&picker);
-  EXPECT_EQ(host().send(1013), 0);
+  EXPECT_EQ(host().send(kMessagePickLayer), 0);
   host().setRenderContext(nullptr);
-  EXPECT_EQ(host().send(1014), 0);
+  EXPECT_EQ(host().send(kMessageCopyInstance), 0);
   EXPECT_TRUE(host().problems().empty());
 }
 
 TEST_F(LoadedPlugin, DestroyAndUnloadTolerateEmptySlots) {
-  EXPECT_EQ(host().send(4), 1);
+  EXPECT_EQ(host().send(kMessageDestroyInstance), 1);
   EXPECT_EQ(host().api().instanceData, nullptr);
-  EXPECT_EQ(host().send(4), 1);
-  EXPECT_EQ(host().send(1), 1);
+  EXPECT_EQ(host().send(kMessageDestroyInstance), 1);
+  EXPECT_EQ(host().send(kMessageUnload), 1);
   EXPECT_EQ(host().api().pluginData, nullptr);
-  EXPECT_EQ(host().send(1), 1);
+  EXPECT_EQ(host().send(kMessageUnload), 1);
   // Reload so that the fixture's own tear-down finds a plug-in to unload.
-  EXPECT_EQ(host().send(0), 1);
+  EXPECT_EQ(host().send(kMessageLoad), 1);
   EXPECT_NE(host().api().pluginData, nullptr);
 }
 

@@ -66,15 +66,15 @@ class RenderFixture {
     own.height = height;
     own.frameCount = 100;
     host_->addLayer(own);
-    EXPECT_EQ(host_->send(0), 1);
-    EXPECT_EQ(host_->send(2), 1);
-    EXPECT_EQ(host_->send(3), 1);
-    EXPECT_EQ(host_->send(8), 1);
+    EXPECT_EQ(host_->send(kMessageLoad), 1);
+    EXPECT_EQ(host_->send(kMessageDeclareParameters), 1);
+    EXPECT_EQ(host_->send(kMessageCreateInstance), 1);
+    EXPECT_EQ(host_->send(kMessagePrepareGl), 1);
   }
 
   ~RenderFixture() {
-    host_->send(4);
-    host_->send(1);
+    host_->send(kMessageDestroyInstance);
+    host_->send(kMessageUnload);
     host_.reset();
   }
 
@@ -105,9 +105,9 @@ class RenderFixture {
       refhost::RenderFrame target(*host_, {width_, height_, 25.0, pixelAspect, 100, kOwnLayer},
                                   frame);
       host_->setRenderContext(&target.context());
-      EXPECT_EQ(host_->send(12), 1);
+      EXPECT_EQ(host_->send(kMessageRequestFrames), 1);
       glClearColor(0.25f, 0.5f, 0.75f, 1.0f);
-      EXPECT_EQ(host_->send(10), 1);
+      EXPECT_EQ(host_->send(kMessageRender), 1);
       host_->setRenderContext(nullptr);
       // Besides, unit 0 is left active with the source bound and filtering nearest.
       expectGlStateLeftForTheHost({0.25f, 0.5f, 0.75f, 1.0f});

@@ -195,20 +195,21 @@ TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
   EXPECT_EQ(viewer().key(1007, kEscape), 0);  // nothing selected: the key is not taken
   viewer().press(120, 20);
   viewer().release(120, 20);
-  EXPECT_EQ(host().send(1012), 1);  // pointer over the selected input's region
+  EXPECT_EQ(host().send(kMessagePointerOverSelection),
+            1);  // pointer over the selected input's region
   EXPECT_EQ(viewer().key(1007, kEscape), 1);
-  EXPECT_EQ(host().send(1012), 1);  // key down changes nothing
+  EXPECT_EQ(host().send(kMessagePointerOverSelection), 1);  // key down changes nothing
   EXPECT_EQ(viewer().key(1008, kEscape), 1);
-  EXPECT_EQ(host().send(1012), 0);
+  EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
   EXPECT_EQ(viewer().key(1008, kEscape), 0);
   viewer().drag(120, 20, 200, 20);  // released outside the frame: over no input
-  EXPECT_EQ(host().send(1012), 0);
+  EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
 
   // A host that keeps a pressed control's hover drops the selection after every release.
   host().setHostId(3000);
   viewer().press(120, 20);
   viewer().release(120, 20);
-  EXPECT_EQ(host().send(1012), 0);
+  EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
 }
 
 TEST_F(ViewerGestures, ReleaseWithoutPressClosesNoStep) {
@@ -233,11 +234,11 @@ TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   void* const source = host().api().instanceData;
 
   host().api().instanceData = nullptr;
-  ASSERT_EQ(host().send(3), 1);
+  ASSERT_EQ(host().send(kMessageCreateInstance), 1);
   void* const copy = host().api().instanceData;
   EXPECT_EQ(viewer().key(1007, kEscape), 0);  // a fresh record has no selection
   host().setRenderContext(source);
-  EXPECT_EQ(host().send(1014), 0);
+  EXPECT_EQ(host().send(kMessageCopyInstance), 0);
   host().setRenderContext(nullptr);
   EXPECT_EQ(host().api().instanceData, copy);
   EXPECT_EQ(viewer().key(1007, kEscape), 1);  // input 3 is selected here now
@@ -245,7 +246,7 @@ TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   viewer().move(150, 80, false);  // Shift is down here too: the insert cursor
   EXPECT_EQ(lastCursor(), 19);
 
-  EXPECT_EQ(host().send(4), 1);
+  EXPECT_EQ(host().send(kMessageDestroyInstance), 1);
   host().api().instanceData = source;
 }
 

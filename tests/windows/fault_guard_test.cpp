@@ -27,10 +27,10 @@ TEST(FaultGuard, UnloadAnswersTwoWhenDestroyingTheRegistryFaults) {
   for (const void* virtualTable : virtualTables) {
     const void* registry[] = {virtualTable};
     host.api().pluginData = registry;
-    EXPECT_EQ(host.send(1), 2);
+    EXPECT_EQ(host.send(kMessageUnload), 2);
     EXPECT_EQ(host.api().pluginData, nullptr);
-    EXPECT_EQ(host.send(0), 1);  // the guard is gone: a real registry loads and unloads
-    EXPECT_EQ(host.send(1), 1);
+    EXPECT_EQ(host.send(kMessageLoad), 1);  // the guard is gone: a real registry loads and unloads
+    EXPECT_EQ(host.send(kMessageUnload), 1);
   }
 }
 
