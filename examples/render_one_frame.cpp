@@ -24,7 +24,7 @@ int main(int argc, char** argv) {
 
     // The effect's own source: whatever the front end decodes, here a horizontal ramp, handed
     // over as RGBA rows from the bottom up, as GL stores them.
-    engine.setSourceFrames([](int32_t, int32_t width, int32_t height) {
+    engine.setSourceFrames([](int32_t, int32_t width, int32_t height, refhost::PixelFormat) {
       std::vector<uint8_t> rows(static_cast<std::size_t>(width) * height * 4);
       for (std::size_t i = 0; i < rows.size(); i += 4) {
         const auto x = static_cast<uint8_t>((i / 4) % width * 255 / (width - 1));

@@ -1,6 +1,7 @@
 // Host construction, message sending, configuration and the host-side parameter accessors.
 #include "refhost/core/host.h"
 
+#include <cstring>
 #include <stdexcept>
 
 #include "refhost/core/operations.h"
@@ -8,7 +9,7 @@
 namespace refhost {
 
 FrameSource frameCounterSource(uint8_t tag) {
-  return [tag](int32_t frame, int32_t width, int32_t height) {
+  return [tag](int32_t frame, int32_t width, int32_t height, PixelFormat format) {
     auto pixels = static_cast<std::size_t>(width > 0 ? width : 0) *
                   static_cast<std::size_t>(height > 0 ? height : 0);
     std::vector<uint8_t> rgba(pixels * 4);
@@ -19,7 +20,13 @@ FrameSource frameCounterSource(uint8_t tag) {
       rgba[4 * i + 2] = tag;
       rgba[4 * i + 3] = 255;
     }
-    return rgba;
+    if (format == PixelFormat::Rgba8) return rgba;
+    std::vector<uint8_t> halves(rgba.size() * 2);
+    for (std::size_t i = 0; i < rgba.size(); ++i) {
+      const uint16_t half = halfFromFloat(rgba[i] / 255.0f);
+      std::memcpy(&halves[2 * i], &half, 2);
+    }
+    return halves;
   };
 }
 

@@ -19,13 +19,15 @@
 #include "refhost/core/params.h"
 #include "refhost/core/undo.h"
 #include "refhost/gl/gl_context.h"
+#include "refhost/gl/pixel_format.h"
 #include "refhost/gl/texture_pool.h"
 
 namespace refhost {
 
-// RGBA8 pixels of one frame, rows from the bottom as GL stores them (width * height * 4 bytes).
-using FrameSource =
-    std::function<std::vector<uint8_t>(int32_t frame, int32_t width, int32_t height)>;
+// The pixels of one frame in the format, rows from the bottom as GL stores them
+// (width * height * bytesPerPixel(format) bytes).
+using FrameSource = std::function<std::vector<uint8_t>(int32_t frame, int32_t width, int32_t height,
+                                                       PixelFormat format)>;
 
 // The generated default: every pixel red = frame & 255, green = (frame >> 8) & 255,
 // blue = `tag`, alpha 255, so a read-back pixel tells which frame (and which layer) arrived.
@@ -115,6 +117,10 @@ class Host {
   void setTextureFormatMode(uint32_t mode) { api_.textureFormatMode = mode; }
   void setTimeInfo(int32_t width, int32_t height, double frameRate);
   const WispTimeInfo& timeInfo() const { return timeInfo_; }
+  // How the frames the host uploads for the plug-in are stored: 8 bits (GL_RGBA) or half
+  // floats (GL_RGBA16F) when more than 8 bits are to be kept.
+  void setFrameFormat(PixelFormat format) { frameFormat_ = format; }
+  PixelFormat frameFormat() const { return frameFormat_; }
 
   // ---- GL --------------------------------------------------------------------------------
   // Creates the host's context (and makes it current). Throws std::runtime_error with the
@@ -137,6 +143,8 @@ class Host {
   // They come from the same pool as the plug-in's, and deleteTexture gives them back to it.
   TextureRecord createTexture(int32_t width, int32_t height, const void* pixels = nullptr,
                               uint32_t internalFormat = 0x1908 /* GL_RGBA */);
+  // The same for a frame in the host's frame format: pixels (if any) in that format.
+  TextureRecord createFrameTexture(int32_t width, int32_t height, const void* pixels = nullptr);
   void deleteTexture(uint32_t id);
   const TexturePool& texturePool() const { return texturePool_; }
 
@@ -362,6 +370,7 @@ class Host {
   int32_t hostId_ = 0;
   std::wstring hostIdentifier_ = L"org.veltrane.refhost";
   WispTimeInfo timeInfo_{1920, 1080, 25.0};
+  PixelFormat frameFormat_ = PixelFormat::Rgba8;
 
   ParamPanel panel_;
   UndoStack undo_;

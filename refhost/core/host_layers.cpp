@@ -10,9 +10,6 @@
 namespace refhost {
 namespace {
 
-constexpr uint32_t kGlRgba = 0x1908;
-constexpr uint32_t kGlUnsignedByte = 0x1401;
-
 std::string guidText(const char* guid) { return guid ? std::string(guid, strnlen(guid, 64)) : ""; }
 
 double threadCpuSeconds() {
@@ -144,15 +141,14 @@ int32_t Host::deliverFrame(const FrameSource& source, int32_t frame, int32_t wid
   }
   auto started = std::chrono::steady_clock::now();
   double startedCpu = threadCpuSeconds();
-  std::vector<uint8_t> pixels = source(frame, width, height);
-  if (pixels.size() != static_cast<std::size_t>(width) * static_cast<std::size_t>(height) * 4) {
+  std::vector<uint8_t> pixels = source(frame, width, height, frameFormat_);
+  if (pixels.size() != static_cast<std::size_t>(width) * static_cast<std::size_t>(height) *
+                           bytesPerPixel(frameFormat_)) {
     problem("a frame source gave " + std::to_string(pixels.size()) + " bytes for a " +
             std::to_string(width) + "x" + std::to_string(height) + " frame");
     return 1;
   }
-  *out = createTexture(width, height, pixels.data());
-  out->pixelType = kGlUnsignedByte;
-  out->format = kGlRgba;
+  *out = createFrameTexture(width, height, pixels.data());
   frames_.insert(out->id);
   frameDeliverySeconds_ +=
       std::chrono::duration<double>(std::chrono::steady_clock::now() - started).count();

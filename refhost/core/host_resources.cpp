@@ -115,6 +115,22 @@ TextureRecord Host::createTexture(int32_t width, int32_t height, const void* pix
   return record;
 }
 
+TextureRecord Host::createFrameTexture(int32_t width, int32_t height, const void* pixels) {
+  if (!gl_) throw std::logic_error("refhost::Host::createFrameTexture: no GL context attached");
+  gl_->makeCurrent();
+  TextureRecord record{};
+  record.id = texture(
+      TextureKey{width, height, glInternalFormat(frameFormat_), GL_RGBA, glDataType(frameFormat_)},
+      pixels);
+  record.pixelType = glDataType(frameFormat_);
+  record.format = glInternalFormat(frameFormat_);
+  record.allocatedWidth = record.imageWidth = width;
+  record.allocatedHeight = record.imageHeight = height;
+  record.s1 = record.t1 = 1.0f;
+  record.scaleX = record.scaleY = 1.0f;
+  return record;
+}
+
 void Host::deleteTexture(uint32_t id) {
   if (!gl_) return;
   gl_->makeCurrent();

@@ -12,23 +12,24 @@ namespace {
 constexpr int32_t kDecodeAhead = 3;
 
 // Sources that change over time (videos, the counter) decode ahead on a worker thread each.
-std::shared_ptr<MediaSource> opened(const MediaSpec& spec) {
-  std::shared_ptr<MediaSource> source = openMediaSource(spec);
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double rate) {
+  std::shared_ptr<MediaSource> source = openMediaSource(spec, rate);
   if (!source->changesOverTime()) return source;
   return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead);
 }
 
 // Another reader of the same media, opened when its first frame is asked for; a media that
 // looks the same at every frame shares the one it has.
-std::function<FrameSource()> streamOpener(const MediaSpec& spec,
+std::function<FrameSource()> streamOpener(const MediaSpec& spec, double rate,
                                           const std::shared_ptr<MediaSource>& first) {
   if (!first->changesOverTime()) return [first] { return frameSourceOf(first); };
-  return [spec] {
+  return [spec, rate] {
     auto source = std::make_shared<std::shared_ptr<MediaSource>>();
-    return FrameSource([spec, source](int32_t frame, int32_t width, int32_t height) {
-      if (!*source) *source = opened(spec);
-      return (*source)->glRows(frame, width, height);
-    });
+    return FrameSource(
+        [spec, rate, source](int32_t frame, int32_t width, int32_t height, PixelFormat format) {
+          if (!*source) *source = opened(spec, rate);
+          return (*source)->glRows(frame, width, height, format);
+        });
   };
 }
 
@@ -37,14 +38,16 @@ std::function<FrameSource()> streamOpener(const MediaSpec& spec,
 FrameSource frameSourceOf(std::shared_ptr<MediaSource> source) {
   struct Kept {
     int32_t width = -1, height = -1;
+    PixelFormat format = PixelFormat::Rgba8;
     std::vector<uint8_t> rows;
   };
   auto kept = std::make_shared<Kept>();
-  return [source, kept](int32_t frame, int32_t width, int32_t height) {
+  return [source, kept](int32_t frame, int32_t width, int32_t height, PixelFormat format) {
     bool still = !source->changesOverTime();
-    if (still && kept->width == width && kept->height == height) return kept->rows;
-    std::vector<uint8_t> rows = source->glRows(frame, width, height);
-    if (still) *kept = Kept{width, height, rows};
+    if (still && kept->width == width && kept->height == height && kept->format == format)
+      return kept->rows;
+    std::vector<uint8_t> rows = source->glRows(frame, width, height, format);
+    if (still) *kept = Kept{width, height, format, rows};
     return rows;
   };
 }
@@ -53,7 +56,8 @@ const char* const kDefaultOwnLayerGuid = "5ec0a11e-0000-4000-8000-000000000001";
 
 InstalledComposition installComposition(Engine& engine, const Composition& composition) {
   InstalledComposition installed;
-  installed.source = opened(composition.source);
+  const double rate = composition.frameRate;
+  installed.source = opened(composition.source, rate);
   installed.sourceFrameCount =
       installed.source->frameCount() > 0 ? installed.source->frameCount() : composition.duration;
   FrameSettings settings;
@@ -65,7 +69,7 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
   settings.ownLayerGuid = composition.ownLayerGuid;
   engine.setFrameSettings(settings);
   const std::function<FrameSource()> sourceStreams =
-      streamOpener(composition.source, installed.source);
+      streamOpener(composition.source, rate, installed.source);
   engine.setSourceFrames(frameSourceOf(installed.source), sourceStreams);
 
   Layer own;
@@ -84,9 +88,9 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
 
   for (const CompositionLayer& entry : composition.layers) {
     Layer layer = entry.layer;
-    std::shared_ptr<MediaSource> media = opened(entry.media);
+    std::shared_ptr<MediaSource> media = opened(entry.media, rate);
     layer.source = frameSourceOf(media);
-    layer.openStream = streamOpener(entry.media, media);
+    layer.openStream = streamOpener(entry.media, rate, media);
     engine.addLayer(layer);
   }
   return installed;

@@ -57,6 +57,7 @@ Engine::~Engine() {
 void Engine::setFrameSettings(const FrameSettings& settings) {
   settings_ = settings;
   host_->setTimeInfo(settings.width, settings.height, settings.frameRate);
+  host_->setFrameFormat(settings.format);
   ViewerSettings viewer;
   viewer.viewScaleX = viewer_.viewScaleX;
   viewer.viewScaleY = viewer_.viewScaleY;

@@ -32,10 +32,11 @@ int32_t frameToMilliseconds(int32_t frame, double frameRate) {
 
 RenderFrame::RenderFrame(Host& host, const FrameSettings& settings, int32_t frame)
     : host_(host), ownLayerGuid_(settings.ownLayerGuid) {
-  std::vector<uint8_t> pixels = host.sourceFrames()(frame, settings.width, settings.height);
-  context_.source = host.createTexture(settings.width, settings.height, pixels.data());
-  context_.output = host.createTexture(settings.width, settings.height);
-  context_.second = host.createTexture(settings.width, settings.height);
+  std::vector<uint8_t> pixels =
+      host.sourceFrames()(frame, settings.width, settings.height, host.frameFormat());
+  context_.source = host.createFrameTexture(settings.width, settings.height, pixels.data());
+  context_.output = host.createFrameTexture(settings.width, settings.height);
+  context_.second = host.createFrameTexture(settings.width, settings.height);
   fill(settings, frame);
 }
 
@@ -44,7 +45,7 @@ RenderFrame::RenderFrame(Host& host, const FrameSettings& settings, int32_t fram
     : host_(host), ownLayerGuid_(settings.ownLayerGuid), ownsSourceAndOutput_(false) {
   context_.source = source;
   context_.output = output;
-  context_.second = host.createTexture(settings.width, settings.height);
+  context_.second = host.createFrameTexture(settings.width, settings.height);
   fill(settings, frame);
 }
 

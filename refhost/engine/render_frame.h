@@ -25,6 +25,9 @@ struct FrameSettings {
   float pixelAspect = 1.0f;
   int32_t sourceFrameCount = 1;
   std::string ownLayerGuid;
+  // How the frames are stored: half floats when a source or the output holds more than 8 bits.
+  // The output texture (and with it the effect's own targets) is GL_RGBA16F then.
+  PixelFormat format = PixelFormat::Rgba8;
 };
 
 // One frame's render context. Parameter time, frame number and source frame index are all the

@@ -14,7 +14,7 @@ void run(Engine& engine, const RenderRun& run, FrameSink& sink) {
   const FrameSettings& settings = engine.frameSettings();
   GlContext& gl = engine.gl();
   gl.makeCurrent();
-  FrameReadback readback(settings.width, settings.height, kFramesInFlight);
+  FrameReadback readback(settings.width, settings.height, kFramesInFlight, settings.format);
   std::deque<int32_t> reading;
   int32_t count = 0;
   auto handOver = [&] {

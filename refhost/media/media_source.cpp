@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <cmath>
 
 #include "refhost/media/image_files.h"
 #include "refhost/media/video_reader.h"
@@ -10,11 +11,17 @@
 namespace refhost {
 namespace {
 
+// Generated pictures are 8-bit; a deeper picture is asked of them as the same values in the
+// deeper format.
+RgbaImage inFormat(RgbaImage picture, PixelFormat format) {
+  return picture.format == format ? picture : converted(picture, format);
+}
+
 class PatternSource : public MediaSource {
  public:
   explicit PatternSource(Pattern pattern) : pattern_(pattern) {}
-  RgbaImage frame(int32_t index, int32_t width, int32_t height) override {
-    return generatePattern(pattern_, index, width, height);
+  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override {
+    return inFormat(generatePattern(pattern_, index, width, height), format);
   }
   bool changesOverTime() const override { return pattern_ == Pattern::Counter; }
 
@@ -25,8 +32,8 @@ class PatternSource : public MediaSource {
 class ColourSource : public MediaSource {
  public:
   explicit ColourSource(const std::array<float, 4>& colour) : colour_(colour) {}
-  RgbaImage frame(int32_t, int32_t width, int32_t height) override {
-    return solidColour(colour_, width, height);
+  RgbaImage frame(int32_t, int32_t width, int32_t height, PixelFormat format) override {
+    return inFormat(solidColour(colour_, width, height), format);
   }
   bool changesOverTime() const override { return false; }
 
@@ -34,17 +41,24 @@ class ColourSource : public MediaSource {
   std::array<float, 4> colour_;
 };
 
-// A still image decodes once; the picture at the last size asked is kept, since every frame
-// of a render asks for the same one.
+// A still image decodes once; the picture at the last size and format asked is kept, since
+// every frame of a render asks for the same one.
 class StillImageSource : public MediaSource {
  public:
   explicit StillImageSource(const std::string& path) : image_(readImageFile(path)) {}
-  RgbaImage frame(int32_t, int32_t width, int32_t height) override {
-    if (scaled_.width != width || scaled_.height != height)
-      scaled_ = resized(image_, width, height);
+  RgbaImage frame(int32_t, int32_t width, int32_t height, PixelFormat format) override {
+    if (scaled_.width != width || scaled_.height != height || scaled_.format != format)
+      scaled_ = resized(inFormat(image_, format), width, height);
     return scaled_;
   }
   bool changesOverTime() const override { return false; }
+  MediaInfo info() const override {
+    MediaInfo info;
+    info.width = image_.width;
+    info.height = image_.height;
+    info.bitDepth = image_.format == PixelFormat::Rgba8 ? 8 : 16;
+    return info;
+  }
 
  private:
   RgbaImage image_;
@@ -53,23 +67,33 @@ class StillImageSource : public MediaSource {
 
 class VideoSource : public MediaSource {
  public:
-  explicit VideoSource(const std::string& path) : reader_(path) {}
-  RgbaImage frame(int32_t index, int32_t width, int32_t height) override {
-    return reader_.frame(index, width, height);
+  VideoSource(const std::string& path, double compositionRate)
+      : reader_(path), rate_(compositionRate > 0 ? compositionRate : 25.0) {}
+  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override {
+    RgbaImage picture(width, height, format);
+    picture.pixels = flipRows(glRows(index, width, height, format), width, height);
+    return picture;
   }
-  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height) override {
-    return reader_.glRows(index, width, height);
+  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
+                              PixelFormat format) override {
+    return reader_.glRowsAt(index / rate_, width, height, format);
   }
-  int32_t frameCount() const override { return reader_.frameCount(); }
+  int32_t frameCount() const override {
+    const double frames = std::ceil(reader_.info().duration * rate_ - 1e-6);
+    return frames > 0 ? static_cast<int32_t>(std::min(frames, 1e9)) : 0;
+  }
+  MediaInfo info() const override { return reader_.info(); }
 
  private:
   VideoReader reader_;
+  double rate_;
 };
 
 }  // namespace
 
-std::vector<uint8_t> MediaSource::glRows(int32_t index, int32_t width, int32_t height) {
-  RgbaImage image = frame(index, width, height);
+std::vector<uint8_t> MediaSource::glRows(int32_t index, int32_t width, int32_t height,
+                                         PixelFormat format) {
+  RgbaImage image = frame(index, width, height, format);
   return flipRows(image.pixels, image.width, image.height);
 }
 
@@ -107,14 +131,14 @@ bool isVideoPath(const std::string& path) {
   return false;
 }
 
-std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec) {
+std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, double compositionRate) {
   switch (spec.kind) {
     case MediaSpec::Kind::Pattern:
       return std::make_shared<PatternSource>(spec.pattern);
     case MediaSpec::Kind::Colour:
       return std::make_shared<ColourSource>(spec.colour);
     case MediaSpec::Kind::File:
-      if (isVideoPath(spec.path)) return std::make_shared<VideoSource>(spec.path);
+      if (isVideoPath(spec.path)) return std::make_shared<VideoSource>(spec.path, compositionRate);
       return std::make_shared<StillImageSource>(spec.path);
   }
   return nullptr;

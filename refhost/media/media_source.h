@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include "refhost/media/colour.h"
 #include "refhost/media/rgba_image.h"
 #include "refhost/media/test_patterns.h"
 
@@ -26,22 +27,44 @@ struct MediaSpec {
   static MediaSpec ofFile(const std::string& path);
 };
 
+// What a media holds, as far as a composition cares.
+struct MediaInfo {
+  // The picture's size as players show it: upright (a display rotation applied) and at square
+  // pixels (a sample aspect ratio applied). 0 for generated pictures, which take any size.
+  int32_t width = 0;
+  int32_t height = 0;
+  int32_t bitDepth = 8;  // bits a channel of the stored pictures
+  // What the pictures were converted to RGB from; still images and generated pictures are
+  // sRGB/BT.709 RGB already.
+  ColourDescription colour = ColourDescription::bt709();
+  double frameRate = 0;  // the media's own (average) rate; 0 for a still or a pattern
+  double duration = 0;   // seconds; 0 for what has no end (stills, patterns)
+  bool hasAudio = false;
+};
+
 class MediaSource {
  public:
   virtual ~MediaSource() = default;
-  // Frame `index` stretched to the size, top row first. Frames outside a video hold its first
-  // or last frame.
-  virtual RgbaImage frame(int32_t index, int32_t width, int32_t height) = 0;
+  // The picture at composition frame `index` (at the rate the media was opened for), stretched
+  // to the size, top row first, in the format. Frames before a video's first show its first,
+  // after its last its last.
+  virtual RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) = 0;
   // The same picture in GL's row order, bottom row first, as the host uploads it.
-  virtual std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height);
-  // How many frames the media holds; 0 when it looks the same at every frame or never ends.
+  virtual std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
+                                      PixelFormat format);
+  // How many composition frames the media covers; 0 when it looks the same at every frame or
+  // never ends.
   virtual int32_t frameCount() const { return 0; }
   // False when every frame is the same picture, which lets a caller keep the last one.
   virtual bool changesOverTime() const { return true; }
+  virtual MediaInfo info() const { return {}; }
 };
 
-// Throws std::runtime_error naming the file when a file cannot be opened or decoded.
-std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec);
+// Throws std::runtime_error naming the file when a file cannot be opened or decoded, or holds
+// what the host does not show (see VideoReader). Composition frame n at `compositionRate`
+// frames a second shows the media's picture whose presentation time is the latest at or before
+// n / compositionRate, as players and editors choose it.
+std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, double compositionRate);
 
 // Files with these endings are decoded as video; everything else as a still image.
 bool isVideoPath(const std::string& path);

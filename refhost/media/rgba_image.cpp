@@ -13,7 +13,43 @@ std::size_t byteCount(int32_t width, int32_t height) {
          static_cast<std::size_t>(std::max(height, 0)) * 4;
 }
 
+// 0 to 1 as 0 to 255, rounded; below 0 and NaN give 0, above 1 gives 255.
+uint8_t unitToByte(float value) {
+  if (!(value > 0.0f)) return 0;
+  return static_cast<uint8_t>(std::lround(std::min(value, 1.0f) * 255.0f));
+}
+
 }  // namespace
+
+RgbaImage::RgbaImage(int32_t width, int32_t height, PixelFormat format)
+    : width(std::max(width, 0)),
+      height(std::max(height, 0)),
+      format(format),
+      pixels(byteCount(width, height) / 4 * bytesPerPixel(format)) {}
+
+float RgbaImage::channel(int32_t x, int32_t y, int c) const {
+  const std::size_t index = (static_cast<std::size_t>(y) * static_cast<std::size_t>(width) +
+                             static_cast<std::size_t>(x)) *
+                                4 +
+                            static_cast<std::size_t>(c);
+  if (format == PixelFormat::Rgba8) return pixels[index] / 255.0f;
+  uint16_t half;
+  std::memcpy(&half, &pixels[index * 2], 2);
+  return floatFromHalf(half);
+}
+
+void RgbaImage::setChannel(int32_t x, int32_t y, int c, float value) {
+  const std::size_t index = (static_cast<std::size_t>(y) * static_cast<std::size_t>(width) +
+                             static_cast<std::size_t>(x)) *
+                                4 +
+                            static_cast<std::size_t>(c);
+  if (format == PixelFormat::Rgba8) {
+    pixels[index] = unitToByte(value);
+    return;
+  }
+  const uint16_t half = halfFromFloat(value);
+  std::memcpy(&pixels[index * 2], &half, 2);
+}
 
 RgbaImage::RgbaImage(int32_t width, int32_t height, Rgba8 fill)
     : width(std::max(width, 0)), height(std::max(height, 0)), pixels(byteCount(width, height)) {
@@ -45,21 +81,23 @@ void RgbaImage::fillRect(int32_t x0, int32_t y0, int32_t x1, int32_t y1, Rgba8 c
   }
 }
 
+void copyRowsFlipped(const uint8_t* from, uint8_t* to, std::size_t rowBytes, int32_t rows) {
+  for (int32_t y = 0; y < rows; ++y)
+    std::memcpy(to + static_cast<std::size_t>(rows - 1 - y) * rowBytes,
+                from + static_cast<std::size_t>(y) * rowBytes, rowBytes);
+}
+
 std::vector<uint8_t> flipRows(const std::vector<uint8_t>& pixels, int32_t width, int32_t height) {
   std::vector<uint8_t> flipped(pixels.size());
-  std::size_t row = static_cast<std::size_t>(std::max(width, 0)) * 4;
-  for (int32_t y = 0; y < height && row > 0; ++y) {
-    std::size_t from = static_cast<std::size_t>(y) * row;
-    std::size_t to = static_cast<std::size_t>(height - 1 - y) * row;
-    if (from + row <= pixels.size() && to + row <= flipped.size())
-      std::memcpy(&flipped[to], &pixels[from], row);
-  }
+  if (width <= 0 || height <= 0) return flipped;
+  copyRowsFlipped(pixels.data(), flipped.data(), pixels.size() / static_cast<std::size_t>(height),
+                  height);
   return flipped;
 }
 
 RgbaImage resized(const RgbaImage& image, int32_t width, int32_t height) {
   if (image.width == width && image.height == height) return image;
-  RgbaImage out(width, height);
+  RgbaImage out(width, height, image.format);
   if (image.width == 0 || image.height == 0) return out;
   // Pixel centres of the output mapped onto the input, clamped at the edges.
   auto sample = [](int32_t outSize, int32_t inSize, int32_t index, int32_t& low, int32_t& high,
@@ -81,11 +119,36 @@ RgbaImage resized(const RgbaImage& image, int32_t width, int32_t height) {
       float wx = 0;
       sample(out.width, image.width, x, x0, x1, wx);
       for (int c = 0; c < 4; ++c) {
-        float top = image.at(x0, y0)[c] * (1 - wx) + image.at(x1, y0)[c] * wx;
-        float bottom = image.at(x0, y1)[c] * (1 - wx) + image.at(x1, y1)[c] * wx;
-        out.at(x, y)[c] = static_cast<uint8_t>(std::lround(top * (1 - wy) + bottom * wy));
+        if (image.format == PixelFormat::Rgba8) {
+          float top = image.at(x0, y0)[c] * (1 - wx) + image.at(x1, y0)[c] * wx;
+          float bottom = image.at(x0, y1)[c] * (1 - wx) + image.at(x1, y1)[c] * wx;
+          out.at(x, y)[c] = static_cast<uint8_t>(std::lround(top * (1 - wy) + bottom * wy));
+          continue;
+        }
+        float top = image.channel(x0, y0, c) * (1 - wx) + image.channel(x1, y0, c) * wx;
+        float bottom = image.channel(x0, y1, c) * (1 - wx) + image.channel(x1, y1, c) * wx;
+        out.setChannel(x, y, c, top * (1 - wy) + bottom * wy);
       }
     }
+  }
+  return out;
+}
+
+RgbaImage converted(const RgbaImage& image, PixelFormat format) {
+  if (image.format == format) return image;
+  RgbaImage out(image.width, image.height, format);
+  const std::size_t values = static_cast<std::size_t>(image.width) * image.height * 4;
+  if (format == PixelFormat::RgbaHalf) {
+    uint16_t table[256];
+    for (int v = 0; v < 256; ++v) table[v] = halfFromFloat(v / 255.0f);
+    for (std::size_t i = 0; i < values; ++i)
+      std::memcpy(&out.pixels[i * 2], &table[image.pixels[i]], 2);
+    return out;
+  }
+  for (std::size_t i = 0; i < values; ++i) {
+    uint16_t half;
+    std::memcpy(&half, &image.pixels[i * 2], 2);
+    out.pixels[i] = unitToByte(floatFromHalf(half));
   }
   return out;
 }

@@ -1,10 +1,13 @@
-// An 8-bit RGBA picture held top row first, the order image files use; GL keeps rows bottom
-// first, so crossing between the two is one row flip.
+// An RGBA picture held top row first, the order image files use, with 8 bits a channel or, for
+// pictures of more than 8 bits, half floats; GL keeps rows bottom first, so crossing between
+// the two is one row flip.
 #pragma once
 
 #include <array>
 #include <cstdint>
 #include <vector>
+
+#include "refhost/gl/pixel_format.h"
 
 namespace refhost {
 
@@ -13,13 +16,22 @@ using Rgba8 = std::array<uint8_t, 4>;
 struct RgbaImage {
   int32_t width = 0;
   int32_t height = 0;
-  std::vector<uint8_t> pixels;  // width * height * 4 bytes, top row first
+  PixelFormat format = PixelFormat::Rgba8;
+  // width * height * bytesPerPixel(format) bytes, top row first; half floats in this machine's
+  // byte order.
+  std::vector<uint8_t> pixels;
 
   RgbaImage() = default;
-  // A picture of the size filled with one colour; negative sizes count as 0.
+  // An 8-bit picture of the size filled with one colour; negative sizes count as 0.
   RgbaImage(int32_t width, int32_t height, Rgba8 fill = {0, 0, 0, 0});
+  // A picture of the size and format, all zero.
+  RgbaImage(int32_t width, int32_t height, PixelFormat format);
 
-  // x from the left, y from the top; no bounds check.
+  // Channel c of the pixel from 0 to 1, whatever the format; no bounds check.
+  float channel(int32_t x, int32_t y, int c) const;
+  void setChannel(int32_t x, int32_t y, int c, float value);
+
+  // 8-bit pictures only. x from the left, y from the top; no bounds check.
   uint8_t* at(int32_t x, int32_t y);
   const uint8_t* at(int32_t x, int32_t y) const;
   Rgba8 pixel(int32_t x, int32_t y) const;
@@ -27,11 +39,17 @@ struct RgbaImage {
   void fillRect(int32_t x0, int32_t y0, int32_t x1, int32_t y1, Rgba8 colour);
 };
 
-// Reverses the row order of width * height RGBA8 pixels: top-first to bottom-first and back.
+// Reverses the row order of `height` rows of equal length: top-first to bottom-first and back.
+// The one place rows change order (see FrameReadback for the copy out of GL).
 std::vector<uint8_t> flipRows(const std::vector<uint8_t>& pixels, int32_t width, int32_t height);
+void copyRowsFlipped(const uint8_t* from, uint8_t* to, std::size_t rowBytes, int32_t rows);
 
 // The picture stretched to the size with bilinear filtering between pixel centres (a plain copy
-// when the size is unchanged).
+// when the size is unchanged), in its own format.
 RgbaImage resized(const RgbaImage& image, int32_t width, int32_t height);
+
+// The picture in the format: 8 bits become v / 255 exactly; half floats become 8 bits rounded
+// to nearest, clamped to 0 to 255.
+RgbaImage converted(const RgbaImage& image, PixelFormat format);
 
 }  // namespace refhost

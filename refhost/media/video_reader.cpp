@@ -59,8 +59,9 @@ struct VideoReader::Decoder {
   int64_t startTime = 0;
   int32_t frameCount = 0;
   int32_t currentIndex = -1;  // index of `current`; -1 when none since the last seek
-  bool draining = false;      // the demuxer ran out and the decoder was told so
-  bool ended = false;         // the decoder gave everything it had
+  MediaInfo info;
+  bool draining = false;  // the demuxer ran out and the decoder was told so
+  bool ended = false;     // the decoder gave everything it had
 
   ~Decoder() {
     sws_freeContext(scaler);
@@ -202,32 +203,36 @@ VideoReader::VideoReader(const std::string& path) : decoder_(std::make_unique<De
   av_log_set_callback(keepLibraryError);
   lastLibraryError.clear();
   decoder_->open();
+  MediaInfo& info = decoder_->info;
+  info.width = decoder_->codec->width;
+  info.height = decoder_->codec->height;
+  info.frameRate = av_q2d(decoder_->rate);
+  info.duration = decoder_->frameCount / info.frameRate;
 }
 
 VideoReader::~VideoReader() = default;
 
-int32_t VideoReader::width() const { return decoder_->codec->width; }
-int32_t VideoReader::height() const { return decoder_->codec->height; }
-double VideoReader::frameRate() const { return av_q2d(decoder_->rate); }
-int32_t VideoReader::frameCount() const { return decoder_->frameCount; }
+const MediaInfo& VideoReader::info() const { return decoder_->info; }
 
-RgbaImage VideoReader::frame(int32_t index, int32_t width, int32_t height) {
+std::vector<uint8_t> VideoReader::glRowsAt(double seconds, int32_t width, int32_t height,
+                                           PixelFormat format) {
   lastLibraryError.clear();
-  decoder_->seekTo(index);
-  RgbaImage image(width, height);
-  decoder_->convert(image.width, image.height, image.pixels.data(), image.width * 4);
-  return image;
-}
-
-std::vector<uint8_t> VideoReader::glRows(int32_t index, int32_t width, int32_t height) {
-  lastLibraryError.clear();
-  decoder_->seekTo(index);
+  decoder_->seekTo(static_cast<int32_t>(std::floor(seconds * decoder_->info.frameRate + 1e-6)));
   width = std::max(width, 0);
   height = std::max(height, 0);
   const std::size_t row = static_cast<std::size_t>(width) * 4;
   std::vector<uint8_t> rows(row * static_cast<std::size_t>(height));
   if (!rows.empty()) decoder_->convert(width, height, &rows[row * (height - 1)], -width * 4);
-  return rows;
+  if (format == PixelFormat::Rgba8) return rows;
+  RgbaImage picture(width, height);
+  picture.pixels = std::move(rows);
+  return converted(picture, format).pixels;
+}
+
+RgbaImage VideoReader::frameAt(double seconds, int32_t width, int32_t height, PixelFormat format) {
+  RgbaImage picture(width, height, format);
+  picture.pixels = flipRows(glRowsAt(seconds, width, height, format), width, height);
+  return picture;
 }
 
 }  // namespace refhost

@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+#include "refhost/media/colour.h"
+#include "refhost/media/media_source.h"
 #include "refhost/media/rgba_image.h"
 
 namespace refhost {
@@ -19,17 +21,15 @@ class VideoReader {
   VideoReader(const VideoReader&) = delete;
   VideoReader& operator=(const VideoReader&) = delete;
 
-  int32_t width() const;
-  int32_t height() const;
-  double frameRate() const;
-  // The number of frames the file declares (or its duration implies); 0 when unknown.
-  int32_t frameCount() const;
+  const MediaInfo& info() const;
 
-  // Frame `index` counted from 0 at the stream's rate, scaled to the size, top row first.
-  // Indexes before the first frame give the first, after the last the last.
-  RgbaImage frame(int32_t index, int32_t width, int32_t height);
-  // The same picture in GL's row order (bottom row first), converted straight into it.
-  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height);
+  // The picture shown `seconds` after the stream's start: the frame whose presentation time is
+  // the latest at or before it (the first frame before the first, the last after the last),
+  // scaled to the size, in GL's row order (bottom row first), in the format.
+  std::vector<uint8_t> glRowsAt(double seconds, int32_t width, int32_t height, PixelFormat format);
+  // The same picture top row first.
+  RgbaImage frameAt(double seconds, int32_t width, int32_t height,
+                    PixelFormat format = PixelFormat::Rgba8);
 
  private:
   struct Decoder;

@@ -16,11 +16,11 @@ struct VideoReader::Decoder {};
 
 VideoReader::VideoReader(const std::string& path) { videoUnavailable(path); }
 VideoReader::~VideoReader() = default;
-int32_t VideoReader::width() const { return 0; }
-int32_t VideoReader::height() const { return 0; }
-double VideoReader::frameRate() const { return 0; }
-int32_t VideoReader::frameCount() const { return 0; }
-RgbaImage VideoReader::frame(int32_t, int32_t, int32_t) { return {}; }
-std::vector<uint8_t> VideoReader::glRows(int32_t, int32_t, int32_t) { return {}; }
+const MediaInfo& VideoReader::info() const {
+  static const MediaInfo none;
+  return none;
+}
+std::vector<uint8_t> VideoReader::glRowsAt(double, int32_t, int32_t, PixelFormat) { return {}; }
+RgbaImage VideoReader::frameAt(double, int32_t, int32_t, PixelFormat) { return {}; }
 
 }  // namespace refhost

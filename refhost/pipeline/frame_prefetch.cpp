@@ -9,6 +9,7 @@ PrefetchingSource::PrefetchingSource(std::shared_ptr<MediaSource> inner, int32_t
     : inner_(std::move(inner)),
       depth_(std::max(depth, 1)),
       frameCount_(inner_->frameCount()),
+      info_(inner_->info()),
       worker_([this] { work(); }) {}
 
 PrefetchingSource::~PrefetchingSource() {
@@ -31,10 +32,11 @@ void PrefetchingSource::work() {
     preparing_ = index;
     const uint64_t generation = generation_;
     const int32_t width = width_, height = height_;
+    const PixelFormat format = format_;
     lock.unlock();
     Prepared prepared;
     try {
-      prepared.rows = inner_->glRows(index, width, height);
+      prepared.rows = inner_->glRows(index, width, height, format);
     } catch (...) {
       prepared.error = std::current_exception();
     }
@@ -52,8 +54,9 @@ void PrefetchingSource::work() {
   }
 }
 
-bool PrefetchingSource::onCourse(int32_t index, int32_t width, int32_t height) const {
-  if (!running_ || width != width_ || height != height_) return false;
+bool PrefetchingSource::onCourse(int32_t index, int32_t width, int32_t height,
+                                 PixelFormat format) const {
+  if (!running_ || width != width_ || height != height_ || format != format_) return false;
   if (failed_ && failedAt_ < index) return false;
   // The lowest frame still to come: the oldest waiting, the one being prepared or the next.
   int32_t lowest = preparing_.value_or(next_);
@@ -61,10 +64,11 @@ bool PrefetchingSource::onCourse(int32_t index, int32_t width, int32_t height) c
   return index >= lowest && index < next_ + depth_;
 }
 
-void PrefetchingSource::restart(int32_t index, int32_t width, int32_t height) {
+void PrefetchingSource::restart(int32_t index, int32_t width, int32_t height, PixelFormat format) {
   ready_.clear();
   width_ = width;
   height_ = height;
+  format_ = format;
   next_ = index;
   preparing_.reset();  // whatever the worker is on now is dropped
   ++generation_;
@@ -72,9 +76,10 @@ void PrefetchingSource::restart(int32_t index, int32_t width, int32_t height) {
   failed_ = false;
 }
 
-std::vector<uint8_t> PrefetchingSource::glRows(int32_t index, int32_t width, int32_t height) {
+std::vector<uint8_t> PrefetchingSource::glRows(int32_t index, int32_t width, int32_t height,
+                                               PixelFormat format) {
   std::unique_lock<std::mutex> lock(mutex_);
-  if (!onCourse(index, width, height)) restart(index, width, height);
+  if (!onCourse(index, width, height, format)) restart(index, width, height, format);
   // Frames before this one are not wanted any more; dropping them lets the worker go on, and
   // it skips straight to this one if it is not there yet.
   wanted_ = index;
@@ -93,11 +98,10 @@ std::vector<uint8_t> PrefetchingSource::glRows(int32_t index, int32_t width, int
   return std::move(prepared.rows);
 }
 
-RgbaImage PrefetchingSource::frame(int32_t index, int32_t width, int32_t height) {
-  RgbaImage image;
-  image.width = std::max(width, 0);
-  image.height = std::max(height, 0);
-  image.pixels = flipRows(glRows(index, width, height), image.width, image.height);
+RgbaImage PrefetchingSource::frame(int32_t index, int32_t width, int32_t height,
+                                   PixelFormat format) {
+  RgbaImage image(width, height, format);
+  image.pixels = flipRows(glRows(index, width, height, format), image.width, image.height);
   return image;
 }
 

@@ -29,9 +29,11 @@ class PrefetchingSource : public MediaSource {
   PrefetchingSource(const PrefetchingSource&) = delete;
   PrefetchingSource& operator=(const PrefetchingSource&) = delete;
 
-  RgbaImage frame(int32_t index, int32_t width, int32_t height) override;
-  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height) override;
+  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override;
+  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
+                              PixelFormat format) override;
   int32_t frameCount() const override { return frameCount_; }
+  MediaInfo info() const override { return info_; }
   bool changesOverTime() const override { return true; }
 
  private:
@@ -41,17 +43,19 @@ class PrefetchingSource : public MediaSource {
   };
   void work();
   // Whether the worker is on its way to `index` for pictures of the size.
-  bool onCourse(int32_t index, int32_t width, int32_t height) const;
+  bool onCourse(int32_t index, int32_t width, int32_t height, PixelFormat format) const;
   // Starts over at `index` for pictures of the size: what waits is dropped.
-  void restart(int32_t index, int32_t width, int32_t height);
+  void restart(int32_t index, int32_t width, int32_t height, PixelFormat format);
 
   std::shared_ptr<MediaSource> inner_;
   const int32_t depth_;
   const int32_t frameCount_;
+  const MediaInfo info_;
 
   std::mutex mutex_;
   std::condition_variable changed_;
   int32_t width_ = -1, height_ = -1;
+  PixelFormat format_ = PixelFormat::Rgba8;
   int32_t next_ = 0;                  // the next frame the worker prepares
   int32_t wanted_ = 0;                // the frame last asked for; those before it are not kept
   std::optional<int32_t> preparing_;  // the frame the worker is on, when it counts

@@ -11,15 +11,18 @@
 namespace refhost {
 namespace {
 
-std::size_t rowBytes(int32_t width) { return static_cast<std::size_t>(std::max(width, 0)) * 4; }
+std::size_t rowBytes(int32_t width, PixelFormat format) {
+  return static_cast<std::size_t>(std::max(width, 0)) * bytesPerPixel(format);
+}
 
 }  // namespace
 
-FrameReadback::FrameReadback(int32_t width, int32_t height, int32_t depth)
-    : width_(std::max(width, 0)), height_(std::max(height, 0)) {
+FrameReadback::FrameReadback(int32_t width, int32_t height, int32_t depth, PixelFormat format)
+    : width_(std::max(width, 0)), height_(std::max(height, 0)), format_(format) {
   buffers_.resize(static_cast<std::size_t>(std::max(depth, 1)));
   glGenBuffers(static_cast<GLsizei>(buffers_.size()), buffers_.data());
-  const auto bytes = static_cast<GLsizeiptr>(rowBytes(width_) * static_cast<std::size_t>(height_));
+  const auto bytes =
+      static_cast<GLsizeiptr>(rowBytes(width_, format_) * static_cast<std::size_t>(height_));
   for (uint32_t buffer : buffers_) {
     glBindBuffer(GL_PIXEL_PACK_BUFFER, buffer);
     glBufferData(GL_PIXEL_PACK_BUFFER, bytes, nullptr, GL_STREAM_READ);
@@ -45,7 +48,7 @@ bool FrameReadback::start(uint32_t texture) {
   free_.pop_back();
   glBindBuffer(GL_PIXEL_PACK_BUFFER, buffer);
   glPixelStorei(GL_PACK_ALIGNMENT, 4);
-  glReadPixels(0, 0, width_, height_, GL_RGBA, GL_UNSIGNED_BYTE, nullptr);
+  glReadPixels(0, 0, width_, height_, GL_RGBA, glDataType(format_), nullptr);
   glBindBuffer(GL_PIXEL_PACK_BUFFER, 0);
   // Detached again, so the texture can go back to its owner's pool at once.
   glFramebufferTexture2D(GL_READ_FRAMEBUFFER, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D, 0, 0);
@@ -65,20 +68,14 @@ RgbaImage FrameReadback::collect() {
   }
   glDeleteSync(fence);
 
-  RgbaImage picture;
-  picture.width = width_;
-  picture.height = height_;
-  const std::size_t row = rowBytes(width_);
-  picture.pixels.resize(row * static_cast<std::size_t>(height_));
+  RgbaImage picture(width_, height_, format_);
+  const std::size_t row = rowBytes(width_, format_);
   glBindBuffer(GL_PIXEL_PACK_BUFFER, read.buffer);
   const auto bytes = static_cast<GLsizeiptr>(picture.pixels.size());
   const auto* mapped = static_cast<const uint8_t*>(
       glMapBufferRange(GL_PIXEL_PACK_BUFFER, 0, bytes, GL_MAP_READ_BIT));
   // GL's rows run bottom up; the copy out of the buffer turns them the right way up.
-  for (int32_t y = 0; mapped && y < height_; ++y) {
-    std::memcpy(&picture.pixels[static_cast<std::size_t>(height_ - 1 - y) * row],
-                mapped + static_cast<std::size_t>(y) * row, row);
-  }
+  if (mapped) copyRowsFlipped(mapped, picture.pixels.data(), row, height_);
   if (mapped) glUnmapBuffer(GL_PIXEL_PACK_BUFFER);
   glBindBuffer(GL_PIXEL_PACK_BUFFER, 0);
   free_.push_back(read.buffer);
@@ -86,8 +83,8 @@ RgbaImage FrameReadback::collect() {
   return picture;
 }
 
-RgbaImage readBack(uint32_t texture, int32_t width, int32_t height) {
-  FrameReadback readback(width, height, 1);
+RgbaImage readBack(uint32_t texture, int32_t width, int32_t height, PixelFormat format) {
+  FrameReadback readback(width, height, 1, format);
   readback.start(texture);
   return readback.collect();
 }

@@ -13,9 +13,11 @@ namespace refhost {
 
 class FrameReadback {
  public:
-  // Reads of RGBA8 textures of the size, at most `depth` (at least 1) in flight. Needs the GL
-  // context current here and in every call, the destructor included.
-  FrameReadback(int32_t width, int32_t height, int32_t depth);
+  // Reads of textures of the size into pictures of the format (8-bit, or half floats read as
+  // GL holds them), at most `depth` (at least 1) in flight. Needs the GL context current here
+  // and in every call, the destructor included.
+  FrameReadback(int32_t width, int32_t height, int32_t depth,
+                PixelFormat format = PixelFormat::Rgba8);
   ~FrameReadback();
   FrameReadback(const FrameReadback&) = delete;
   FrameReadback& operator=(const FrameReadback&) = delete;
@@ -36,6 +38,7 @@ class FrameReadback {
   };
 
   int32_t width_, height_;
+  PixelFormat format_;
   uint32_t framebuffer_ = 0;
   std::vector<uint32_t> buffers_;
   std::vector<uint32_t> free_;
@@ -45,6 +48,7 @@ class FrameReadback {
 // One texture read back at once through a FrameReadback of depth 1, top row first: for a
 // picture wanted now (a test, a still the viewer saves), on the same path a render's frames
 // take. Needs the GL context current.
-RgbaImage readBack(uint32_t texture, int32_t width, int32_t height);
+RgbaImage readBack(uint32_t texture, int32_t width, int32_t height,
+                   PixelFormat format = PixelFormat::Rgba8);
 
 }  // namespace refhost

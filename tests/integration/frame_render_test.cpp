@@ -96,12 +96,14 @@ TEST(FrameRender, BorderCoverageFollowsTheDistanceToTheCut) {
 TEST(FrameRender, WithoutCutsTheOutputIsTheSource) {
   RenderFixture fixture;
   fixture.host().setValue("numberOfCuts", ParamValue::ofInt(0));
-  const refhost::FrameSource ramp = [](int32_t, int32_t width, int32_t height) {
+  const refhost::FrameSource ramp = [](int32_t, int32_t width, int32_t height,
+                                       refhost::PixelFormat) {
     std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
     for (size_t i = 0; i < pixels.size(); ++i) pixels[i] = static_cast<uint8_t>(i * 7 % 251);
     return pixels;
   };
-  EXPECT_EQ(fixture.render(kRed, 10, ramp), ramp(10, fixture.width(), fixture.height()));
+  EXPECT_EQ(fixture.render(kRed, 10, ramp),
+            ramp(10, fixture.width(), fixture.height(), refhost::PixelFormat::Rgba8));
 }
 
 TEST(FrameRender, ViewCutRegionsTintsARampOfGreys) {
@@ -121,8 +123,10 @@ TEST(FrameRender, ShiftedInputsShowTheirFrameOrTransparentBlack) {
   refhost::Host& host = fixture.host();
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
   setCut(host, 0, 0.0f, 0.0f, 0.0f);
-  const refhost::FrameSource counter = [](int32_t frame, int32_t width, int32_t height) {
-    return solidSource({static_cast<uint8_t>(frame), 0, 0, 255})(frame, width, height);
+  const refhost::FrameSource counter = [](int32_t frame, int32_t width, int32_t height,
+                                          refhost::PixelFormat) {
+    return solidSource({static_cast<uint8_t>(frame), 0, 0, 255})(frame, width, height,
+                                                                 refhost::PixelFormat::Rgba8);
   };
   host.setValue("inputFrameShift1", ParamValue::ofInt(-3));
   std::vector<uint8_t> pixels = fixture.render(kRed, 10, counter);

@@ -20,7 +20,7 @@
 using Rgba = std::array<uint8_t, 4>;
 
 inline refhost::FrameSource solidSource(Rgba colour) {
-  return [colour](int32_t, int32_t width, int32_t height) {
+  return [colour](int32_t, int32_t width, int32_t height, refhost::PixelFormat) {
     std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
     for (size_t i = 0; i < pixels.size(); i += 4)
       for (size_t c = 0; c < 4; ++c) pixels[i + c] = colour[c];

@@ -62,7 +62,7 @@ MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
               problem + ")");
   MediaSpec spec = MediaSpec::ofFile(path.lexically_normal().string());
   try {
-    refhost::openMediaSource(spec);
+    refhost::openMediaSource(spec, 25.0);  // any rate: only its opening is checked here
   } catch (const std::exception& error) {
     file.fail(std::string("a file that decodes (") + error.what() + ")");
   }

@@ -50,16 +50,19 @@ TEST(RenderCommand, EveryOutputKindCarriesTheFramesAskedInOrder) {
     for (const std::string& progress : {count + "  ", std::string(" fps "), std::string(" s left")})
       EXPECT_NE(run.err.find(progress), std::string::npos) << output << ": " << run.err;
   }
-  refhost::VideoReader video(folder.file("v.mkv")), all(folder.file("all.mkv"));
-  ASSERT_EQ(video.frameCount(), 29);
-  ASSERT_EQ(all.frameCount(), 30);
+  auto video = refhost::openMediaSource(refhost::MediaSpec::ofFile(folder.file("v.mkv")), 25);
+  auto all = refhost::openMediaSource(refhost::MediaSpec::ofFile(folder.file("all.mkv")), 25);
+  ASSERT_EQ(video->frameCount(), 29);
+  ASSERT_EQ(all->frameCount(), 30);
   for (int frame = 1; frame <= 29; ++frame) {
     char name[32];
     std::snprintf(name, sizeof name, "s_%04d.png", frame);
     EXPECT_EQ(code(refhost::readImageFile(folder.file(name))), frame) << name;
-    EXPECT_EQ(code(video.frame(frame - 1, 64, 36)), frame) << "video frame " << frame - 1;
+    EXPECT_EQ(code(video->frame(frame - 1, 64, 36, refhost::PixelFormat::Rgba8)), frame)
+        << "video frame " << frame - 1;
   }
-  for (int frame : {0, 7, 29, 3}) EXPECT_EQ(code(all.frame(frame, 64, 36)), frame) << frame;
+  for (int frame : {0, 7, 29, 3})
+    EXPECT_EQ(code(all->frame(frame, 64, 36, refhost::PixelFormat::Rgba8)), frame) << frame;
   EXPECT_EQ(folder.entries().size(), 33u);  // scene, still, 29 frames, two videos: nothing else
 }
 

@@ -20,7 +20,7 @@ namespace {
 class NumberedSource : public MediaSource {
  public:
   explicit NumberedSource(int32_t failAt = -1) : failAt_(failAt) {}
-  RgbaImage frame(int32_t index, int32_t width, int32_t height) override {
+  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat) override {
     if (index == failAt_)
       throw std::runtime_error("clip.mp4: cannot decode video: frame " + std::to_string(index));
     return RgbaImage(width, height,
@@ -37,11 +37,13 @@ TEST(PrefetchingSource, GivesTheWrappedSourcesFramesWhateverTheOrder) {
   const int32_t requests[][2] = {{0, 4}, {1, 4},  {2, 4},  {2, 4}, {1, 4}, {5, 4},
                                  {6, 4}, {12, 4}, {13, 2}, {3, 2}, {6, 2}, {8, 2}};
   for (const auto& r : requests)
-    EXPECT_EQ(ahead.glRows(r[0], r[1], 2), direct.glRows(r[0], r[1], 2)) << r[0] << " " << r[1];
+    EXPECT_EQ(ahead.glRows(r[0], r[1], 2, PixelFormat::Rgba8),
+              direct.glRows(r[0], r[1], 2, PixelFormat::Rgba8))
+        << r[0] << " " << r[1];
   // The worker has met the failing frame by now; it surfaces when asked for, and again.
   for (int attempt = 0; attempt < 2; ++attempt)
-    EXPECT_THROW(ahead.glRows(7, 2, 2), std::runtime_error);
-  EXPECT_EQ(ahead.glRows(8, 2, 2), direct.glRows(8, 2, 2));
+    EXPECT_THROW(ahead.glRows(7, 2, 2, PixelFormat::Rgba8), std::runtime_error);
+  EXPECT_EQ(ahead.glRows(8, 2, 2, PixelFormat::Rgba8), direct.glRows(8, 2, 2, PixelFormat::Rgba8));
 }
 
 std::unique_ptr<Engine> engineOver(std::shared_ptr<MediaSource> source) {
@@ -106,7 +108,7 @@ struct ReaderLog {
   FrameSource open() {
     asked.emplace_back();
     const std::size_t reader = asked.size() - 1;
-    return [this, reader](int32_t frame, int32_t width, int32_t height) {
+    return [this, reader](int32_t frame, int32_t width, int32_t height, refhost::PixelFormat) {
       asked[reader].push_back(frame);
       return std::vector<uint8_t>(static_cast<std::size_t>(width) * height * 4, 255);
     };

@@ -8,11 +8,11 @@
 #include <fstream>
 #include <iterator>
 
-#include "refhost/pipeline/frame_output.h"
 #include "refhost/media/image_files.h"
 #include "refhost/media/media_source.h"
 #include "refhost/media/test_patterns.h"
 #include "refhost/media/video_reader.h"
+#include "refhost/pipeline/frame_output.h"
 #include "refhost/pipeline/video_writer.h"
 #include "support/temp_paths.h"
 
@@ -47,8 +47,8 @@ TEST(ImageFiles, StillsRoundTripExactlyAndStretchAsSources) {
   }
 
   writeImageFile(RgbaImage(2, 2, {10, 20, 30, 255}), folder.file("flat.png"), ImageFormat::Png);
-  auto source = openMediaSource(MediaSpec::ofFile(folder.file("flat.png")));
-  const RgbaImage frame = source->frame(12, 6, 4);
+  auto source = openMediaSource(MediaSpec::ofFile(folder.file("flat.png")), 25.0);
+  const RgbaImage frame = source->frame(12, 6, 4, PixelFormat::Rgba8);
   EXPECT_EQ(frame.width, 6);
   EXPECT_EQ(frame.pixel(5, 3), (Rgba8{10, 20, 30, 255}));
   EXPECT_EQ(source->frameCount(), 0);
@@ -56,7 +56,7 @@ TEST(ImageFiles, StillsRoundTripExactlyAndStretchAsSources) {
   std::ofstream(folder.file("junk.png")) << "not an image";
   for (const char* bad : {"junk.png", "missing.mp4"}) {
     try {
-      openMediaSource(MediaSpec::ofFile(folder.file(bad)));
+      openMediaSource(MediaSpec::ofFile(folder.file(bad)), 25.0);
       ADD_FAILURE() << bad << " opened";
     } catch (const std::runtime_error& error) {
       EXPECT_NE(std::string(error.what()).find(bad), std::string::npos) << error.what();
@@ -74,22 +74,23 @@ TEST(VideoFiles, DecodedFrameNShowsCounterN) {
   for (const auto& [container, name] : containers) {
     writeCounterVideo(folder.file(name), container, width, height, frames);
     VideoReader reader(folder.file(name));
-    EXPECT_EQ(reader.width(), width);
-    EXPECT_DOUBLE_EQ(reader.frameRate(), 25.0);
-    EXPECT_EQ(reader.frameCount(), frames) << name;
+    EXPECT_EQ(reader.info().width, width);
+    EXPECT_DOUBLE_EQ(reader.info().frameRate, 25.0);
+    EXPECT_DOUBLE_EQ(reader.info().duration, frames / 25.0) << name;
     // Beyond either end the nearest frame holds; the last asks for a scaled picture.
     const std::pair<int32_t, int32_t> asked[] = {{0, 0}, {1, 1}, {9, 9}, {4, 4},   {11, 11},
                                                  {5, 5}, {5, 5}, {0, 0}, {40, 11}, {-3, 0}};
     for (const auto& [index, shown] : asked)
-      EXPECT_EQ(readCounterCode(reader.frame(index, width, height)), shown) << name << " " << index;
-    EXPECT_EQ(readCounterCode(reader.frame(6, 2 * width, 2 * height)), 6) << name;
+      EXPECT_EQ(readCounterCode(reader.frameAt(index / 25.0, width, height)), shown)
+          << name << " " << index;
+    EXPECT_EQ(readCounterCode(reader.frameAt(6 / 25.0, 2 * width, 2 * height)), 6) << name;
   }
   // Odd sizes are padded to even ones.
   writeCounterVideo(folder.file("odd.mp4"), VideoContainer::Mp4, 65, 37, 1, 3);
   VideoReader reader(folder.file("odd.mp4"));
-  EXPECT_EQ(reader.width(), 66);
-  EXPECT_EQ(reader.height(), 38);
-  EXPECT_EQ(readCounterCode(reader.frame(0, 66, 38)), 3);
+  EXPECT_EQ(reader.info().width, 66);
+  EXPECT_EQ(reader.info().height, 38);
+  EXPECT_EQ(readCounterCode(reader.frameAt(0, 66, 38)), 3);
 }
 
 // A video whose index is intact but whose picture data is damaged past some point, as a copy
@@ -115,7 +116,7 @@ TEST(VideoFiles, TheFirstUndecodableFrameIsNamedWithTheFile) {
   int decoded = 0;
   std::string message;
   try {
-    for (; decoded < 30; ++decoded) reader.frame(decoded, 64, 36);
+    for (; decoded < 30; ++decoded) reader.frameAt(decoded / 25.0, 64, 36);
   } catch (const std::runtime_error& error) {
     message = error.what();
   }

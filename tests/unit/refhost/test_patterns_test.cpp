@@ -1,11 +1,11 @@
 // Generated pictures hold exactly the values they promise, the counter's code block reads
 // back the frame number, and frame sources hand GL its rows bottom first (a moving source's
 // upright frames are read back through the render context).
-#include "refhost/engine/composition.h"
 #include "refhost/media/test_patterns.h"
 
 #include <gtest/gtest.h>
 
+#include "refhost/engine/composition.h"
 #include "refhost/media/media_source.h"
 
 namespace refhost {
@@ -67,12 +67,14 @@ TEST(TestPatterns, CounterShowsItsFrameInCodeAndDigits) {
 }
 
 TEST(FrameSource, HandsGlTheBottomRowFirstAtAnySize) {
-  FrameSource source = frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient)));
-  const std::vector<uint8_t> rows = source(0, 4, 3);
+  FrameSource source =
+      frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient), 25.0));
+  const std::vector<uint8_t> rows = source(0, 4, 3, PixelFormat::Rgba8);
   ASSERT_EQ(rows.size(), 4u * 3u * 4u);
   EXPECT_EQ(rows[1], 0);                  // green of the bottom row
   EXPECT_EQ(rows[rows.size() - 3], 255);  // green of the top row
-  EXPECT_EQ(source(0, 2, 2).size(), 16u) << "a still source is not stuck at its first size";
+  EXPECT_EQ(source(0, 2, 2, PixelFormat::Rgba8).size(), 16u)
+      << "a still source is not stuck at its first size";
 }
 
 }  // namespace

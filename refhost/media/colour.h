@@ -1,0 +1,70 @@
+// A picture's colour description, as video streams carry it and video files are tagged with it:
+// the matrix from RGB to YUV, the range of its code values, its primaries and its transfer,
+// numbered as ITU-T H.273 numbers them (the numbers FFmpeg and the container tags use).
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace refhost {
+
+struct ColourDescription {
+  enum Matrix : int32_t {
+    kMatrixBt709 = 1,
+    kMatrixBt470bg = 5,
+    kMatrixSmpte170m = 6,
+    kMatrixBt2020 = 9
+  };
+  enum Primaries : int32_t {
+    kPrimariesBt709 = 1,
+    kPrimariesBt470bg = 5,
+    kPrimariesSmpte170m = 6,
+    kPrimariesBt2020 = 9
+  };
+  enum Transfer : int32_t {
+    kTransferBt709 = 1,
+    kTransferSmpte170m = 6,
+    kTransferSrgb = 13,
+    kTransferBt2020_10 = 14,
+    kTransferPq = 16,
+    kTransferHlg = 18
+  };
+
+  int32_t matrix = kMatrixBt709;
+  int32_t primaries = kPrimariesBt709;
+  int32_t transfer = kTransferBt709;
+  bool fullRange = false;
+
+  // BT.709 with limited range: HD video's, and the composition's when nothing says otherwise.
+  static ColourDescription bt709() { return {}; }
+  // BT.601 (SMPTE 170M) with limited range: standard-definition video's.
+  static ColourDescription bt601() {
+    return {kMatrixSmpte170m, kPrimariesSmpte170m, kTransferSmpte170m, false};
+  }
+  // What an untagged stream of the height is taken to be: BT.601 below 720 lines, BT.709 from
+  // 720 up, as players guess.
+  static ColourDescription guessedFor(int32_t height) { return height < 720 ? bt601() : bt709(); }
+
+  bool operator==(const ColourDescription& other) const {
+    return matrix == other.matrix && primaries == other.primaries && transfer == other.transfer &&
+           fullRange == other.fullRange;
+  }
+  bool operator!=(const ColourDescription& other) const { return !(*this == other); }
+  // A transfer for high dynamic range (PQ, HLG).
+  bool isHdr() const { return transfer == kTransferPq || transfer == kTransferHlg; }
+};
+
+// The names ffprobe shows ("bt709", "smpte170m", "bt470bg", "bt2020nc", "tv", "pc", ...); the
+// number in decimal for one without a name here.
+std::string matrixName(int32_t matrix);
+std::string primariesName(int32_t primaries);
+std::string transferName(int32_t transfer);
+inline std::string rangeName(bool fullRange) { return fullRange ? "pc" : "tv"; }
+// The number of a name above (also "bt601" for the matrix, "limited" and "full" as ranges).
+std::optional<int32_t> matrixFromName(const std::string& name);
+std::optional<int32_t> primariesFromName(const std::string& name);
+std::optional<int32_t> transferFromName(const std::string& name);
+std::optional<bool> fullRangeFromName(const std::string& name);
+
+}  // namespace refhost
