@@ -8,14 +8,16 @@ namespace refhost {
 namespace {
 
 // Frames a source decodes ahead of the render: enough to cover a slow frame, few enough that
-// four 1080p sources hold under 100 MB.
+// four 1080p sources hold under 100 MB; and never more than 40 MB a source, so that nine 4K
+// sources of half floats (66 MB a frame) wait with one frame each.
 constexpr int32_t kDecodeAhead = 3;
+constexpr std::size_t kDecodeAheadBytes = std::size_t{40} << 20;
 
 // Sources that change over time (videos, the counter) decode ahead on a worker thread each.
 std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double rate) {
   std::shared_ptr<MediaSource> source = openMediaSource(spec, rate);
   if (!source->changesOverTime()) return source;
-  return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead);
+  return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead, kDecodeAheadBytes);
 }
 
 // Another reader of the same media, opened when its first frame is asked for; a media that
@@ -34,6 +36,24 @@ std::function<FrameSource()> streamOpener(const MediaSpec& spec, double rate,
 }
 
 }  // namespace
+
+ColourDescription defaultColour(const MediaSpec& source) {
+  if (source.kind == MediaSpec::Kind::File && isVideoPath(source.path) && source.info)
+    return source.info->colour;
+  return ColourDescription::bt709();
+}
+
+int32_t deepestInput(const Composition& composition) {
+  int32_t deepest = composition.source.info ? composition.source.info->bitDepth : 8;
+  for (const CompositionLayer& layer : composition.layers)
+    if (layer.media.info) deepest = std::max(deepest, layer.media.info->bitDepth);
+  return deepest;
+}
+
+PixelFormat frameFormatFor(const Composition& composition, int32_t outputBitDepth) {
+  return deepestInput(composition) > 8 || outputBitDepth > 8 ? PixelFormat::RgbaHalf
+                                                             : PixelFormat::Rgba8;
+}
 
 FrameSource frameSourceOf(std::shared_ptr<MediaSource> source) {
   struct Kept {
@@ -54,7 +74,8 @@ FrameSource frameSourceOf(std::shared_ptr<MediaSource> source) {
 
 const char* const kDefaultOwnLayerGuid = "5ec0a11e-0000-4000-8000-000000000001";
 
-InstalledComposition installComposition(Engine& engine, const Composition& composition) {
+InstalledComposition installComposition(Engine& engine, const Composition& composition,
+                                        PixelFormat format) {
   InstalledComposition installed;
   const double rate = composition.frameRate;
   installed.source = opened(composition.source, rate);
@@ -67,6 +88,7 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
   settings.pixelAspect = composition.pixelAspect;
   settings.sourceFrameCount = installed.sourceFrameCount;
   settings.ownLayerGuid = composition.ownLayerGuid;
+  settings.format = format;
   engine.setFrameSettings(settings);
   const std::function<FrameSource()> sourceStreams =
       streamOpener(composition.source, rate, installed.source);

@@ -34,7 +34,21 @@ struct Composition {
   std::string ownLayerName = "Split Screen";
   MediaSpec source;  // the effect's own input
   std::vector<CompositionLayer> layers;
+  // What a video output is converted to and tagged with.
+  ColourDescription colour = ColourDescription::bt709();
 };
+
+// The composition's colour when a document does not choose one: the effect's own source's when
+// that is a video, else BT.709 with limited range. Needs the source's info (see MediaSpec).
+ColourDescription defaultColour(const MediaSpec& source);
+
+// The most bits a channel of any of the composition's media holds (8 for generated pictures
+// and for media not yet opened).
+int32_t deepestInput(const Composition& composition);
+
+// How the frames of a render are stored: half floats when an input or the output
+// (`outputBitDepth`) holds more than 8 bits a channel, else 8 bits.
+PixelFormat frameFormatFor(const Composition& composition, int32_t outputBitDepth);
 
 // What the host now holds that render contexts need.
 struct InstalledComposition {
@@ -51,6 +65,8 @@ FrameSource frameSourceOf(std::shared_ptr<MediaSource> source);
 // layer first (kind 0, frames 0 to duration - 1, the composition's size, identity placement)
 // and then the other layers in order, and feeds the own source and each layer from its media.
 // Throws std::runtime_error naming the file when a media file cannot be opened.
-InstalledComposition installComposition(Engine& engine, const Composition& composition);
+// The frames are stored in `format` (see frameFormatFor).
+InstalledComposition installComposition(Engine& engine, const Composition& composition,
+                                        PixelFormat format = PixelFormat::Rgba8);
 
 }  // namespace refhost

@@ -16,6 +16,25 @@ bool finished(GLsync fence) {
   return state == GL_ALREADY_SIGNALED || state == GL_CONDITION_SATISFIED;
 }
 
+// The storage a texture of the key takes, near enough: 16 bytes a texel for 32-bit float
+// formats, 8 for 16-bit ones, 4 for the rest.
+std::size_t bytesOf(const TextureKey& key) {
+  std::size_t texel = 4;
+  switch (key.internalFormat) {
+    case GL_RGBA32F:
+      texel = 16;
+      break;
+    case GL_RGBA16F:
+    case GL_RGBA16:
+      texel = 8;
+      break;
+    default:
+      break;
+  }
+  return static_cast<std::size_t>(std::max(key.width, 0)) *
+         static_cast<std::size_t>(std::max(key.height, 0)) * texel;
+}
+
 void forget(GLuint id, GLsync fence) {
   if (fence) glDeleteSync(fence);
   glDeleteTextures(1, &id);
@@ -44,6 +63,7 @@ uint32_t TexturePool::reuse(std::deque<Waiting>& waiting, bool forUpload) {
 uint32_t TexturePool::acquire(const TextureKey& key, bool forUpload) {
   auto found = waiting_.find(key);
   GLuint id = found == waiting_.end() ? 0 : reuse(found->second, forUpload);
+  if (id != 0) waitingBytes_ -= bytesOf(key);
   GLint previous = 0;
   glGetIntegerv(GL_TEXTURE_BINDING_2D, &previous);
   if (id == 0) {
@@ -69,13 +89,21 @@ uint32_t TexturePool::acquire(const TextureKey& key, bool forUpload) {
 bool TexturePool::giveBack(uint32_t id) {
   auto found = handedOut_.find(id);
   if (found == handedOut_.end()) return false;
-  std::deque<Waiting>& waiting = waiting_[found->second];
+  const TextureKey key = found->second;
+  const std::size_t bytes = bytesOf(key);
+  std::deque<Waiting>& waiting = waiting_[key];
   handedOut_.erase(found);
   if (waiting.size() >= kKeptPerKey) {
     forget(waiting.front().id, static_cast<GLsync>(waiting.front().fence));
     waiting.pop_front();
+    waitingBytes_ -= bytes;
+  }
+  if (waitingBytes_ + bytes > kKeptBytes) {
+    forget(id, nullptr);
+    return true;
   }
   waiting.push_back(Waiting{id, glFenceSync(GL_SYNC_GPU_COMMANDS_COMPLETE, 0)});
+  waitingBytes_ += bytes;
   return true;
 }
 
@@ -86,6 +114,7 @@ void TexturePool::clear() {
   }
   waiting_.clear();
   handedOut_.clear();
+  waitingBytes_ = 0;
 }
 
 std::size_t TexturePool::waiting() const {

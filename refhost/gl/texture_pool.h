@@ -28,6 +28,9 @@ class TexturePool {
   // At most this many textures of one key wait for reuse; more given back are deleted. A
   // render with two frames in flight, each with a few inputs, needs about this many.
   static constexpr std::size_t kKeptPerKey = 8;
+  // And the textures waiting hold at most this many bytes in all: at 4K in half floats
+  // (66 MB a texture) eight of them would already be half a gigabyte.
+  static constexpr std::size_t kKeptBytes = std::size_t{384} << 20;
 
   TexturePool() = default;
   ~TexturePool();  // deletes nothing: GL may be gone by then; call clear() while it is not
@@ -58,6 +61,7 @@ class TexturePool {
 
   std::map<TextureKey, std::deque<Waiting>> waiting_;
   std::map<uint32_t, TextureKey> handedOut_;
+  std::size_t waitingBytes_ = 0;
   std::size_t created_ = 0;
 };
 

@@ -6,6 +6,7 @@
 #include <array>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -14,18 +15,6 @@
 #include "refhost/media/test_patterns.h"
 
 namespace refhost {
-
-struct MediaSpec {
-  enum class Kind { Pattern, Colour, File };
-  Kind kind = Kind::Pattern;
-  Pattern pattern = Pattern::Counter;
-  std::array<float, 4> colour{0, 0, 0, 1};  // red, green, blue, alpha from 0 to 1
-  std::string path;                         // a file, as open() will find it
-
-  static MediaSpec ofPattern(Pattern pattern);
-  static MediaSpec ofColour(const std::array<float, 4>& rgba);
-  static MediaSpec ofFile(const std::string& path);
-};
 
 // What a media holds, as far as a composition cares.
 struct MediaInfo {
@@ -40,6 +29,21 @@ struct MediaInfo {
   double frameRate = 0;  // the media's own (average) rate; 0 for a still or a pattern
   double duration = 0;   // seconds; 0 for what has no end (stills, patterns)
   bool hasAudio = false;
+};
+
+struct MediaSpec {
+  enum class Kind { Pattern, Colour, File };
+  Kind kind = Kind::Pattern;
+  Pattern pattern = Pattern::Counter;
+  std::array<float, 4> colour{0, 0, 0, 1};  // red, green, blue, alpha from 0 to 1
+  std::string path;                         // a file, as open() will find it
+  // What the media turned out to hold when it was first opened (a scene's media are opened
+  // as the scene is read); empty until then.
+  std::optional<MediaInfo> info;
+
+  static MediaSpec ofPattern(Pattern pattern);
+  static MediaSpec ofColour(const std::array<float, 4>& rgba);
+  static MediaSpec ofFile(const std::string& path);
 };
 
 class MediaSource {

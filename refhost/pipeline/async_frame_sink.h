@@ -1,10 +1,11 @@
 // A frame sink that writes behind the caller's back: frames wait in a queue bounded in frames
-// and worker threads hand them to the sink underneath, so encoding or image writing overlaps
-// the render of the frames after them.
+// and in bytes, and worker threads hand them to the sink underneath, so encoding or image writing
+// overlaps the render of the frames after them.
 #pragma once
 
 #include <condition_variable>
 #include <cstddef>
+#include <cstdint>
 #include <deque>
 #include <exception>
 #include <memory>
@@ -19,8 +20,10 @@ namespace refhost {
 class AsyncFrameSink : public FrameSink {
  public:
   // `workers` threads write (one when the sink underneath cannot take concurrent writes);
-  // write() blocks while `queueFrames` frames wait.
-  AsyncFrameSink(std::unique_ptr<FrameSink> inner, int workers, std::size_t queueFrames);
+  // write() blocks while `queueFrames` frames wait, or while the waiting frames and the new one
+  // would hold more than `queueBytes` (one frame may always wait).
+  AsyncFrameSink(std::unique_ptr<FrameSink> inner, int workers, std::size_t queueFrames,
+                 std::size_t queueBytes = SIZE_MAX);
   // Stops the workers, dropping what waits, then lets the sink underneath delete what it wrote.
   ~AsyncFrameSink() override;
   AsyncFrameSink(const AsyncFrameSink&) = delete;
@@ -47,6 +50,8 @@ class AsyncFrameSink : public FrameSink {
 
   std::unique_ptr<FrameSink> inner_;
   const std::size_t capacity_;
+  const std::size_t capacityBytes_;
+  std::size_t queuedBytes_ = 0;
   std::mutex mutex_;
   std::condition_variable changed_;
   std::deque<Job> queue_;

@@ -5,9 +5,11 @@
 
 namespace refhost {
 
-PrefetchingSource::PrefetchingSource(std::shared_ptr<MediaSource> inner, int32_t depth)
+PrefetchingSource::PrefetchingSource(std::shared_ptr<MediaSource> inner, int32_t depth,
+                                     std::size_t budgetBytes)
     : inner_(std::move(inner)),
       depth_(std::max(depth, 1)),
+      budgetBytes_(budgetBytes),
       frameCount_(inner_->frameCount()),
       info_(inner_->info()),
       worker_([this] { work(); }) {}
@@ -25,7 +27,8 @@ void PrefetchingSource::work() {
   std::unique_lock<std::mutex> lock(mutex_);
   for (;;) {
     changed_.wait(lock, [this] {
-      return stopping_ || (running_ && !failed_ && ready_.size() < static_cast<size_t>(depth_));
+      return stopping_ ||
+             (running_ && !failed_ && ready_.size() < static_cast<size_t>(waitingLimit()));
     });
     if (stopping_) return;
     const int32_t index = next_++;
@@ -62,6 +65,14 @@ bool PrefetchingSource::onCourse(int32_t index, int32_t width, int32_t height,
   int32_t lowest = preparing_.value_or(next_);
   if (!ready_.empty()) lowest = std::min(lowest, ready_.begin()->first);
   return index >= lowest && index < next_ + depth_;
+}
+
+int32_t PrefetchingSource::waitingLimit() const {
+  const std::size_t frameBytes = static_cast<std::size_t>(std::max(width_, 1)) *
+                                 static_cast<std::size_t>(std::max(height_, 1)) *
+                                 bytesPerPixel(format_);
+  const std::size_t fitting = std::max<std::size_t>(budgetBytes_ / frameBytes, 1);
+  return static_cast<int32_t>(std::min<std::size_t>(fitting, static_cast<std::size_t>(depth_)));
 }
 
 void PrefetchingSource::restart(int32_t index, int32_t width, int32_t height, PixelFormat format) {

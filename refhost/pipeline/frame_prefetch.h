@@ -3,6 +3,7 @@
 #pragma once
 
 #include <condition_variable>
+#include <cstddef>
 #include <cstdint>
 #include <exception>
 #include <map>
@@ -20,11 +21,13 @@ namespace refhost {
 // alone. Frames come out exactly as the wrapped source gives them, and a frame the wrapped
 // source fails on throws the same error when it is asked for (never earlier, so a failure past
 // the frames a render needs goes unnoticed, as it would without the worker). A request behind
-// or far ahead of the worker starts it over there. At most `depth` frames wait, plus the one
+// or far ahead of the worker starts it over there. At most `depth` frames wait, and no more
+// than fit in `budgetBytes` (but always one), plus the one
 // being prepared.
 class PrefetchingSource : public MediaSource {
  public:
-  PrefetchingSource(std::shared_ptr<MediaSource> inner, int32_t depth);
+  PrefetchingSource(std::shared_ptr<MediaSource> inner, int32_t depth,
+                    std::size_t budgetBytes = SIZE_MAX);
   ~PrefetchingSource() override;
   PrefetchingSource(const PrefetchingSource&) = delete;
   PrefetchingSource& operator=(const PrefetchingSource&) = delete;
@@ -48,7 +51,11 @@ class PrefetchingSource : public MediaSource {
   void restart(int32_t index, int32_t width, int32_t height, PixelFormat format);
 
   std::shared_ptr<MediaSource> inner_;
+  // Frames that may wait for pictures of the size and format asked last.
+  int32_t waitingLimit() const;
+
   const int32_t depth_;
+  const std::size_t budgetBytes_;
   const int32_t frameCount_;
   const MediaInfo info_;
 

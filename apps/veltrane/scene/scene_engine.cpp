@@ -40,7 +40,8 @@ std::unique_ptr<refhost::Engine> startScene(const Scene& scene, SceneEngineOptio
     std::fprintf(stderr, "veltrane: host: %s\n", problem.c_str());
   };
   auto engine = std::make_unique<refhost::Engine>(std::move(engineOptions));
-  refhost::installComposition(*engine, scene.composition);
+  refhost::installComposition(*engine, scene.composition,
+                              refhost::frameFormatFor(scene.composition, options.outputBitDepth));
   engine->start();
   // The values are checked against the declared panel before the instance exists, so a bad
   // scene stops before any GL work.

@@ -20,6 +20,9 @@ struct SceneEngineOptions {
   int32_t hostId = 0;
   // A window's context to draw in, or null for the engine's own.
   std::unique_ptr<refhost::GlContext> context;
+  // Bits a channel of the output: above 8, the frames are kept in half floats (as they are
+  // when an input holds more than 8).
+  int32_t outputBitDepth = 8;
   // Told about every message and the plug-in's calls during it (see refhost::EngineOptions).
   std::function<void(int32_t, int32_t, const std::vector<std::string>&)> onMessage;
 };

@@ -1,4 +1,5 @@
 // Reading scene files: the composition and the parameter values as written.
+#include <algorithm>
 #include <cctype>
 #include <filesystem>
 
@@ -62,11 +63,53 @@ MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
               problem + ")");
   MediaSpec spec = MediaSpec::ofFile(path.lexically_normal().string());
   try {
-    refhost::openMediaSource(spec, 25.0);  // any rate: only its opening is checked here
+    // Opened once to prove it decodes, and to learn what the composition needs to know of it.
+    spec.info = refhost::openMediaSource(spec, 25.0)->info();
   } catch (const std::exception& error) {
     file.fail(std::string("a file that decodes (") + error.what() + ")");
   }
   return spec;
+}
+
+// The colour a video output is converted to and tagged with: a name ("bt709", "bt601") or an
+// object naming any of matrix, range, primaries and transfer; what it leaves out stays as
+// `fallback` (the own source's, or BT.709 limited).
+refhost::ColourDescription readColourSpace(const JsonField& field,
+                                           refhost::ColourDescription fallback) {
+  if (!field.present()) return fallback;
+  const char* named =
+      "\"bt709\", \"bt601\", or {\"matrix\", \"range\", \"primaries\", \"transfer\"}";
+  if (field.isString()) {
+    const std::string name = field.string(named);
+    if (name == "bt709") return refhost::ColourDescription::bt709();
+    if (name == "bt601") return refhost::ColourDescription::bt601();
+    field.fail(named);
+  }
+  if (!field.json().is_object()) field.fail(named);
+  field.requireObject({"matrix", "range", "primaries", "transfer"});
+  auto choose = [&](const char* member, const std::vector<std::string>& names, auto fromName,
+                    int32_t& into) {
+    JsonField value = field.member(member);
+    if (!value.present()) return;
+    std::string list;
+    for (const std::string& name : names) list += (list.empty() ? "\"" : ", \"") + name + "\"";
+    const std::string name = value.string("one of " + list);
+    if (std::find(names.begin(), names.end(), name) == names.end()) value.fail("one of " + list);
+    into = *fromName(name);
+  };
+  refhost::ColourDescription colour = fallback;
+  choose("matrix", {"bt709", "bt601", "smpte170m", "bt470bg"}, refhost::matrixFromName,
+         colour.matrix);
+  choose("primaries", {"bt709", "smpte170m", "bt470bg"}, refhost::primariesFromName,
+         colour.primaries);
+  choose("transfer", {"bt709", "smpte170m", "srgb", "iec61966-2-1"}, refhost::transferFromName,
+         colour.transfer);
+  if (JsonField range = field.member("range"); range.present()) {
+    const std::string name = range.string("\"limited\" or \"full\"");
+    if (name != "limited" && name != "full") range.fail("\"limited\" or \"full\"");
+    colour.fullRange = name == "full";
+  }
+  return colour;
 }
 
 std::string readGuid(const JsonField& field) {
@@ -136,7 +179,7 @@ Scene sceneFromJson(const nlohmann::ordered_json& document, const std::string& f
   scene.document = document;
   JsonField top(document, scene.file);
   top.requireObject({"$schema", "description", "width", "height", "fps", "duration", "pixelAspect",
-                     "ownLayer", "source", "layers", "params"});
+                     "colorSpace", "ownLayer", "source", "layers", "params"});
   refhost::Composition& composition = scene.composition;
   composition.width = top.member("width").integerIn(1, kLargestFrameSide);
   composition.height = top.member("height").integerIn(1, kLargestFrameSide);
@@ -151,6 +194,8 @@ Scene sceneFromJson(const nlohmann::ordered_json& document, const std::string& f
       composition.ownLayerName = own.member("name").string("the own layer's name (text)");
   }
   composition.source = readSource(top.member("source"), baseDirectory);
+  composition.colour =
+      readColourSpace(top.member("colorSpace"), refhost::defaultColour(composition.source));
 
   std::set<std::string> guids{composition.ownLayerGuid};
   if (JsonField layers = top.member("layers"); layers.present()) {
