@@ -7,7 +7,7 @@
 #include <cmath>
 #include <cstdio>
 
-#include "viewer/layout_presets.h"
+#include "layouts/layouts.h"
 #include "viewer/viewer_panel.h"
 
 namespace veltrane_viewer {
@@ -42,10 +42,12 @@ void menuBar(ViewerSession& session, ViewerActions& actions, ChromeLayout& layou
     ImGui::EndMenu();
   }
   if (ImGui::BeginMenu("Presets")) {
-    const std::vector<LayoutPreset>& presets = layoutPresets();
+    const std::vector<veltrane_cli::LayoutInfo>& presets = veltrane_cli::layouts();
     for (std::size_t i = 0; i < presets.size(); ++i) {
-      if (ImGui::MenuItem(presets[i].name)) actions.preset = static_cast<int>(i);
+      if (ImGui::MenuItem(presets[i].menuName)) actions.preset = static_cast<int>(i);
     }
+    ImGui::Separator();
+    actions.fitPictures = ImGui::MenuItem("Fit pictures to regions") || actions.fitPictures;
     ImGui::EndMenu();
   }
   ImGui::EndMainMenuBar();

@@ -20,7 +20,8 @@ struct ViewerActions {
   bool undo = false;
   bool redo = false;
   bool togglePlay = false;
-  int preset = -1;     // index into layoutPresets()
+  int preset = -1;  // index into veltrane_cli::layouts()
+  bool fitPictures = false;
   int undoSteps = 0;   // how many steps the history list asked to undo
   int redoSteps = 0;   // or to redo
   int32_t frame = -1;  // the frame the timeline moved to

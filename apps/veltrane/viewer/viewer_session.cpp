@@ -7,8 +7,8 @@
 #include <filesystem>
 #include <stdexcept>
 
+#include "layouts/layouts.h"
 #include "scene/scene_engine.h"
-#include "viewer/layout_presets.h"
 #include "viewer/panel_values.h"
 
 namespace veltrane_viewer {
@@ -128,23 +128,58 @@ void ViewerSession::toggleKey(const std::string& id) {
   engine_->endEdit();
 }
 
-void ViewerSession::applyPreset(std::size_t index) {
+void ViewerSession::applyEdits(const std::string& stepName,
+                               const std::vector<veltrane_cli::ParamEdit>& edits) {
   finishEdit();
-  std::vector<std::string> sources{refhost::kNoLayer};
-  for (const refhost::CompositionLayer& layer : scene_.composition.layers)
-    sources.push_back(layer.layer.guid);
-  const refhost::Composition& composition = scene_.composition;
-  std::vector<ParamEdit> edits = presetEdits(index, composition.width, composition.height, sources);
-  engine_->beginEdit(std::string("Preset ") + layoutPresets().at(index).name);
-  attempt("the preset", [&] {
-    for (const ParamEdit& edit : edits) {
-      refhost::ParamState state;  // a preset's values hold at every frame
+  engine_->beginEdit(stepName);
+  attempt(stepName, [&] {
+    for (const veltrane_cli::ParamEdit& edit : edits) {
+      refhost::ParamState state;  // these values hold at every frame
       state.value = edit.value;
-      engine_->host().editState(edit.id, state);
+      if (!(engine_->param(edit.id).state == state)) engine_->host().editState(edit.id, state);
     }
     engine_->reportChanges();
   });
   engine_->endEdit();
+}
+
+void ViewerSession::applyPreset(std::size_t index) {
+  std::vector<std::string> sources{refhost::kNoLayer};
+  for (const refhost::CompositionLayer& layer : scene_.composition.layers)
+    sources.push_back(layer.layer.guid);
+  const refhost::Composition& composition = scene_.composition;
+  const veltrane_cli::LayoutPlan plan =
+      veltrane_cli::planLayout(index, composition.width, composition.height);
+  applyEdits(std::string("Preset ") + veltrane_cli::layouts().at(index).menuName,
+             veltrane_cli::layoutEdits(plan, composition.width, composition.height, sources));
+}
+
+void ViewerSession::fitPicturesToRegions() {
+  const refhost::Composition& composition = scene_.composition;
+  veltrane_cli::LayoutPlan plan;
+  plan.radial = engine_->valueAt("cutType", frame_).integer == 1;
+  const refhost::ParamValue centre = engine_->valueAt("cutPosition_global", frame_);
+  plan.centre = {centre.number[0], centre.number[1]};
+  const int32_t cuts = std::clamp(engine_->valueAt("numberOfCuts", frame_).integer, 0, 8);
+  for (int32_t i = 0; i < cuts; ++i) {
+    const refhost::ParamValue at = engine_->valueAt("cutPosition_" + std::to_string(i), frame_);
+    const float degrees = engine_->valueAt("cutDirection_" + std::to_string(i), frame_).number[0];
+    plan.cuts.push_back({at.number[0], at.number[1], degrees});
+  }
+  std::vector<veltrane_cli::ParamEdit> edits;
+  for (const veltrane_cli::RegionShape& region :
+       veltrane_cli::planRegions(plan, composition.width, composition.height)) {
+    const veltrane_cli::Framing framing = veltrane_cli::frameOnRegion(
+        region, {double(composition.width), double(composition.height)});
+    const std::string n = std::to_string(region.input);
+    edits.push_back({"inputFrameTranslation" + n,
+                     refhost::ParamValue::ofPoint(static_cast<float>(framing.translation[0]),
+                                                  static_cast<float>(framing.translation[1]))});
+    edits.push_back(
+        {"inputFrameScale" + n, refhost::ParamValue::ofFloat(static_cast<float>(framing.scale))});
+    edits.push_back({"inputFrameRotation" + n, refhost::ParamValue::ofFloat(0)});
+  }
+  applyEdits("Fit pictures to regions", edits);
 }
 
 bool ViewerSession::undo() {

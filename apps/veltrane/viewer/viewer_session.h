@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "layouts/layouts.h"
 #include "refhost/engine.h"
 #include "scene/scene_document.h"
 #include "viewer/view_mapping.h"
@@ -63,7 +64,10 @@ class ViewerSession {
   void editValue(const std::string& id, const refhost::ParamValue& value);
   void finishEdit();
   void toggleKey(const std::string& id);
+  // A layout of veltrane_cli::layouts(), each picture framed on its region: one undo step.
   void applyPreset(std::size_t index);
+  // Each shown input's picture framed on its region as the cuts now stand: one undo step.
+  void fitPicturesToRegions();
   bool undo();
   bool redo();
 
@@ -99,6 +103,8 @@ class ViewerSession {
  private:
   template <typename Action>
   void attempt(const std::string& what, Action&& action);
+  // The edits as one undo step of the name, each parameter that changes reported.
+  void applyEdits(const std::string& stepName, const std::vector<veltrane_cli::ParamEdit>& edits);
   // Runs a viewer event; a failure becomes the status, and any change asks for a new render.
   template <typename Event>
   refhost::ViewerOutcome event(const std::string& what, Event&& run);

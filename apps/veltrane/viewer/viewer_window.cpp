@@ -420,12 +420,13 @@ void ViewerWindow::handleActions(const ViewerActions& actions) {
   if (actions.redo) session_->redo();
   if (actions.togglePlay) setPlaying(!playing_);
   if (actions.preset >= 0) session_->applyPreset(static_cast<std::size_t>(actions.preset));
+  if (actions.fitPictures) session_->fitPicturesToRegions();
   for (int i = 0; i < actions.undoSteps; ++i) session_->undo();
   for (int i = 0; i < actions.redoSteps; ++i) session_->redo();
   if (actions.frame >= 0) stepTo(actions.frame);
   acted = actions.save || actions.fit || actions.actualPixels || actions.undo || actions.redo ||
-          actions.togglePlay || actions.preset >= 0 || actions.undoSteps || actions.redoSteps ||
-          actions.frame >= 0;
+          actions.togglePlay || actions.preset >= 0 || actions.fitPictures || actions.undoSteps ||
+          actions.redoSteps || actions.frame >= 0;
   if (acted) want(1);
 }
 

@@ -1,0 +1,82 @@
+// The layouts people ask a split screen for (diagonals, slanted columns, a comic panel, grids,
+// radial sectors, a picture in a corner), as the cuts that make them for a frame size, and as
+// the parameter values that show one picture in each region, each picture framed on its own
+// region. The viewer's Presets menu, `veltrane split` and the tests share them.
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "layouts/region_map.h"
+#include "refhost/core/params.h"
+
+namespace veltrane_cli {
+
+struct LayoutInfo {
+  const char* name;      // as `--layout` and the example scenes name it: "diagonal-2"
+  const char* menuName;  // as the Presets menu lists it: "2-way diagonal"
+  int32_t regions;       // pictures it shows
+  bool takesGap;         // its cuts run side by side, so `gap` moves them apart
+  bool radial;
+};
+
+// Every layout, in the Presets menu's order.
+const std::vector<LayoutInfo>& layouts();
+std::optional<std::size_t> findLayout(const std::string& name);
+// "diagonal-2, vertical-2, ...": for messages.
+std::string layoutNames();
+// The layout a split of `inputs` pictures takes when none is named: diagonal-2 for 1 or 2,
+// comic-3 for 3, grid-2x2 for 4, radial-N for 5 to 8, grid-3x3 for 9.
+std::string defaultLayoutFor(int32_t inputs);
+
+struct LayoutOptions {
+  double angle = 0;                   // degrees the cuts are turned by (about the frame's centre)
+  std::optional<double> gap;          // pixels between side-by-side cuts
+  std::optional<Point> radialCentre;  // frame space (origin at the centre, y up)
+};
+
+// A layout for a frame: its cuts, and its regions' inputs in the order pictures fill them.
+struct LayoutPlan {
+  bool radial = false;
+  Point centre{0, 0};  // the Radial cuts' shared centre
+  std::vector<CutLine> cuts;
+  std::vector<int32_t> inputs;
+};
+
+// Throws std::invalid_argument saying what is wrong: a gap for a layout whose cuts do not run
+// side by side, or one that leaves no room; a radial centre for a layout of lines.
+LayoutPlan planLayout(std::size_t index, double width, double height,
+                      const LayoutOptions& options = {});
+
+struct ParamEdit {
+  std::string id;
+  refhost::ParamValue value;
+};
+
+// Where each input's picture goes: its centre on the centroid of its region, scaled without
+// stretching to the smallest size that covers the whole region. `pictureSize` is the size of
+// the picture's content at scale 100 in frame pixels (the frame's size for a picture that fills
+// it; less along one side for a picture kept at its own proportions). Inputs whose region is
+// empty keep the frame placement.
+struct Framing {
+  Point translation{0, 0};  // frame pixels
+  double scale = 100;       // percent
+};
+Framing frameOnRegion(const RegionShape& region, Point pictureSize);
+
+// Every cut and input parameter of the plan (unused cuts and inputs back to their defaults).
+// The inputs the plan shows take `sources` in turn (a layer GUID each, the null GUID for the
+// effect's own input), cycling when there are fewer. Each shown input is framed on its region
+// for its picture's content size (`pictureSizes`, one per source; missing ones fill the frame).
+std::vector<ParamEdit> layoutEdits(const LayoutPlan& plan, double width, double height,
+                                   const std::vector<std::string>& sources,
+                                   const std::vector<Point>& pictureSizes = {});
+
+// The regions of a plan as the effect divides the frame.
+std::vector<RegionShape> planRegions(const LayoutPlan& plan, double width, double height);
+
+}  // namespace veltrane_cli

@@ -1,0 +1,158 @@
+// The split layouts: every layout's regions as the host works them out agree with the regions
+// the effect draws (each input's picture centre lies in its own region, and each region takes
+// its share of the frame), the framing is the smallest that covers each region, and the
+// choices people make of layouts are checked.
+#include "layouts/layouts.h"
+
+#include <gtest/gtest.h>
+
+#include <map>
+
+#include "refhost/engine.h"
+#include "refhost/pipeline/frame_readback.h"
+#include "scene/scene_document.h"
+#include "scene/scene_engine.h"
+
+namespace veltrane_cli {
+namespace {
+
+constexpr int32_t kWidth = 320;
+constexpr int32_t kHeight = 180;
+
+std::string layerGuid(int input) {
+  return "1a000000-0000-4000-8000-00000000000" + std::to_string(input + 1);
+}
+
+// Layer j is a solid colour of its own: red 20 * (j + 1).
+uint8_t redOf(int input) { return static_cast<uint8_t>(20 * (input + 1)); }
+
+// The module with nine solid layers, one per input, and no border.
+std::unique_ptr<refhost::Engine> solidLayers() {
+  refhost::EngineOptions options;
+  options.modulePath = VELTRANE_MODULE_PATH;
+  auto engine = std::make_unique<refhost::Engine>(std::move(options));
+  engine->setFrameSettings({kWidth, kHeight, 25.0, 1.0f, 1, ""});
+  for (int j = 0; j < 9; ++j) {
+    refhost::Layer layer;
+    layer.guid = layerGuid(j);
+    layer.name = "Input " + std::to_string(j);
+    layer.width = kWidth;
+    layer.height = kHeight;
+    layer.source = [j](int32_t, int32_t width, int32_t height, refhost::PixelFormat) {
+      std::vector<uint8_t> rows(static_cast<std::size_t>(width) * height * 4, 0);
+      for (std::size_t i = 0; i < rows.size(); i += 4) {
+        rows[i] = redOf(j);
+        rows[i + 3] = 255;
+      }
+      return rows;
+    };
+    engine->addLayer(layer);
+  }
+  engine->start();
+  engine->createInstance();
+  engine->setParam("borderWidth", refhost::ParamValue::ofFloat(0));
+  return engine;
+}
+
+refhost::RgbaImage rendered(refhost::Engine& engine, const std::vector<ParamEdit>& edits) {
+  for (const ParamEdit& edit : edits) engine.setParam(edit.id, edit.value);
+  std::unique_ptr<refhost::RenderFrame> frame = engine.render(0);
+  return refhost::readBack(frame->context().output.id, kWidth, kHeight);
+}
+
+// The pixel under a frame-space point (y up; the picture's first row is the top).
+refhost::Rgba8 at(const refhost::RgbaImage& picture, Point p) {
+  const int x = std::clamp(static_cast<int>(p[0] + kWidth / 2.0), 0, kWidth - 1);
+  const int y = std::clamp(static_cast<int>(kHeight / 2.0 - p[1]), 0, kHeight - 1);
+  return picture.pixel(x, y);
+}
+
+TEST(Layouts, TheHostsRegionsAreTheEffectsAndEachPictureSitsOnItsOwn) {
+  std::unique_ptr<refhost::Engine> engine = solidLayers();
+  std::vector<std::string> sources;
+  for (int j = 0; j < 9; ++j) sources.push_back(layerGuid(j));
+  for (std::size_t index = 0; index < layouts().size(); ++index) {
+    const LayoutInfo& layout = layouts()[index];
+    SCOPED_TRACE(layout.name);
+    const LayoutPlan plan = planLayout(index, kWidth, kHeight);
+    const std::vector<RegionShape> regions = planRegions(plan, kWidth, kHeight);
+    ASSERT_EQ(regions.size(), static_cast<std::size_t>(layout.regions));
+    const refhost::RgbaImage picture =
+        rendered(*engine, layoutEdits(plan, kWidth, kHeight, sources));
+
+    // The pictures fill the regions in the plan's order: the k-th shown input takes layer k.
+    std::map<int32_t, uint8_t> shows;
+    for (std::size_t k = 0; k < plan.inputs.size(); ++k)
+      shows[plan.inputs[k]] = redOf(static_cast<int>(k));
+    std::map<uint8_t, int> counted;  // pixels by red value
+    for (int y = 0; y < kHeight; ++y)
+      for (int x = 0; x < kWidth; ++x) ++counted[picture.pixel(x, y)[0]];
+    double total = 0;
+    for (const RegionShape& region : regions) {
+      total += region.area;
+      // The region's input shows at its centroid, where its picture is centred...
+      EXPECT_EQ(at(picture, region.centroid)[0], shows[region.input]) << "input " << region.input;
+      // ... and covers the region's share of the frame, to within its edges' pixels.
+      const double share = region.area / (kWidth * kHeight);
+      EXPECT_NEAR(counted[shows[region.input]] / double(kWidth * kHeight), share, 0.012)
+          << "input " << region.input;
+    }
+    EXPECT_NEAR(total, double(kWidth) * kHeight, 1e-6) << "the regions tile the frame";
+    EXPECT_EQ(counted[0], 0) << "no pixel is left uncovered";
+  }
+}
+
+// The framing is the smallest that covers: the same pictures 3 % smaller leave part of a region
+// uncovered (transparent black) in every layout but those whose pictures fill the frame anyway.
+TEST(Layouts, FramingIsTheSmallestScaleThatCoversTheRegion) {
+  std::unique_ptr<refhost::Engine> engine = solidLayers();
+  std::vector<std::string> sources;
+  for (int j = 0; j < 9; ++j) sources.push_back(layerGuid(j));
+  for (const char* name : {"diagonal-2", "comic-3", "z-3", "grid-3x3", "radial-5"}) {
+    SCOPED_TRACE(name);
+    const LayoutPlan plan = planLayout(*findLayout(name), kWidth, kHeight);
+    std::vector<ParamEdit> edits = layoutEdits(plan, kWidth, kHeight, sources);
+    for (ParamEdit& edit : edits)
+      if (edit.id.rfind("inputFrameScale", 0) == 0) edit.value.number[0] *= 0.97f;
+    const refhost::RgbaImage picture = rendered(*engine, edits);
+    int uncovered = 0;
+    for (int y = 0; y < kHeight; ++y)
+      for (int x = 0; x < kWidth; ++x) uncovered += picture.pixel(x, y)[3] == 0 ? 1 : 0;
+    EXPECT_GT(uncovered, 0);
+  }
+  // A picture narrower than the frame (its own proportions kept) is scaled up to cover as well.
+  const LayoutPlan halves = planLayout(*findLayout("vertical-2"), kWidth, kHeight);
+  const RegionShape left = planRegions(halves, kWidth, kHeight).back();
+  const Framing framing = frameOnRegion(left, {kHeight * 9.0 / 16, kHeight});  // portrait
+  EXPECT_NEAR(framing.translation[0], -kWidth / 4.0, 1e-9);
+  EXPECT_NEAR(framing.scale, 100.0 * (kWidth / 2.0) / (kHeight * 9.0 / 16), 1e-9);
+}
+
+TEST(Layouts, NamesOptionsAndRefusals) {
+  const std::pair<int, const char*> defaults[] = {
+      {1, "diagonal-2"}, {2, "diagonal-2"}, {3, "comic-3"}, {4, "grid-2x2"},
+      {5, "radial-5"},   {8, "radial-8"},   {9, "grid-3x3"}};
+  for (const auto& [inputs, name] : defaults) {
+    EXPECT_EQ(defaultLayoutFor(inputs), name) << inputs;
+    EXPECT_TRUE(findLayout(name)) << name;
+  }
+  EXPECT_FALSE(findLayout("diagonal"));
+  EXPECT_THROW(planLayout(*findLayout("diagonal-2"), 320, 180, {0, 20.0, std::nullopt}),
+               std::invalid_argument);
+  EXPECT_THROW(planLayout(*findLayout("slanted-4"), 320, 180, {0, 200.0, std::nullopt}),
+               std::invalid_argument);  // three columns of 200 do not fit across 320
+  EXPECT_THROW(planLayout(*findLayout("grid-2x2"), 320, 180, {0, std::nullopt, Point{5, 5}}),
+               std::invalid_argument);
+  // A gap moves side-by-side cuts apart; an angle turns every cut about the centre.
+  const LayoutPlan z = planLayout(*findLayout("z-3"), 320, 180, {0, 100.0, std::nullopt});
+  EXPECT_NEAR(z.cuts[0].y - z.cuts[1].y, 100, 1e-9);
+  const LayoutPlan turned =
+      planLayout(*findLayout("vertical-2"), 320, 180, {30, std::nullopt, std::nullopt});
+  EXPECT_DOUBLE_EQ(turned.cuts[0].degrees, 30);
+  const LayoutPlan moved =
+      planLayout(*findLayout("radial-3"), 320, 180, {0, std::nullopt, Point{40, -20}});
+  EXPECT_EQ(moved.centre, (Point{40, -20}));
+}
+
+}  // namespace
+}  // namespace veltrane_cli
