@@ -25,10 +25,15 @@ bool UndoStack::end(const ParamPanel& panel) {
     const Param* param = panel.find(entry.first);
     open_.after.emplace_back(entry.first, param ? param->state : entry.second);
   }
-  // A bracket that changed nothing still counts as a step: the host saw a named action.
-  steps_.push_back(std::move(open_));
+  // A bracket that left every value as it found it (a click that moved nothing) is no step, as
+  // in editors: the next undo then undoes something the user sees.
+  const bool changed =
+      !std::equal(open_.before.begin(), open_.before.end(), open_.after.begin(), open_.after.end());
+  if (changed) {
+    steps_.push_back(std::move(open_));
+    undone_.clear();
+  }
   open_ = Step{};
-  undone_.clear();
   return true;
 }
 

@@ -24,7 +24,8 @@ class UndoStack {
   // outer step, whose name stands.
   void begin(const std::string& name);
   // Closes the innermost bracket; the outermost closes the step and pushes it, dropping the
-  // steps that could have been redone. False when no step is open.
+  // steps that could have been redone, unless it changed no value (then it is dropped and the
+  // redo steps stay). False when no step is open.
   bool end(const ParamPanel& panel);
   bool isOpen() const { return depth_ > 0; }
   // The name the open step was begun with (meaningful while isOpen()).

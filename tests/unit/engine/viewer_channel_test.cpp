@@ -29,6 +29,11 @@ TEST(ViewerChannel, DragSelectsAndMovesAnInputAsOneUndoStep) {
   engine.pointerMove(10, 28, false);
   EXPECT_EQ(engine.cursor(), 3);
 
+  // A click that moves nothing leaves no undo step, so the next undo undoes something seen.
+  engine.pointerPress(10, 28);
+  engine.pointerRelease(10, 28);
+  EXPECT_TRUE(engine.undoStepNames().empty());
+
   // A press in a region, away from the diagonal cut and its handles, grabs the region's input.
   ViewerOutcome press = engine.pointerPress(10, 28);
   ASSERT_FALSE(press.sent.empty());

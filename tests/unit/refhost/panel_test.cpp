@@ -146,19 +146,20 @@ TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   api.EndUndo(h);
   api.EndUndo(h);
   history.push_back(snapshot());
-  // Step 3: a bracket without edits is still a step.
+  // A bracket that changes nothing (an edit to the value already there) is no step.
+  const float same = 7.25f;
   api.BeginUndo(h, "Select");
+  api.SetFloatParam(h, "f", 0, same, 0);
   api.EndUndo(h);
-  history.push_back(snapshot());
 
-  EXPECT_EQ(host.undoStepNames(), (std::vector<std::string>{"Move Cut", "Rotate Cut", "Select"}));
+  EXPECT_EQ(host.undoStepNames(), (std::vector<std::string>{"Move Cut", "Rotate Cut"}));
   EXPECT_TRUE(host.immediateEdits().empty());
-  for (int step = 3; step > 0; --step) {
+  for (int step = 2; step > 0; --step) {
     ASSERT_TRUE(host.undo());
     EXPECT_EQ(snapshot(), history[static_cast<std::size_t>(step - 1)]) << "undoing " << step;
   }
   EXPECT_FALSE(host.undo());
-  for (std::size_t step = 1; step <= 3; ++step) {
+  for (std::size_t step = 1; step <= 2; ++step) {
     ASSERT_TRUE(host.redo());
     EXPECT_EQ(snapshot(), history[step]) << "redoing " << step;
   }
@@ -173,12 +174,15 @@ TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   EXPECT_EQ(host.immediateEdits()[0].id, "l");
   EXPECT_EQ(host.immediateEdits()[0].time, 4);
   EXPECT_EQ(host.immediateEdits()[0].value, kLayerB);
-  EXPECT_EQ(host.redoStepNames(), std::vector<std::string>{"Select"});
-  // A new step drops it.
+  EXPECT_EQ(host.redoStepNames(), std::vector<std::string>{"Rotate Cut"});
+  // So does a bracket that changes nothing; a new step drops it.
+  api.BeginUndo(h, "Select");
+  api.EndUndo(h);
+  EXPECT_EQ(host.redoStepNames(), std::vector<std::string>{"Rotate Cut"});
   api.BeginUndo(h, "Width");
   api.SetFloatParam(h, "f", 0, 9, 0);
   api.EndUndo(h);
-  EXPECT_EQ(host.undoStepNames(), (std::vector<std::string>{"Move Cut", "Rotate Cut", "Width"}));
+  EXPECT_EQ(host.undoStepNames(), (std::vector<std::string>{"Move Cut", "Width"}));
   EXPECT_FALSE(host.redo());
 
   // Undo is refused while the plug-in holds a bracket open (a drag in progress).
