@@ -24,6 +24,8 @@ const char kSoakHelp[] =
     "last line gives the growth from the first sample to the last. (Resident memory comes\n"
     "from /proc/self/status; elsewhere it reads 0.)\n"
     "\n"
+    "Example: veltrane soak docs/examples/demo.json --frames 2000 --every 250\n"
+    "\n"
     "Options:\n"
     "  --frames N     frames to render (default 10000)\n"
     "  --every N      frames between samples (default 500)\n"

@@ -1,6 +1,8 @@
 // Drawing the progress bar.
 #include "output/progress_bar.h"
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <cmath>
 
@@ -8,16 +10,19 @@ namespace veltrane_cli {
 namespace {
 
 constexpr int kCells = 30;
+// Seconds between the lines written into a log.
+constexpr int kLogInterval = 5;
 
 }  // namespace
 
-ProgressBar::ProgressBar(std::string label, int total, std::FILE* out)
-    : label_(std::move(label)), total_(total), out_(out) {
+ProgressBar::ProgressBar(std::string label, int total, std::FILE* out, Style style)
+    : label_(std::move(label)), total_(total), out_(out), style_(style) {
+  if (style_ == Style::Auto) style_ = isatty(fileno(out_)) ? Style::Terminal : Style::Log;
   update(0);
 }
 
 ProgressBar::~ProgressBar() {
-  if (drawn_) std::fputc('\n', out_);
+  if (drawn_ && style_ == Style::Terminal) std::fputc('\n', out_);
 }
 
 std::string ProgressBar::line(const std::string& label, int done, int total, int width,
@@ -40,9 +45,19 @@ std::string ProgressBar::line(const std::string& label, int done, int total, int
 }
 
 void ProgressBar::update(int done) {
-  if (total_ <= 1) return;
-  int cells = done * kCells / total_;
+  if (total_ <= 1 || style_ == Style::Quiet) return;
   auto now = std::chrono::steady_clock::now();
+  if (style_ == Style::Log) {
+    // The start says nothing a log needs; then every few seconds, and the end.
+    if (done == 0 || (done != total_ && now - shownAt_ < std::chrono::seconds(kLogInterval)))
+      return;
+    shownAt_ = now;
+    const double seconds = std::chrono::duration<double>(now - started_).count();
+    std::fprintf(out_, "%s\n", line(label_, done, total_, kCells, seconds).c_str());
+    std::fflush(out_);
+    return;
+  }
+  int cells = done * kCells / total_;
   // Redrawn when a cell fills, at the end and at most once a second for the rate, so a log
   // file does not fill up with it.
   if (cells == shownCells_ && done != total_ && now - shownAt_ < std::chrono::seconds(1)) return;

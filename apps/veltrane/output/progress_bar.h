@@ -1,5 +1,6 @@
-// A one-line progress bar on stderr for work of several steps, redrawn in place, with the
-// rate so far and the time it leaves to go.
+// Progress on stderr for work of several steps, with the rate so far and the time it leaves to
+// go: on a terminal one line redrawn in place; into a log (not a terminal) a plain line every
+// few seconds and one at the end, so the log holds no carriage returns; nothing when quiet.
 #pragma once
 
 #include <chrono>
@@ -10,8 +11,9 @@ namespace veltrane_cli {
 
 class ProgressBar {
  public:
-  // Shows nothing when `total` is 1 or less.
-  ProgressBar(std::string label, int total, std::FILE* out = stderr);
+  enum class Style { Auto, Terminal, Log, Quiet };
+  // Shows nothing when `total` is 1 or less. Auto is Terminal when `out` is one, else Log.
+  ProgressBar(std::string label, int total, std::FILE* out = stderr, Style style = Style::Auto);
   // Ends the line if anything was drawn.
   ~ProgressBar();
   ProgressBar(const ProgressBar&) = delete;
@@ -29,6 +31,7 @@ class ProgressBar {
   std::string label_;
   int total_;
   std::FILE* out_;
+  Style style_;
   int shownCells_ = -1;
   bool drawn_ = false;
   std::chrono::steady_clock::time_point started_ = std::chrono::steady_clock::now();
