@@ -26,6 +26,27 @@ std::vector<ParamSetting> checkedSettings(const refhost::Engine& engine,
   return settings;
 }
 
+// A Radial layout shows inputs 1 to 8 only: a scene that sets input 0 in one has made a mistake
+// the render would hide, so it is named once on stderr.
+void noteUnusedInputZero(const std::vector<ParamSetting>& settings, const std::string& file) {
+  bool radial = false;
+  std::string inputZero;
+  for (const ParamSetting& setting : settings) {
+    if (setting.id == "cutType") {
+      radial = setting.value.integer == 1;
+      for (const auto& key : setting.keys) radial = radial || key.second.integer == 1;
+    }
+    const std::size_t digit = setting.id.size() - 1;
+    if (setting.id.rfind("input", 0) == 0 && setting.id[digit] == '0' && inputZero.empty())
+      inputZero = setting.id;
+  }
+  if (radial && !inputZero.empty())
+    std::fprintf(stderr,
+                 "veltrane: note: %s: params.%s: a Radial layout never shows input 0 (its "
+                 "sectors show inputs 1 to 8), so this value goes unused\n",
+                 file.c_str(), inputZero.c_str());
+}
+
 }  // namespace
 
 std::unique_ptr<refhost::Engine> startScene(const Scene& scene, SceneEngineOptions options) {
@@ -47,6 +68,7 @@ std::unique_ptr<refhost::Engine> startScene(const Scene& scene, SceneEngineOptio
   // scene stops before any GL work.
   std::vector<ParamSetting> settings =
       checkedSettings(*engine, scene.params, scene.file, scene.layerGuids());
+  noteUnusedInputZero(settings, scene.file);
   engine->createInstance();
   applyParamSettings(*engine, settings);
   return engine;

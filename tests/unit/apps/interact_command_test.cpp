@@ -141,3 +141,23 @@ TEST(InteractCommand, WholeNumbersWithAZeroFractionAreTaken) {
 }
 
 }  // namespace
+
+namespace {
+
+// A Radial layout never shows input 0; a scene that sets it is told so once, and still runs.
+TEST(InteractCommand, AnInputZeroInARadialSceneIsNoted) {
+  for (const char* type : {"Radial", "Local"}) {
+    json scene = json::parse(kScene);
+    scene["params"]["cutType"] = type;
+    scene["params"]["inputFrameScale0"] = 50;
+    ScratchDirectory folder;
+    Interaction done = interact(folder, {{"events", json::array()}}, {}, scene.dump());
+    ASSERT_EQ(done.run.status, 0) << done.run.err;
+    EXPECT_EQ(done.run.err.find("params.inputFrameScale0: a Radial layout never shows input 0") !=
+                  std::string::npos,
+              std::string(type) == "Radial")
+        << done.run.err;
+  }
+}
+
+}  // namespace
