@@ -14,7 +14,8 @@ struct ColourDescription {
     kMatrixBt709 = 1,
     kMatrixBt470bg = 5,
     kMatrixSmpte170m = 6,
-    kMatrixBt2020 = 9
+    kMatrixBt2020 = 9,
+    kMatrixBt2020Constant = 10
   };
   enum Primaries : int32_t {
     kPrimariesBt709 = 1,
@@ -53,6 +54,11 @@ struct ColourDescription {
   bool operator!=(const ColourDescription& other) const { return !(*this == other); }
   // A transfer for high dynamic range (PQ, HLG).
   bool isHdr() const { return transfer == kTransferPq || transfer == kTransferHlg; }
+  // BT.2020's primaries or matrix: colours wider than BT.709's, which SDR output cannot hold.
+  bool isWideGamut() const {
+    return primaries == kPrimariesBt2020 || matrix == kMatrixBt2020 ||
+           matrix == kMatrixBt2020Constant;
+  }
 };
 
 // The names ffprobe shows ("bt709", "smpte170m", "bt470bg", "bt2020nc", "tv", "pc", ...); the

@@ -1,5 +1,7 @@
-// Frames of a video file by index, decoded with FFmpeg's libraries. The decoder stays open
-// between calls, so frames asked in order cost one decode each and a jump costs one seek.
+// Frames of a video file by presentation time, decoded with FFmpeg's libraries and shown as
+// players show them: converted with the stream's colour description, upright and at square
+// pixels. The decoder stays open between calls, so frames asked in order cost one decode each
+// and a jump costs one seek.
 #pragma once
 
 #include <cstdint>
@@ -15,7 +17,8 @@ namespace refhost {
 
 class VideoReader {
  public:
-  // Throws std::runtime_error naming the path when it holds no decodable video stream.
+  // Throws std::runtime_error naming the path when it holds no decodable video stream, or one
+  // the host would show with wrong colours: HDR (PQ or HLG transfer) or BT.2020's wide gamut.
   explicit VideoReader(const std::string& path);
   ~VideoReader();
   VideoReader(const VideoReader&) = delete;

@@ -1,0 +1,322 @@
+// Video files read as players show them: small clips made by the ffmpeg command line, each
+// picture compared with what ffmpeg itself decodes for the same frame (colours by the stream's
+// own matrix and range, 10 bits kept, turned upright, at square pixels), frames chosen by
+// presentation time at constant and variable rates, and HDR refused.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <fstream>
+#include <random>
+#include <set>
+#include <sstream>
+
+#include "refhost/media/media_source.h"
+#include "refhost/media/video_reader.h"
+#include "support/child_process.h"
+#include "support/temp_paths.h"
+
+namespace refhost {
+namespace {
+
+using testsupport::ChildProcess;
+using testsupport::ScratchDirectory;
+
+std::string readFile(const std::string& path) {
+  std::ostringstream bytes;
+  bytes << std::ifstream(path, std::ios::binary).rdbuf();
+  return bytes.str();
+}
+
+// Runs the ffmpeg command line quietly; its own messages are the failure when it fails.
+void ffmpeg(const ScratchDirectory& folder, std::vector<std::string> arguments) {
+  arguments.insert(arguments.begin(), {"ffmpeg", "-nostdin", "-v", "error", "-y"});
+  const std::string log = folder.file("ffmpeg.log");
+  ChildProcess process(arguments, "/dev/null", log);
+  ASSERT_EQ(process.wait(120), 0) << readFile(log);
+}
+
+// `frames` of FFmpeg's moving test picture at 25 fps, encoded with the options (separated by
+// spaces).
+void makeClip(const ScratchDirectory& folder, const std::string& name, const std::string& size,
+              const std::string& options, int frames = 4) {
+  std::vector<std::string> arguments = {
+      "-f", "lavfi", "-i", "testsrc2=size=" + size, "-frames:v", std::to_string(frames)};
+  std::istringstream words(options);
+  for (std::string word; words >> word;) arguments.push_back(word);
+  arguments.push_back(folder.file(name));
+  ffmpeg(folder, arguments);
+}
+
+// Every frame of the clip as the ffmpeg command line shows it, after the filter when one is
+// given: packed RGB of 8 bits, or planar RGB of 16 bits (green, blue, red) for deep pictures.
+// The same kinds of output as ours, with the same bilinear chroma: the scaler interpolates
+// chroma differently by filter and by output, which moves single pixels at the test picture's
+// hard colour edges by up to 180 levels and would hide what is compared here.
+std::string shownByFfmpeg(const ScratchDirectory& folder, const std::string& path,
+                          const char* filter, PixelFormat format) {
+  std::vector<std::string> arguments = {"-i", path};
+  if (filter) arguments.insert(arguments.end(), {"-vf", filter});
+  const std::string raw = folder.file("shown.raw");
+  arguments.insert(arguments.end(),
+                   {"-sws_flags", "bilinear", "-fps_mode", "passthrough", "-pix_fmt",
+                    format == PixelFormat::Rgba8 ? "rgb24" : "gbrp16le", "-f", "rawvideo", raw});
+  ffmpeg(folder, arguments);
+  return readFile(raw);
+}
+
+// How far our pictures may be from ffmpeg's, in levels of 255, on average and at worst. Both
+// convert with the same library and tables, so 8 bits agree exactly (a level is left for
+// rounding); half floats put white at 1 where ffmpeg's 16 bits leave it up to 0.4% short, half a
+// level on average and one at white. A wrong matrix or range is off by several levels on
+// average, a wrong turn by tens.
+struct Tolerance {
+  double mean, max;
+};
+constexpr Tolerance kEightBits{0.25, 1.0};
+constexpr Tolerance kHalfFloats{1.0, 2.0};
+
+// Our frame `frame` (at 25 fps) against ffmpeg's, as 8 bits or half floats, in levels of 255.
+void expectShownAlike(VideoReader& reader, const std::string& theirs, int frame, PixelFormat format,
+                      const std::string& name) {
+  const RgbaImage ours =
+      reader.frameAt(frame / 25.0, reader.info().width, reader.info().height, format);
+  const std::size_t pixels = static_cast<std::size_t>(ours.width) * ours.height;
+  const bool deep = format == PixelFormat::RgbaHalf;
+  const std::size_t start = pixels * 3 * (deep ? 2 : 1) * frame;
+  ASSERT_GE(theirs.size(), start + pixels * 3 * (deep ? 2 : 1)) << name << " frame " << frame;
+  const auto* bytes = reinterpret_cast<const uint8_t*>(theirs.data() + start);
+  double mean = 0, max = 0;
+  for (std::size_t i = 0; i < pixels; ++i) {
+    for (int c = 0; c < 3; ++c) {
+      // Packed red, green, blue; or planes of green, blue, red.
+      const uint8_t* sample = deep ? bytes + 2 * (pixels * ((c + 2) % 3) + i) : bytes + 3 * i + c;
+      const double level = deep ? (sample[0] | sample[1] << 8) / 257.0 : sample[0];
+      const auto x = static_cast<int32_t>(i % ours.width), y = static_cast<int32_t>(i / ours.width);
+      const double gap = std::fabs(ours.channel(x, y, c) * 255.0 - level);
+      mean += gap / (3 * pixels);
+      max = std::max(max, gap);
+    }
+  }
+  const std::string label =
+      name + " frame " + std::to_string(frame) + (deep ? " in half floats" : " in 8 bits");
+  const Tolerance tolerance = deep ? kHalfFloats : kEightBits;
+  EXPECT_LE(mean, tolerance.mean) << label;
+  EXPECT_LE(max, tolerance.max) << label;
+}
+
+// Frames 0 and 3 of clips of each colour description, depth and pixel shape.
+TEST(VideoInput, PicturesMatchWhatFfmpegShows) {
+  ScratchDirectory folder;
+  const std::string bt709 = " -colorspace bt709 -color_primaries bt709 -color_trc bt709";
+  const struct {
+    const char* name;
+    const char* size;
+    std::string options;
+    const char* shownBy;  // ffmpeg's filter for the picture we show, when not its default
+    int32_t width, height, bitDepth, matrix;
+    bool fullRange;
+  } clips[] = {
+      {"601.mp4", "320x180",
+       "-pix_fmt yuv420p -colorspace smpte170m -color_primaries smpte170m -color_trc smpte170m "
+       "-color_range tv",
+       nullptr, 320, 180, 8, 6, false},
+      {"709.mp4", "320x180", "-pix_fmt yuv420p -color_range tv" + bt709, nullptr, 320, 180, 8, 1,
+       false},
+      {"jpeg.mp4", "320x180", "-pix_fmt yuvj420p" + bt709, nullptr, 320, 180, 8, 1, true},
+      {"pc.mp4", "320x180", "-pix_fmt yuv420p -color_range pc -colorspace bt470bg", nullptr, 320,
+       180, 8, 5, true},
+      {"10bit.mp4", "320x180", "-pix_fmt yuv420p10le -color_range tv" + bt709, nullptr, 320, 180,
+       10, 1, false},
+      {"rgb.mkv", "320x180", "-pix_fmt gbrp -c:v ffv1", nullptr, 320, 180, 8, 0, true},
+      // Untagged HD is taken as BT.709, where ffmpeg's own default would be BT.601.
+      {"hd.mp4", "1280x720", "-pix_fmt yuv420p", "scale=in_color_matrix=bt709", 1280, 720, 8, 1,
+       false},
+      // Stored at 240x180 with pixels 4:3 wide: shown at 320x180.
+      {"anamorphic.mp4", "240x180", "-pix_fmt yuv420p -vf setsar=4/3",
+       "scale=iw*sar:ih:flags=bilinear,setsar=1", 320, 180, 8, 6, false},
+  };
+  for (const auto& clip : clips) {
+    const std::string path = folder.file(clip.name);
+    makeClip(folder, clip.name, clip.size, clip.options);
+    VideoReader reader(path);
+    const MediaInfo& info = reader.info();
+    EXPECT_EQ(info.width, clip.width) << clip.name;
+    EXPECT_EQ(info.height, clip.height) << clip.name;
+    EXPECT_EQ(info.bitDepth, clip.bitDepth) << clip.name;
+    EXPECT_EQ(info.colour.matrix, clip.matrix) << clip.name;
+    EXPECT_EQ(info.colour.fullRange, clip.fullRange) << clip.name;
+    for (PixelFormat format : {PixelFormat::Rgba8, PixelFormat::RgbaHalf}) {
+      const std::string theirs = shownByFfmpeg(folder, path, clip.shownBy, format);
+      for (int frame : {0, 3}) expectShownAlike(reader, theirs, frame, format, clip.name);
+    }
+  }
+}
+
+// A copy of an MP4 whose track's display matrix is a, b, c, d (16.16 fixed point in the file).
+void writeWithDisplayMatrix(const std::string& from, const std::string& to, int a, int b, int c,
+                            int d) {
+  std::string bytes = readFile(from);
+  const std::size_t box = bytes.find("tkhd");
+  ASSERT_NE(box, std::string::npos);
+  // After the version, flags, two times, the track id, a reserved word, the duration (32 or 64
+  // bits each by the version), 8 reserved bytes and 8 of layer, group and volume.
+  std::size_t at = box + 4 + 4 + (bytes[box + 4] == 1 ? 32 : 20) + 16;
+  for (int value : {a << 16, b << 16, 0, c << 16, d << 16, 0, 0, 0, 1 << 30}) {
+    for (int shift = 24; shift >= 0; shift -= 8)
+      bytes[at++] = static_cast<char>(static_cast<uint32_t>(value) >> shift & 0xFF);
+  }
+  std::ofstream(to, std::ios::binary) << bytes;
+}
+
+TEST(VideoInput, TurnedPicturesShowUpright) {
+  ScratchDirectory folder;
+  // Without chroma subsampling: ffmpeg turns the picture before converting it, which moves
+  // subsampled chroma by half a sample, and ours after.
+  makeClip(folder, "stored.mp4", "320x180", "-pix_fmt yuv444p");
+  const struct {
+    const char* name;
+    const char* rotate;  // the muxer's tag, or the matrix below patched in
+    int a, b, c, d;
+    int32_t width, height;
+  } clips[] = {
+      {"rotate90.mp4", "90", 0, 0, 0, 0, 180, 320},
+      {"rotate180.mp4", "180", 0, 0, 0, 0, 320, 180},
+      {"rotate270.mp4", "270", 0, 0, 0, 0, 180, 320},
+      {"mirrored.mp4", nullptr, -1, 0, 0, 1, 320, 180},
+      {"upside-down.mp4", nullptr, 1, 0, 0, -1, 320, 180},
+      {"transposed.mp4", nullptr, 0, 1, 1, 0, 180, 320},
+  };
+  for (const auto& clip : clips) {
+    const std::string path = folder.file(clip.name);
+    if (clip.rotate) {
+      ffmpeg(folder, {"-i", folder.file("stored.mp4"), "-c", "copy", "-metadata:s:v",
+                      std::string("rotate=") + clip.rotate, path});
+    } else {
+      writeWithDisplayMatrix(folder.file("stored.mp4"), path, clip.a, clip.b, clip.c, clip.d);
+    }
+    VideoReader reader(path);
+    EXPECT_EQ(reader.info().width, clip.width) << clip.name;
+    EXPECT_EQ(reader.info().height, clip.height) << clip.name;
+    for (PixelFormat format : {PixelFormat::Rgba8, PixelFormat::RgbaHalf}) {
+      const std::string theirs = shownByFfmpeg(folder, path, nullptr, format);
+      for (int frame : {0, 3}) expectShownAlike(reader, theirs, frame, format, clip.name);
+    }
+  }
+}
+
+// A limited-range 10-bit ramp holds 877 levels (64 to 940); read as half floats, they stay
+// apart instead of falling onto 8 bits' 220.
+TEST(VideoInput, TenBitsKeepTheirLevelsAsHalfFloats) {
+  ScratchDirectory folder;
+  const std::string path = folder.file("ramp.mp4");
+  ffmpeg(folder, {"-f", "lavfi", "-i",
+                  "nullsrc=s=1024x4,format=yuv420p10le,geq=lum='64+X*876/1023':cb=512:cr=512",
+                  "-frames:v", "1", "-c:v", "libx264", "-qp", "0", path});
+  VideoReader reader(path);
+  EXPECT_EQ(reader.info().bitDepth, 10);
+  const RgbaImage picture = reader.frameAt(0, 1024, 4, PixelFormat::RgbaHalf);
+  std::set<float> levels;
+  for (int32_t x = 0; x < 1024; ++x) levels.insert(picture.channel(x, 1, 1));
+  EXPECT_GE(levels.size(), 700u);
+  EXPECT_EQ(*levels.begin(), 0.0f);
+  EXPECT_EQ(*levels.rbegin(), 1.0f);
+}
+
+// Frame n of these clips is grey level 16 + 18 n, which tells which frame a picture shows.
+int32_t frameShown(const RgbaImage& picture) {
+  const double luma = picture.channel(picture.width / 2, picture.height / 2, 1) * 219.0 + 16.0;
+  return static_cast<int32_t>(std::lround((luma - 16.0) / 18.0));
+}
+
+// Clips at constant rates and at a variable one: the picture at time t is the latest frame
+// presented at or before t, the first before it, the last after it.
+TEST(VideoInput, FramesAreChosenByPresentationTime) {
+  ScratchDirectory folder;
+  const struct {
+    const char* name;
+    int rate;
+    double duration;
+    int32_t compositionFrames;      // at 25 fps
+    const char* times;              // a setpts expression in milliseconds for a variable rate
+    std::vector<double> presented;  // its frames' times in milliseconds
+  } clips[] = {
+      {"25.mp4", 25, 0.48, 12, nullptr, {}},
+      {"60.mp4", 60, 0.2, 5, nullptr, {}},
+      // Steady at first, then a pause, three short frames and a long gap.
+      {"variable.mp4",
+       25,
+       0,
+       0,
+       "if(lt(N,3),N*40,if(lt(N,5),200+(N-3)*40,if(lt(N,8),257+(N-5)*17,800+(N-8)*40)))",
+       {0, 40, 80, 200, 240, 257, 274, 291, 800, 840, 880, 920}},
+  };
+  for (const auto& clip : clips) {
+    const std::string path = folder.file(clip.name);
+    std::string filter = "color=black:s=64x32:r=" + std::to_string(clip.rate) +
+                         ",format=yuv420p,geq=lum='16+18*N':cb=128:cr=128";
+    if (clip.times) filter += std::string(",settb=1/1000,setpts='(") + clip.times + ")/1000/TB'";
+    // Variable times in milliseconds reach the file as they are (the encoder's time base would
+    // otherwise be the nominal rate's).
+    std::vector<std::string> arguments = {"-f", "lavfi", "-i", filter, "-frames:v", "12"};
+    if (clip.times)
+      arguments.insert(arguments.end(), {"-fps_mode", "passthrough", "-enc_time_base", "1:1000"});
+    arguments.insert(arguments.end(), {"-c:v", "libx264", path});
+    ffmpeg(folder, arguments);
+    VideoReader reader(path);
+    if (!clip.times) {
+      EXPECT_DOUBLE_EQ(reader.info().frameRate, clip.rate) << clip.name;
+      EXPECT_NEAR(reader.info().duration, clip.duration, 1e-9) << clip.name;
+      EXPECT_EQ(openMediaSource(MediaSpec::ofFile(path), 25.0)->frameCount(),
+                clip.compositionFrames)
+          << clip.name;
+    }
+    // Each frame's time, just before and between it and the next, asked back and forth.
+    std::vector<std::pair<double, int32_t>> asked = {{-1, 0}, {5, 11}};
+    auto presented = [&](int32_t n) {
+      return clip.times ? clip.presented[n] / 1000 : static_cast<double>(n) / clip.rate;
+    };
+    for (int32_t n = 0; n < 12; ++n) {
+      asked.push_back({presented(n), n});
+      asked.push_back({presented(n) - 0.001, std::max(n - 1, 0)});
+      if (n < 11) asked.push_back({(presented(n) + presented(n + 1)) / 2, n});
+    }
+    std::shuffle(asked.begin(), asked.end(), std::mt19937(7));
+    for (const auto& [seconds, frame] : asked)
+      EXPECT_EQ(frameShown(reader.frameAt(seconds, 8, 8)), frame) << clip.name << " at " << seconds;
+  }
+}
+
+TEST(VideoInput, HdrAndWideGamutAreRefusedInOneLine) {
+  ScratchDirectory folder;
+  const struct {
+    const char* name;
+    const char* transfer;
+    const char* carries;
+  } clips[] = {
+      {"pq.mov", "smpte2084",
+       "HDR video (transfer smpte2084, primaries bt2020, matrix bt2020nc) is not shown by this "
+       "host: it renders in SDR BT.709/BT.601; convert it first (for example with ffmpeg's "
+       "zscale and tonemap filters)"},
+      {"hlg.mp4", "arib-std-b67", "HDR video (transfer arib-std-b67, primaries bt2020, matrix"},
+      {"wide.mp4", "bt709", "wide-gamut video (primaries bt2020, matrix bt2020nc) is not shown"},
+  };
+  for (const auto& clip : clips) {
+    const std::string path = folder.file(clip.name);
+    makeClip(folder, clip.name, "64x36",
+             std::string("-pix_fmt yuv420p10le -color_primaries bt2020 -colorspace bt2020nc ") +
+                 "-color_trc " + clip.transfer,
+             1);
+    try {
+      VideoReader reader(path);
+      ADD_FAILURE() << clip.name << " opened";
+    } catch (const std::runtime_error& error) {
+      const std::string message = error.what();
+      EXPECT_EQ(message.rfind(path + ": " + clip.carries, 0), 0u) << message;
+      EXPECT_EQ(message.find('\n'), std::string::npos) << message;
+    }
+  }
+}
+
+}  // namespace
+}  // namespace refhost
