@@ -178,6 +178,10 @@ class Engine {
   std::unique_ptr<RenderFrame> render(int32_t frame);
   // The same into textures the caller made.
   void render(int32_t frame, const CallerTextures& textures);
+  // A preview: the frame rendered at 1 / `divisor` of its size, with every value measured in
+  // frame pixels scaled to match (see Host::setPixelScale), so that it shows the full render
+  // at a quarter (divisor 2) or a sixteenth (4) of the cost. Divisor 1 is the full render.
+  std::unique_ptr<RenderFrame> renderPreview(int32_t frame, int32_t divisor);
   // The same with a render context the caller filled (its textures included).
   void render(RenderFrame& frame);
 

@@ -120,6 +120,11 @@ class Host {
   // How the frames the host uploads for the plug-in are stored: 8 bits (GL_RGBA) or half
   // floats (GL_RGBA16F) when more than 8 bits are to be kept.
   void setFrameFormat(PixelFormat format) { frameFormat_ = format; }
+  // While a smaller picture of the frame is rendered (a viewer's preview), everything measured
+  // in frame pixels that the plug-in reads is scaled by `scale`: points and floats declared in
+  // "px", the composition size, and the layers' sizes and placements. 1 outside previews.
+  void setPixelScale(double scale) { pixelScale_ = scale; }
+  double pixelScale() const { return pixelScale_; }
   PixelFormat frameFormat() const { return frameFormat_; }
 
   // ---- GL --------------------------------------------------------------------------------
@@ -371,6 +376,8 @@ class Host {
   std::wstring hostIdentifier_ = L"org.veltrane.refhost";
   WispTimeInfo timeInfo_{1920, 1080, 25.0};
   PixelFormat frameFormat_ = PixelFormat::Rgba8;
+  double pixelScale_ = 1;
+  int32_t scaled(int32_t pixels) const;
 
   ParamPanel panel_;
   UndoStack undo_;

@@ -1,6 +1,7 @@
 // The composition as the plug-in sees it: layers, their states, timing and frame delivery.
 #include <algorithm>
 #include <chrono>
+#include <cmath>
 #include <cstring>
 #include <ctime>
 
@@ -71,9 +72,11 @@ int32_t Host::queryLayerState(const char* guid, int32_t timeMs, LayerState* out)
   out->firstFrame = layer->firstFrame;
   out->frameCount = layer->frameCount;
   out->is3D = layer->is3D ? 1 : 0;
-  out->width = layer->width;
-  out->height = layer->height;
+  out->width = scaled(layer->width);
+  out->height = scaled(layer->height);
   std::memcpy(out->placement, layer->placement.data(), sizeof out->placement);
+  for (int i = 12; i < 15; ++i)
+    out->placement[i] = static_cast<float>(out->placement[i] * pixelScale_);
   std::memcpy(out->secondMatrix, layer->secondMatrix.data(), sizeof out->secondMatrix);
   return 0;
 }
@@ -82,7 +85,14 @@ int32_t Host::getTimeInfo(WispTimeInfo* out) {
   log([&] { return std::string("GetTimeInfo"); });
   if (failTimeInfo_ || !out) return 1;
   *out = timeInfo_;
+  out->width = scaled(out->width);
+  out->height = scaled(out->height);
   return 0;
+}
+
+int32_t Host::scaled(int32_t pixels) const {
+  if (pixelScale_ == 1) return pixels;
+  return std::max(1, static_cast<int32_t>(std::lround(pixels * pixelScale_)));
 }
 
 int32_t Host::getSourceFrame(void* renderContext, int32_t frameIndex, TextureRecord* out) {
@@ -121,10 +131,11 @@ int32_t Host::renderLayerFrame(void* renderContext, const char* guid, int32_t fr
   if (refuseLayerFrames_ || !layer) return 1;
   if (!layer->source)
     return deliverFrame(frameCounterSource(static_cast<uint8_t>(layer - layers_.data() + 1)), frame,
-                        layer->width, layer->height, out);
+                        scaled(layer->width), scaled(layer->height), out);
   const auto* context = static_cast<const WispRenderContext*>(renderContext);
   const int32_t offset = context ? frame - static_cast<int32_t>(context->frameNumber) : 0;
-  return deliverFrame(stream(layer, offset), frame, layer->width, layer->height, out);
+  return deliverFrame(stream(layer, offset), frame, scaled(layer->width), scaled(layer->height),
+                      out);
 }
 
 int32_t Host::deliverFrame(const FrameSource& source, int32_t frame, int32_t width, int32_t height,

@@ -23,7 +23,13 @@ ParamValue Host::read(const char* operation, const char* id, int32_t time, Param
     return ParamValue{};
   }
   if (readRecord_) readRecord_->push_back(param);
-  return param->valueAt(time);
+  ParamValue value = param->valueAt(time);
+  if (pixelScale_ != 1 &&
+      (kind == ParamKind::Point || (kind == ParamKind::Float && param->unit == "px"))) {
+    value.number[0] = static_cast<float>(value.number[0] * pixelScale_);
+    value.number[1] = static_cast<float>(value.number[1] * pixelScale_);
+  }
+  return value;
 }
 
 int32_t Host::getIntParam(const char* id, int32_t time) {

@@ -247,6 +247,24 @@ std::unique_ptr<RenderFrame> Engine::render(int32_t frame) {
   return rendered;
 }
 
+std::unique_ptr<RenderFrame> Engine::renderPreview(int32_t frame, int32_t divisor) {
+  if (divisor <= 1) return render(frame);
+  FrameSettings preview = settings_;
+  preview.width = std::max(1, settings_.width / divisor);
+  preview.height = std::max(1, settings_.height / divisor);
+  host_->setPixelScale(static_cast<double>(preview.height) / settings_.height);
+  std::unique_ptr<RenderFrame> rendered;
+  try {
+    rendered = std::make_unique<RenderFrame>(*host_, preview, frame);
+    render(*rendered);
+  } catch (...) {
+    host_->setPixelScale(1);
+    throw;
+  }
+  host_->setPixelScale(1);
+  return rendered;
+}
+
 void Engine::render(int32_t frame, const CallerTextures& textures) {
   RenderFrame rendered(*host_, settings_, frame, textures.source, textures.output);
   render(rendered);

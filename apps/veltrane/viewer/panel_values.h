@@ -7,8 +7,8 @@
 #include <string>
 #include <vector>
 
-#include "refhost/engine/composition.h"
 #include "refhost/core/params.h"
+#include "refhost/engine/composition.h"
 
 namespace veltrane_viewer {
 

@@ -22,9 +22,9 @@ class ViewCanvas {
   int32_t width() const { return width_; }
   int32_t height() const { return height_; }
 
-  // Clears the canvas and copies the picture (a frame-sized texture; 0 for none) onto `where`
+  // Clears the canvas and copies the picture (a texture of the size; 0 for none) onto `where`
   // (framebuffer pixels, y down): pixel for pixel when magnified, smoothed when reduced.
-  void showPicture(uint32_t picture, int32_t frameWidth, int32_t frameHeight,
+  void showPicture(uint32_t picture, int32_t pictureWidth, int32_t pictureHeight,
                    const PixelRect& where);
   // Copies the canvas onto the window's framebuffer.
   void present();

@@ -80,6 +80,12 @@ refhost::Matrix4 ViewMapping::projection(int32_t framebufferWidth,
   return m;
 }
 
+double handleScale(double density, double viewScale) {
+  if (!(viewScale > 0) || !std::isfinite(viewScale)) return density;
+  const double band = 15.0 / (viewScale * viewScale);
+  return std::max(density, (band + 4.0) / 10.0);
+}
+
 EventPosition eventPosition(Point2 corner) {
   auto whole = [](double value) {
     double clamped = std::clamp(std::round(value), -1.0e9, 1.0e9);

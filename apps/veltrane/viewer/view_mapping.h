@@ -70,6 +70,15 @@ class ViewMapping {
   bool fitted_ = true;
 };
 
+// The UI scale handed to the plug-in with the view scale `viewScale` (frame pixels per screen
+// pixel): the screen's density, raised where needed so that every handle the overlay draws can
+// be grabbed. The plug-in asks a cut's position control first, within a band of
+// 15 / viewScale^2 screen pixels of the cut; a Local cut's direction handle sits 10 x uiScale
+// screen pixels from the cut, grabbable 3 x uiScale either side. Below about 100 % zoom the
+// band is narrow and the density decides; closer in it widens with the square of the zoom and
+// the handles are drawn further out, clear of it by 4 screen pixels.
+double handleScale(double density, double viewScale);
+
 // The pointer position a viewer event carries: corner space in whole frame pixels.
 struct EventPosition {
   int32_t x = 0;

@@ -192,15 +192,29 @@ bool ViewerSession::redo() {
   return event("redo", [&] { return engine_->redoSteps(1); }).result == 1;
 }
 
-bool ViewerSession::renderIfChanged() {
+int32_t ViewerSession::previewDivisor() const {
+  // Each halving of the size takes about three quarters of the render's time away.
+  constexpr double kPreviewBudget = 0.040;
+  for (int32_t divisor : {1, 2})
+    if (lastFullRenderSeconds_ / (divisor * divisor) <= kPreviewBudget) return divisor;
+  return 4;
+}
+
+bool ViewerSession::renderIfChanged(bool preview) {
+  const int32_t divisor = preview ? previewDivisor() : 1;
   std::vector<refhost::ParamState> now = snapshot();
-  if (renderedFrame_ == frame_ && now == shown_) return false;
+  if (renderedFrame_ == frame_ && now == shown_ && renderedDivisor_ == divisor) return false;
   shown_ = std::move(now);
   renderedFrame_ = frame_;
+  renderedDivisor_ = divisor;
   Clock::time_point start = Clock::now();
-  attempt("render of frame " + std::to_string(frame_), [&] { picture_ = engine_->render(frame_); });
-  stats_.renderSeconds += secondsSince(start);
+  attempt("render of frame " + std::to_string(frame_),
+          [&] { picture_ = engine_->renderPreview(frame_, divisor); });
+  const double seconds = secondsSince(start);
+  if (divisor == 1) lastFullRenderSeconds_ = seconds;
+  stats_.renderSeconds += seconds;
   ++stats_.renders;
+  if (divisor > 1) ++stats_.previews;
   return true;
 }
 

@@ -20,7 +20,8 @@
 namespace veltrane_viewer {
 
 struct ViewerStats {
-  int renders = 0;  // message 10
+  int renders = 0;   // message 10
+  int previews = 0;  // those of them at a preview size
   double renderSeconds = 0;
   int overlays = 0;  // message 1003
   double overlaySeconds = 0;
@@ -71,11 +72,18 @@ class ViewerSession {
   bool undo();
   bool redo();
 
-  // Renders (12, 10) when a parameter or the frame number changed since the last render; true
-  // when it did. The picture stays until the next render.
-  bool renderIfChanged();
-  // The rendered frame's texture (frame-sized, RGBA8), 0 before the first render succeeded.
+  // Renders when a parameter or the frame number changed since the last render, or the picture
+  // shown is a preview of another size; true when it did. With `preview`, at the size a frame
+  // takes at most about 40 ms at (half or a quarter of the frame, judged by the last full
+  // render), else at full size. The picture stays until the next render.
+  bool renderIfChanged(bool preview = false);
+  // The rendered frame's texture, 0 before the first render succeeded, and its size (the
+  // frame's, or a preview's).
   uint32_t pictureTexture() const { return picture_ ? picture_->context().output.id : 0; }
+  int32_t pictureWidth() const { return picture_ ? picture_->context().width : 0; }
+  int32_t pictureHeight() const { return picture_ ? picture_->context().height : 0; }
+  // How much smaller than the frame a preview is rendered: 1, 2 or 4.
+  int32_t previewDivisor() const;
   // Draws the overlay (1003) into the texture, which has the given size.
   void drawOverlay(uint32_t texture, int32_t width, int32_t height);
 
@@ -115,6 +123,8 @@ class ViewerSession {
   refhost::ViewerSettings viewer_;
   int32_t frame_ = 0;
   int32_t renderedFrame_ = -1;
+  int32_t renderedDivisor_ = 1;
+  double lastFullRenderSeconds_ = 0;
   std::unique_ptr<refhost::RenderFrame> picture_;
   std::vector<refhost::ParamState> shown_;  // the values of the picture on screen
   std::vector<refhost::ParamState> saved_;

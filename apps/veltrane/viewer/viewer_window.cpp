@@ -25,6 +25,8 @@ namespace veltrane_viewer {
 namespace {
 
 constexpr double kWheelZoomStep = 1.15;
+// A dragging pointer that has not moved for this long rests: the frame is rendered at full size.
+constexpr double kRestSeconds = 0.2;
 
 class ViewerWindow {
  public:
@@ -50,6 +52,10 @@ class ViewerWindow {
   void onKey(const InputEvent& event);
   bool onViewerKey(int key, int mods);
   Point2 toPixel(double windowX, double windowY) const;
+  Point2 areaCentre() const {
+    const PixelRect& area = mapping_.area();
+    return {area.x + area.width / 2, area.y + area.height / 2};
+  }
   bool overPicture(Point2 pixel) const;
   EventPosition eventAt(Point2 pixel) const;
   void updateView();
@@ -64,6 +70,11 @@ class ViewerWindow {
   int32_t chooseFromMenu(const std::string& items);
   ChromeState chromeState() const;
   void want(int frames) { pendingFrames_ = std::max(pendingFrames_, frames); }
+  // Frames are rendered at a preview size while a handle is dragged (until the pointer rests)
+  // or the timeline plays, and at full size otherwise.
+  bool previewing() const {
+    return playing_ || (dragging_ && glfwGetTime() - lastDragMove_ < kRestSeconds);
+  }
   void printStats() const;
 
   const veltrane_cli::Scene& scene_;
@@ -107,6 +118,7 @@ class ViewerWindow {
   int dragFrames_ = 0;
   double dragSeconds_ = 0;
   double dragStart_ = 0;
+  double lastDragMove_ = -1e9;
 };
 
 ViewerWindow::ViewerWindow(const veltrane_cli::Scene& scene, const ViewOptions& options)
@@ -165,7 +177,7 @@ void ViewerWindow::run() {
     updateView();
     processEvents();
     advancePlayback();
-    if (session_->renderIfChanged()) want(1);
+    if (session_->renderIfChanged(previewing())) want(1);
     if (session_->takeRedrawRequest()) want(1);
     updateCursor();
     if (pendingFrames_ > 0) {
@@ -188,6 +200,9 @@ void ViewerWindow::waitForEvents() {
     double next = playStartTime_ + (session_->frame() - playStartFrame_ + 1) /
                                        std::max(scene_.composition.frameRate, 0.001);
     glfwWaitEventsTimeout(std::max(next - glfwGetTime(), 0.0));
+  } else if (previewing()) {
+    // Woken when the pointer comes to rest, to show the frame at full size.
+    glfwWaitEventsTimeout(std::max(lastDragMove_ + kRestSeconds - glfwGetTime(), 0.0));
   } else {
     glfwWaitEvents();
   }
@@ -211,7 +226,7 @@ EventPosition ViewerWindow::eventAt(Point2 pixel) const {
 }
 
 void ViewerWindow::updateView() {
-  session_->setView(mapping_.viewScale(), uiScale_,
+  session_->setView(mapping_.viewScale(), handleScale(uiScale_, mapping_.viewScale()),
                     mapping_.projection(framebufferWidth_, framebufferHeight_));
 }
 
@@ -250,6 +265,7 @@ void ViewerWindow::onMove(const InputEvent& event) {
     want(1);
   } else if (buttonInPicture_) {
     session_->pointerMove(eventAt(pixel), true);
+    lastDragMove_ = glfwGetTime();
   } else if (overPicture(pixel)) {
     session_->pointerMove(eventAt(pixel), false);
   }
@@ -309,6 +325,14 @@ bool ViewerWindow::onViewerKey(int key, int mods) {
     case GLFW_KEY_1:
     case GLFW_KEY_KP_1:
       mapping_.showActualPixels();
+      break;
+    case GLFW_KEY_EQUAL:  // "+" without Shift, as editors take it
+    case GLFW_KEY_KP_ADD:
+      mapping_.zoomAbout(areaCentre(), 2);
+      break;
+    case GLFW_KEY_MINUS:
+    case GLFW_KEY_KP_SUBTRACT:
+      mapping_.zoomAbout(areaCentre(), 0.5);
       break;
     case GLFW_KEY_SPACE:
       setPlaying(!playing_);
@@ -396,11 +420,11 @@ void ViewerWindow::drawFrame() {
       area.height != shown.height)
     mapping_.setArea(area);
   updateView();
-  session_->renderIfChanged();
+  session_->renderIfChanged(previewing());
 
   canvas_->resize(framebufferWidth_, framebufferHeight_);
-  canvas_->showPicture(session_->pictureTexture(), scene_.composition.width,
-                       scene_.composition.height, mapping_.frameRect());
+  canvas_->showPicture(session_->pictureTexture(), session_->pictureWidth(),
+                       session_->pictureHeight(), mapping_.frameRect());
   session_->drawOverlay(canvas_->texture(), framebufferWidth_, framebufferHeight_);
   canvas_->present();
   glViewport(0, 0, framebufferWidth_, framebufferHeight_);
@@ -506,11 +530,11 @@ void ViewerWindow::printStats() const {
   std::printf(
       "frames: %d rendered again (%.1f ms from input to screen), %d with only the overlay "
       "redrawn (%.1f ms); message 10 with 12: %.1f ms, message 1003: %.1f ms; while dragging: "
-      "%d frames in %.2f s, %.1f per second\n",
+      "%d frames in %.2f s, %.1f per second; %d of %d renders at a preview size\n",
       rendered_.count, each(rendered_.seconds, rendered_.count), overlayOnly_.count,
       each(overlayOnly_.seconds, overlayOnly_.count), each(stats.renderSeconds, stats.renders),
       each(stats.overlaySeconds, stats.overlays), dragFrames_, dragSeconds_,
-      dragSeconds_ > 0 ? dragFrames_ / dragSeconds_ : 0.0);
+      dragSeconds_ > 0 ? dragFrames_ / dragSeconds_ : 0.0, stats.previews, stats.renders);
 }
 
 }  // namespace
