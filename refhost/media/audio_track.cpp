@@ -1,12 +1,13 @@
-// Demuxing the source's audio over the rendered frames' time and muxing it into the output:
-// packets as they are when the container takes the codec, else decoded, cut to the sample and
-// encoded as AAC.
+// Demuxing a file's audio over the rendered frames' time and muxing it into the output: packets
+// as they are when the container takes the codec, else decoded, cut to the sample and encoded
+// with the first of AAC, Opus and Vorbis the container takes.
 #include "refhost/media/audio_track.h"
 
 extern "C" {
 #include <libavcodec/avcodec.h>
 #include <libavformat/avformat.h>
 #include <libavutil/audio_fifo.h>
+#include <libavutil/samplefmt.h>
 #include <libswresample/swresample.h>
 }
 
@@ -25,13 +26,32 @@ double seconds(int64_t timestamp, AVRational base) {
   return static_cast<double>(timestamp) * av_q2d(base);
 }
 
-// The encoder's rate nearest the source's (AAC knows a fixed set of rates).
-int aacRate(const AVCodec* encoder, int wanted) {
+// The encoder's rate nearest the source's (AAC and Opus know fixed sets of rates).
+int nearestRate(const AVCodec* encoder, int wanted) {
   if (!encoder->supported_samplerates) return wanted;
   int best = encoder->supported_samplerates[0];
   for (const int* rate = encoder->supported_samplerates; *rate; ++rate)
     if (std::abs(*rate - wanted) < std::abs(best - wanted)) best = *rate;
   return best;
+}
+
+// The encoder for sound the container cannot take as it is: AAC, the usual one, where the
+// container holds it; WebM holds only Opus and Vorbis.
+const AVCodec* soundEncoderFor(const AVOutputFormat* muxer) {
+  for (const char* name : {"aac", "libopus", "libvorbis"}) {
+    const AVCodec* codec = avcodec_find_encoder_by_name(name);
+    if (codec && avformat_query_codec(muxer, codec->id, FF_COMPLIANCE_NORMAL) == 1) return codec;
+  }
+  return nullptr;
+}
+
+// Planar float where the encoder takes it (AAC, Vorbis), else its first sample format (Opus
+// takes interleaved samples only).
+AVSampleFormat sampleFormatFor(const AVCodec* encoder) {
+  if (!encoder->sample_fmts) return AV_SAMPLE_FMT_FLTP;
+  for (const AVSampleFormat* format = encoder->sample_fmts; *format != AV_SAMPLE_FMT_NONE; ++format)
+    if (*format == AV_SAMPLE_FMT_FLTP) return *format;
+  return encoder->sample_fmts[0];
 }
 
 }  // namespace
@@ -81,21 +101,19 @@ struct AudioTrack::State {
     if (result < 0) fail(what, result);
   }
 
-  // The clip's span in the source's seconds: from the moment the video shows its frame
-  // `firstFrame` (at its own rate, from its own start) for the output's duration.
+  // The clip's span in the source's timestamps: from its start, which is where the video
+  // shows its first frame when there is a video (as the video reader counts), else where the
+  // file starts.
   void findClip(const AudioClip& clip) {
-    int video = av_find_best_stream(input, AVMEDIA_TYPE_VIDEO, -1, -1, nullptr, 0);
-    double videoStart = 0, videoRate = clip.frameRate;
-    if (video >= 0) {
-      AVStream* stream = input->streams[video];
-      AVRational rate =
-          stream->avg_frame_rate.num > 0 ? stream->avg_frame_rate : stream->r_frame_rate;
-      if (rate.num > 0 && rate.den > 0) videoRate = av_q2d(rate);
-      if (stream->start_time != AV_NOPTS_VALUE)
-        videoStart = seconds(stream->start_time, stream->time_base);
+    const int video = av_find_best_stream(input, AVMEDIA_TYPE_VIDEO, -1, -1, nullptr, 0);
+    double origin = 0;
+    if (video >= 0 && input->streams[video]->start_time != AV_NOPTS_VALUE) {
+      origin = seconds(input->streams[video]->start_time, input->streams[video]->time_base);
+    } else if (input->start_time != AV_NOPTS_VALUE) {
+      origin = seconds(input->start_time, AV_TIME_BASE_Q);
     }
-    start = videoStart + clip.firstFrame / videoRate;
-    end = start + clip.frameCount / (clip.frameRate > 0 ? clip.frameRate : 25.0);
+    start = origin + clip.startSeconds;
+    end = start + std::max(clip.seconds, 0.0);
   }
 
   void write(AVPacket* out) {
@@ -111,10 +129,10 @@ struct AudioTrack::State {
 
   void openEncode() {
     const AVCodec* decoding = avcodec_find_decoder(source->codecpar->codec_id);
-    const AVCodec* encoding = avcodec_find_encoder(AV_CODEC_ID_AAC);
+    const AVCodec* encoding = soundEncoderFor(output->oformat);
     if (!decoding)
       fail(std::string("no decoder for ") + avcodec_get_name(source->codecpar->codec_id));
-    if (!encoding) fail("no AAC encoder");
+    if (!encoding) fail(std::string("no sound encoder for a ") + output->oformat->name + " file");
     decoder = avcodec_alloc_context3(decoding);
     encoder = avcodec_alloc_context3(encoding);
     decoded = av_frame_alloc();
@@ -124,8 +142,8 @@ struct AudioTrack::State {
     decoder->pkt_timebase = source->time_base;
     check(avcodec_open2(decoder, decoding, nullptr), "the decoder refused");
 
-    encoder->sample_fmt = AV_SAMPLE_FMT_FLTP;
-    encoder->sample_rate = aacRate(encoding, decoder->sample_rate);
+    encoder->sample_fmt = sampleFormatFor(encoding);
+    encoder->sample_rate = nearestRate(encoding, decoder->sample_rate);
     if (decoder->ch_layout.order == AV_CHANNEL_ORDER_UNSPEC) {
       av_channel_layout_default(&encoder->ch_layout, decoder->ch_layout.nb_channels);
     } else {
@@ -134,7 +152,8 @@ struct AudioTrack::State {
     encoder->bit_rate = 64000 * std::max(encoder->ch_layout.nb_channels, 2);
     encoder->time_base = AVRational{1, encoder->sample_rate};
     if (output->oformat->flags & AVFMT_GLOBALHEADER) encoder->flags |= AV_CODEC_FLAG_GLOBAL_HEADER;
-    check(avcodec_open2(encoder, encoding, nullptr), "the AAC encoder refused");
+    check(avcodec_open2(encoder, encoding, nullptr),
+          (std::string("the ") + encoding->name + " encoder refused").c_str());
     check(avcodec_parameters_from_context(target->codecpar, encoder), "codec data");
     target->time_base = encoder->time_base;
 
@@ -178,10 +197,15 @@ struct AudioTrack::State {
   }
 
   void padSilence(int64_t samples) {
-    std::vector<float> zeros(static_cast<std::size_t>(samples));
-    std::vector<void*> planes(static_cast<std::size_t>(encoder->ch_layout.nb_channels),
-                              zeros.data());
-    av_audio_fifo_write(fifo, planes.data(), static_cast<int>(samples));
+    const int channels = encoder->ch_layout.nb_channels;
+    uint8_t** data = nullptr;
+    check(av_samples_alloc_array_and_samples(&data, nullptr, channels, static_cast<int>(samples),
+                                             encoder->sample_fmt, 0),
+          "out of memory");
+    av_samples_set_silence(data, 0, static_cast<int>(samples), channels, encoder->sample_fmt);
+    av_audio_fifo_write(fifo, reinterpret_cast<void**>(data), static_cast<int>(samples));
+    av_freep(&data[0]);
+    av_freep(&data);
   }
 
   // Converts a decoded frame and keeps the part of it inside the clip.
@@ -212,8 +236,12 @@ struct AudioTrack::State {
     const int64_t first = std::max<int64_t>(0, -cursor);
     const int64_t last = std::min<int64_t>(result, total - cursor);
     if (last > first) {
-      std::vector<void*> planes(static_cast<std::size_t>(encoder->ch_layout.nb_channels));
-      const int bytes = av_get_bytes_per_sample(encoder->sample_fmt);
+      // A plane a channel, or one plane of every channel's samples in turn.
+      const bool planar = av_sample_fmt_is_planar(encoder->sample_fmt);
+      const int channels = encoder->ch_layout.nb_channels;
+      std::vector<void*> planes(static_cast<std::size_t>(planar ? channels : 1));
+      const int64_t bytes = av_get_bytes_per_sample(encoder->sample_fmt) *
+                            static_cast<int64_t>(planar ? 1 : channels);
       for (std::size_t c = 0; c < planes.size(); ++c)
         planes[c] = converted->extended_data[c] + first * bytes;
       av_audio_fifo_write(fifo, planes.data(), static_cast<int>(last - first));
@@ -290,6 +318,7 @@ std::unique_ptr<AudioTrack> AudioTrack::open(const AudioClip& clip, AVFormatCont
           "cannot open the file");
   s.check(avformat_find_stream_info(s.input, nullptr), "no stream info");
   const int index = av_find_best_stream(s.input, AVMEDIA_TYPE_AUDIO, -1, -1, nullptr, 0);
+  if (index < 0 && clip.required) s.fail("it has no sound");
   if (index < 0) return nullptr;
   s.source = s.input->streams[index];
   s.findClip(clip);

@@ -1,5 +1,6 @@
-// The sound of a video source carried into a rendered video: the audio of the frames rendered,
-// stream-copied where the output container takes its codec, else encoded as AAC.
+// Sound carried into a rendered video: the audio of a file over the time of the frames
+// rendered, stream-copied where the output container takes its codec, else encoded as AAC (as
+// Opus where the container takes no AAC, as WebM).
 #pragma once
 
 #include <cstdint>
@@ -10,21 +11,23 @@ struct AVFormatContext;
 
 namespace refhost {
 
-// Which sound a render carries: the audio of `path` from the moment its frame `firstFrame` is
-// shown (at the file's own frame rate), lasting `frameCount` frames of the output at
-// `frameRate`. An empty path carries none.
+// Which sound a render carries: the audio of `path` from `startSeconds` after the file's start
+// (the start of its video, when it has one, so that sound and pictures keep the file's own
+// alignment) for `seconds`. Going by time rather than by the file's frames keeps the sound in
+// step with frames rendered at any rate. An empty path carries none.
 struct AudioClip {
   std::string path;
-  int32_t firstFrame = 0;
-  int32_t frameCount = 0;
-  double frameRate = 25.0;
+  double startSeconds = 0;
+  double seconds = 0;
+  // The sound was asked for by name: a file without any is an error, not a silent video.
+  bool required = false;
 };
 
 class AudioTrack {
  public:
   // Adds the clip's audio as a stream of `output` (before its header is written). Null when the
-  // file has no audio track. Throws std::runtime_error naming the file when it has one that
-  // cannot be carried.
+  // file has no audio track and the clip does not require one. Throws std::runtime_error
+  // naming the file when it has one that cannot be carried, or none that is required.
   static std::unique_ptr<AudioTrack> open(const AudioClip& clip, AVFormatContext* output);
   ~AudioTrack();
   AudioTrack(const AudioTrack&) = delete;

@@ -17,8 +17,8 @@ namespace refhost {
 namespace {
 
 struct ImageModule {
-  RefhostReadImage read = nullptr;
-  RefhostEncodeImage encode = nullptr;
+  RefhostReadPicture read = nullptr;
+  RefhostEncodePicture encode = nullptr;
   std::string failure;  // why the module could not be loaded
 };
 
@@ -48,9 +48,9 @@ const ImageModule& imageModule() {
         reasons += std::string(reasons.empty() ? "" : "; ") + (reason ? reason : path);
         continue;
       }
-      module.read = reinterpret_cast<RefhostReadImage>(dlsym(handle, REFHOST_READ_IMAGE_SYMBOL));
+      module.read = reinterpret_cast<RefhostReadPicture>(dlsym(handle, REFHOST_READ_IMAGE_SYMBOL));
       module.encode =
-          reinterpret_cast<RefhostEncodeImage>(dlsym(handle, REFHOST_ENCODE_IMAGE_SYMBOL));
+          reinterpret_cast<RefhostEncodePicture>(dlsym(handle, REFHOST_ENCODE_IMAGE_SYMBOL));
       if (module.read && module.encode) return;
       reasons += (reasons.empty() ? "" : "; ") + path + " lacks the image functions";
     }
@@ -72,35 +72,48 @@ const ImageModule& requireModule(const std::string& path, const char* what) {
 RgbaImage readImageFile(const std::string& path) {
   const ImageModule& module = requireModule(path, "read image");
   char error[512] = {};
-  int32_t width = 0, height = 0;
-  uint8_t* pixels = nullptr;
-  if (module.read(path.c_str(), &width, &height, &pixels, error, sizeof error) != 0)
+  int32_t width = 0, height = 0, halfFloats = 0;
+  void* pixels = nullptr;
+  if (module.read(path.c_str(), &width, &height, &halfFloats, &pixels, error, sizeof error) != 0)
     throw std::runtime_error(path + ": cannot read image: " + error);
   RgbaImage image;
   image.width = width;
   image.height = height;
-  image.pixels.assign(
-      pixels, pixels + static_cast<std::size_t>(width) * static_cast<std::size_t>(height) * 4);
+  image.format = halfFloats ? PixelFormat::RgbaHalf : PixelFormat::Rgba8;
+  const auto* first = static_cast<const uint8_t*>(pixels);
+  image.pixels.assign(first, first + static_cast<std::size_t>(width) *
+                                         static_cast<std::size_t>(height) *
+                                         bytesPerPixel(image.format));
   std::free(pixels);
   return image;
 }
 
 std::vector<uint8_t> encodeImage(const RgbaImage& image, ImageFormat format,
-                                 const std::string& shownName) {
+                                 const std::string& shownName, int32_t bitDepth) {
   const ImageModule& module = requireModule(shownName, "write image");
+  if (format == ImageFormat::Png && bitDepth != 8 && bitDepth != 16)
+    throw std::runtime_error(shownName + ": cannot write image: a PNG holds 8 or 16 bits, not " +
+                             std::to_string(bitDepth));
+  // Half floats go to 8 bits by the host's own rounding, the one every 8-bit picture gets.
+  const bool toBytes =
+      format == ImageFormat::Png && bitDepth == 8 && image.format == PixelFormat::RgbaHalf;
+  const RgbaImage bytesOfHalf = toBytes ? converted(image, PixelFormat::Rgba8) : RgbaImage();
+  const RgbaImage& source = toBytes ? bytesOfHalf : image;
   char error[512] = {};
   uint8_t* bytes = nullptr;
   std::size_t size = 0;
-  if (module.encode(format == ImageFormat::Png ? 0 : 1, image.width, image.height,
-                    image.pixels.data(), &bytes, &size, error, sizeof error) != 0)
+  if (module.encode(format == ImageFormat::Png ? 0 : 1, bitDepth, source.width, source.height,
+                    source.format == PixelFormat::RgbaHalf ? 1 : 0, source.pixels.data(), &bytes,
+                    &size, error, sizeof error) != 0)
     throw std::runtime_error(shownName + ": cannot write image: " + error);
   std::vector<uint8_t> encoded(bytes, bytes + size);
   std::free(bytes);
   return encoded;
 }
 
-void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format) {
-  std::vector<uint8_t> bytes = encodeImage(image, format, path);
+void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format,
+                    int32_t bitDepth) {
+  std::vector<uint8_t> bytes = encodeImage(image, format, path, bitDepth);
   writeFileContents(path, path, bytes.data(), bytes.size());
 }
 

@@ -1,6 +1,7 @@
 // Still images for the Windows host through the header-only stb readers and writer: OpenImageIO
 // is not built for Windows. Reading takes what stb_image decodes (PNG, JPEG, BMP, TGA, GIF, PSD,
-// HDR, PIC, PNM); writing is PNG only.
+// HDR, PIC, PNM) as 8 bits a channel; writing is 8-bit PNG only, half-float pictures rounded to
+// bytes.
 #include <cstdlib>
 #include <stdexcept>
 
@@ -34,10 +35,12 @@ RgbaImage readImageFile(const std::string& path) {
   return image;
 }
 
-std::vector<uint8_t> encodeImage(const RgbaImage& image, ImageFormat format,
-                                 const std::string& shownName) {
-  if (format != ImageFormat::Png)
-    throw std::runtime_error(shownName + ": cannot write image: the Windows build writes PNG only");
+std::vector<uint8_t> encodeImage(const RgbaImage& picture, ImageFormat format,
+                                 const std::string& shownName, int32_t bitDepth) {
+  if (format != ImageFormat::Png || bitDepth != 8)
+    throw std::runtime_error(shownName +
+                             ": cannot write image: the Windows build writes 8-bit PNG only");
+  const RgbaImage image = converted(picture, PixelFormat::Rgba8);
   std::vector<uint8_t> bytes;
   const auto append = [](void* into, void* data, int size) {
     const auto* first = static_cast<const uint8_t*>(data);
@@ -50,8 +53,9 @@ std::vector<uint8_t> encodeImage(const RgbaImage& image, ImageFormat format,
   return bytes;
 }
 
-void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format) {
-  const std::vector<uint8_t> bytes = encodeImage(image, format, path);
+void writeImageFile(const RgbaImage& image, const std::string& path, ImageFormat format,
+                    int32_t bitDepth) {
+  const std::vector<uint8_t> bytes = encodeImage(image, format, path, bitDepth);
   writeFileContents(path, path, bytes.data(), bytes.size());
 }
 

@@ -53,7 +53,8 @@ class StillSink : public FrameSink {
   explicit StillSink(const OutputTarget& target) : target_(target), file_(target.path) {}
   void write(int32_t, const RgbaImage& picture) override {
     if (written_) throw std::runtime_error(target_.path + ": a still image holds one frame");
-    std::vector<uint8_t> bytes = encodeImage(picture, target_.imageFormat, target_.path);
+    std::vector<uint8_t> bytes =
+        encodeImage(picture, target_.imageFormat, target_.path, target_.imageBitDepth);
     file_.write(bytes.data(), bytes.size());
     written_ = true;
   }
@@ -78,7 +79,8 @@ class SequenceSink : public FrameSink {
     const std::string name = target_.frameName(frame);
     // Frames may come from several writers at once: each encodes its own and hands the bytes
     // over under the lock.
-    const std::vector<uint8_t> bytes = encodeImage(picture, target_.imageFormat, name);
+    const std::vector<uint8_t> bytes =
+        encodeImage(picture, target_.imageFormat, name, target_.imageBitDepth);
     std::lock_guard<std::mutex> lock(mutex_);
     files_.write(name, bytes.data(), bytes.size());
     names_[frame] = name;
@@ -105,7 +107,8 @@ class VideoSink : public FrameSink {
       : target_(target),
         file_(target.path),
         writer_(std::make_unique<VideoWriter>(file_.temporaryPath(), target.container, width,
-                                              height, frameRate, target.path, audio)) {}
+                                              height, frameRate, target.video, target.path,
+                                              audio)) {}
   ~VideoSink() override { writer_.reset(); }  // closes the file before the temporary goes
   void write(int32_t, const RgbaImage& picture) override { writer_->write(picture); }
   std::vector<std::string> commit() override {
@@ -151,14 +154,17 @@ OutputTarget parseOutputTarget(const std::string& path) {
   } else if (extension == "png" || extension == "exr") {
     target.kind = OutputKind::Still;
     target.imageFormat = imageFormatOf(extension);
-  } else if (extension == "mp4" || extension == "mov" || extension == "mkv") {
+  } else if (extension == "mp4" || extension == "mov" || extension == "mkv" ||
+             extension == "webm") {
     target.kind = OutputKind::Video;
     target.container = extension == "mp4"   ? VideoContainer::Mp4
                        : extension == "mov" ? VideoContainer::Mov
-                                            : VideoContainer::Mkv;
+                       : extension == "mkv" ? VideoContainer::Mkv
+                                            : VideoContainer::Webm;
+    target.video = encodingFor(defaultCodec(target.container));
   } else {
     throw std::invalid_argument(
-        "the output name ends in .png, .exr, .mp4, .mov or .mkv, or is a "
+        "the output name ends in .png, .exr, .mp4, .mov, .mkv or .webm, or is a "
         "pattern with %04d ending in .png or .exr; got '" +
         path + "'");
   }

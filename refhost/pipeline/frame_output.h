@@ -1,5 +1,6 @@
-// Where a render's frames go: one still image (PNG or EXR), a numbered image sequence, or a
-// video file. Everything is written under temporary names and moved into place at the end.
+// Where a render's frames go and how they are written: one still image (PNG or EXR), a
+// numbered image sequence, or a video file with its encoding. Everything is written under
+// temporary names and moved into place at the end.
 #pragma once
 
 #include <cstdint>
@@ -20,7 +21,9 @@ struct OutputTarget {
   OutputKind kind = OutputKind::Still;
   std::string path;  // a sequence's path holds its frame-number pattern
   ImageFormat imageFormat = ImageFormat::Png;
+  int32_t imageBitDepth = 8;  // a PNG's, 8 or 16; EXR is always half float
   VideoContainer container = VideoContainer::Mp4;
+  VideoEncoding video;  // a video's
 
   // A sequence's file name for the frame: the pattern's %0Nd (or %d) replaced by the number,
   // zero-padded to N digits.
@@ -28,14 +31,15 @@ struct OutputTarget {
 };
 
 // By the name: a pattern with one %0Nd or %d in the file name (not a folder's) and ending in
-// .png or .exr is a sequence; .png and .exr alone are stills; .mp4, .mov and .mkv are videos
-// (letter case ignored). Throws std::invalid_argument saying what was expected.
+// .png or .exr is a sequence; .png and .exr alone are stills; .mp4, .mov, .mkv and .webm are
+// videos (letter case ignored), encoded as the container's default codec is (defaultCodec()).
+// Throws std::invalid_argument saying what was expected.
 OutputTarget parseOutputTarget(const std::string& path);
 
 class FrameSink {
  public:
   virtual ~FrameSink() = default;  // deletes whatever was not committed
-  // A picture of the sink's size, top row first.
+  // A picture of the sink's size, top row first, in either pixel format.
   virtual void write(int32_t frame, const RgbaImage& picture) = 0;
   // The same for a picture the caller is done with; a sink that keeps pictures takes it over.
   virtual void write(int32_t frame, RgbaImage&& picture) { write(frame, std::as_const(picture)); }
@@ -48,8 +52,9 @@ class FrameSink {
   virtual bool concurrentWrites() const { return false; }
 };
 
-// Throws std::runtime_error naming the file when it cannot be created. A video carries the
-// audio clip's sound, if it has any.
+// Throws std::runtime_error naming the file when it cannot be created (std::invalid_argument
+// for a video encoding refusalOf() refuses). A video carries the audio clip's sound, if it has
+// any.
 std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
                                          double frameRate, const AudioClip& audio = {});
 

@@ -1,5 +1,5 @@
-// Encodes RGBA frames into a video file with FFmpeg's libraries: H.264 through libx264 where
-// the libraries have it, else the container's own default video encoder.
+// Encodes RGBA frames, 8-bit or half-float, into a video file with FFmpeg's libraries, with the
+// codec, quality, bit depth and colour of a VideoEncoding.
 #pragma once
 
 #include <cstdint>
@@ -8,32 +8,36 @@
 
 #include "refhost/media/audio_track.h"
 #include "refhost/media/rgba_image.h"
+#include "refhost/pipeline/video_encoding.h"
 
 namespace refhost {
-
-enum class VideoContainer { Mp4, Mov, Mkv };
 
 class VideoWriter {
  public:
   // Opens the file for frames of the size at the rate (frames per second), written as the
-  // container whatever the path's name. 4:2:0 video needs even sizes: an odd width or height
-  // is padded by repeating the last column or row. Throws std::runtime_error naming the file
-  // by `shownName` when given (the user's name for a file written under a temporary one), else
-  // by the path. With an audio clip, the file carries its sound too (see AudioClip).
+  // container whatever the path's name. Chroma-subsampled video needs even sizes: an odd width
+  // or height is padded by repeating the last column or row. Throws std::invalid_argument for
+  // settings refusalOf() refuses, std::runtime_error for the rest, naming the file by
+  // `shownName` when given (the user's name for a file written under a temporary one), else by
+  // the path. With an audio clip, the file carries its sound too (see AudioClip).
   VideoWriter(const std::string& path, VideoContainer container, int32_t width, int32_t height,
-              double frameRate, const std::string& shownName = "", const AudioClip& audio = {});
+              double frameRate, const VideoEncoding& encoding, const std::string& shownName = "",
+              const AudioClip& audio = {});
   // Without finish() the file is closed as it is (unplayable); the caller deletes it.
   ~VideoWriter();
   VideoWriter(const VideoWriter&) = delete;
   VideoWriter& operator=(const VideoWriter&) = delete;
 
-  // A picture of the writer's size, top row first.
+  // A picture of the writer's size, top row first, in either pixel format: 8-bit pictures are
+  // converted from their bytes, half-float ones through 16 bits a channel, whatever the depth
+  // of the video.
   void write(const RgbaImage& frame);
   // Flushes the encoder and completes the file.
   void finish();
 
+  // The FFmpeg encoder writing the video ("libx264", "libsvtav1", ...).
   const std::string& codecName() const;
-  // Empty, or why the encoder is not libx264.
+  // Empty, or something the user should know about how the video was written.
   const std::string& note() const;
 
  private:

@@ -6,10 +6,14 @@ namespace refhost {
 
 [[noreturn]] void videoUnavailable(const std::string& path);
 
+// Without FFmpeg there is no muxer to ask. Saying yes lets a video output reach the writer,
+// whose message says why there is no video at all.
+bool containerHolds(VideoContainer, const std::string&) { return true; }
+
 struct VideoWriter::Encoder {};
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer, int32_t, int32_t, double,
-                         const std::string&, const AudioClip&) {
+                         const VideoEncoding&, const std::string&, const AudioClip&) {
   videoUnavailable(path);
 }
 VideoWriter::~VideoWriter() = default;

@@ -91,8 +91,8 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
       {{"render-everything"}, 2, "veltrane: unknown command 'render-everything'"},
       badRender({}, "needs -o OUT"),
       badRender({"-o", folder.file("x.jpg")},
-                "the output name ends in .png, .exr, .mp4, .mov or .mkv, or is a pattern with %04d "
-                "ending in .png or .exr; got '" +
+                "the output name ends in .png, .exr, .mp4, .mov, .mkv or .webm, or is a pattern "
+                "with %04d ending in .png or .exr; got '" +
                     folder.file("x.jpg") + "'"),
       badRender({"-o", folder.file("x.png"), "--frames", "0-3"}, "a .png output holds one frame"),
       badRender({"-o", out, "--frames", "4-2"}, "option '--frames' expects A <= B, got '4-2'"),

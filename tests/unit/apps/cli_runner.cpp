@@ -3,6 +3,7 @@
 
 #include <unistd.h>
 
+#include <cstdio>
 #include <fstream>
 #include <iterator>
 
@@ -14,6 +15,16 @@ extern char** environ;
 std::string slurp(const std::string& path) {
   std::ifstream file(path);
   return std::string(std::istreambuf_iterator<char>(file), {});
+}
+
+std::string commandOutput(const std::string& command) {
+  std::string text;
+  if (FILE* pipe = popen(command.c_str(), "r")) {
+    char buffer[4096];
+    for (std::size_t n; (n = fread(buffer, 1, sizeof buffer, pipe)) > 0;) text.append(buffer, n);
+    pclose(pipe);
+  }
+  return text;
 }
 
 void writeText(const std::string& path, const std::string& text) {

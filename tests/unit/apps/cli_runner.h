@@ -24,6 +24,8 @@ CliRun runCli(const std::vector<std::string>& args, const char* plugin = VELTRAN
               const std::function<void(int)>& whileRunning = nullptr);
 
 std::string slurp(const std::string& path);
+// What a shell command (ffprobe, ffmpeg) prints on stdout.
+std::string commandOutput(const std::string& command);
 void writeText(const std::string& path, const std::string& text);
 
 extern const char kLayerA[];

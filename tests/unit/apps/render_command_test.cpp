@@ -33,8 +33,11 @@ TEST(RenderCommand, StillsAreUpright) {
 TEST(RenderCommand, EveryOutputKindCarriesTheFramesAskedInOrder) {
   ScratchDirectory folder;
   std::string scene = writeScene(folder, smallScene("counter", 30));
+  // EXR stills come back as half floats.
   auto code = [](const refhost::RgbaImage& image) {
-    return static_cast<int>(refhost::readCounterCode(image).value_or(9999));
+    return static_cast<int>(
+        refhost::readCounterCode(refhost::converted(image, refhost::PixelFormat::Rgba8))
+            .value_or(9999));
   };
   CliRun still = runCli({"render", scene, "-o", folder.file("f.exr"), "--frame", "5"});
   ASSERT_EQ(still.status, 0) << still.err;

@@ -1,12 +1,17 @@
-// Media on disk: stills written and read back exactly, small videos encoded and decoded frame
-// by frame by index, damaged ones failing at the first frame they cannot give, and the kinds of
-// output their names choose. (What appears on disk, and when, is checked through the command
-// line.)
+// Media on disk: stills written and read back exactly or within their depth's precision,
+// small videos encoded and decoded frame by frame by index, deep pictures keeping more than 8
+// bits through a 10-bit video, damaged videos failing at the first frame they cannot give, and
+// the kinds of output their names choose. (What appears on disk, and when, is checked through
+// the command line.)
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <cstring>
 #include <fstream>
 #include <iterator>
+#include <set>
 
 #include "refhost/media/image_files.h"
 #include "refhost/media/media_source.h"
@@ -21,15 +26,41 @@ namespace {
 
 using testsupport::ScratchDirectory;
 
-// Counter frames first .. first + frames - 1 at 25 fps, encoded with the codec every container
-// gets.
+// Counter frames first .. first + frames - 1 at 25 fps, handed over as `pictures` and encoded
+// as H.264 unless told otherwise.
 void writeCounterVideo(const std::string& path, VideoContainer container, int32_t width,
-                       int32_t height, int32_t frames, int32_t first = 0) {
-  VideoWriter writer(path, container, width, height, 25.0);
-  EXPECT_EQ(writer.codecName(), "libx264") << writer.note();
+                       int32_t height, int32_t frames, int32_t first = 0,
+                       const VideoEncoding& encoding = encodingFor("h264"),
+                       PixelFormat pictures = PixelFormat::Rgba8) {
+  VideoWriter writer(path, container, width, height, 25.0, encoding);
   for (int32_t i = first; i < first + frames; ++i)
-    writer.write(generatePattern(Pattern::Counter, i, width, height));
+    writer.write(converted(generatePattern(Pattern::Counter, i, width, height), pictures));
   writer.finish();
+}
+
+// What a command prints on stdout, as bytes.
+std::string commandOutput(const std::string& command) {
+  std::string bytes;
+  if (FILE* pipe = popen(command.c_str(), "r")) {
+    char buffer[65536];
+    for (std::size_t n; (n = fread(buffer, 1, sizeof buffer, pipe)) > 0;) bytes.append(buffer, n);
+    pclose(pipe);
+  }
+  return bytes;
+}
+
+// Grey rising from black to white over `width` columns in steps a half float keeps apart,
+// opaque; the picture of `rows` rows.
+RgbaImage fineRamp(int32_t width, int32_t rows) {
+  RgbaImage ramp(width, rows, PixelFormat::RgbaHalf);
+  for (int32_t y = 0; y < rows; ++y) {
+    for (int32_t x = 0; x < width; ++x) {
+      const float value = static_cast<float>(x) / static_cast<float>(width - 1);
+      for (int c = 0; c < 3; ++c) ramp.setChannel(x, y, c, value);
+      ramp.setChannel(x, y, 3, 1.0f);
+    }
+  }
+  return ramp;
 }
 
 TEST(ImageFiles, StillsRoundTripExactlyAndStretchAsSources) {
@@ -37,13 +68,18 @@ TEST(ImageFiles, StillsRoundTripExactlyAndStretchAsSources) {
   RgbaImage image(32, 8);  // every byte value in some channel, alpha neither 0 nor 255
   for (std::size_t i = 0; i < image.pixels.size(); ++i)
     image.pixels[i] = static_cast<uint8_t>((i * 7 + i / 4) & 0xFF);
-  for (ImageFormat format : {ImageFormat::Png, ImageFormat::Exr}) {
+  // An 8-bit PNG comes back as the same bytes; an EXR as half floats that are the bytes / 255
+  // to the nearest half, so rounding back gives the bytes again.
+  const std::pair<ImageFormat, PixelFormat> formats[] = {{ImageFormat::Png, PixelFormat::Rgba8},
+                                                         {ImageFormat::Exr, PixelFormat::RgbaHalf}};
+  for (const auto& [format, readAs] : formats) {
     // The writer goes by the format, not the name: a temporary name has no useful ending.
     const std::string path = folder.file(format == ImageFormat::Png ? "still.tmp1" : "still.tmp2");
     writeImageFile(image, path, format);
     const RgbaImage back = readImageFile(path);
     EXPECT_EQ(back.width, 32);
-    EXPECT_EQ(back.pixels, image.pixels) << path;
+    EXPECT_EQ(back.format, readAs) << path;
+    EXPECT_EQ(converted(back, PixelFormat::Rgba8).pixels, image.pixels) << path;
   }
 
   writeImageFile(RgbaImage(2, 2, {10, 20, 30, 255}), folder.file("flat.png"), ImageFormat::Png);
@@ -62,6 +98,57 @@ TEST(ImageFiles, StillsRoundTripExactlyAndStretchAsSources) {
       EXPECT_NE(std::string(error.what()).find(bad), std::string::npos) << error.what();
     }
   }
+}
+
+// A ramp finer than 8 bits, with values beyond 0 and 1 at its ends, through each still format
+// and depth: deep files keep every step apart (read back as half floats), 8-bit ones hold 256
+// levels at most; a PNG clamps to 0 to 1 and rounds to its depth, an EXR keeps the halves.
+TEST(ImageFiles, DeepStillsKeepTheStepsOfHalfFloatPictures) {
+  ScratchDirectory folder;
+  RgbaImage ramp = fineRamp(1024, 2);
+  ramp.setChannel(0, 1, 0, -0.5f);
+  ramp.setChannel(1023, 1, 0, 1.5f);
+  const struct {
+    const char* name;
+    PixelFormat from;
+    ImageFormat format;
+    int32_t depth;
+    PixelFormat readAs;
+    float tolerance;  // of a value from 0 to 1 against the ramp's
+    std::size_t levels;
+  } cases[] = {
+      // A 16-bit step (1 / 65535) plus the half float's own rounding.
+      {"half16.png", PixelFormat::RgbaHalf, ImageFormat::Png, 16, PixelFormat::RgbaHalf,
+       1.0f / 65535 + 1.0f / 2048, 1024},
+      {"half8.png", PixelFormat::RgbaHalf, ImageFormat::Png, 8, PixelFormat::Rgba8, 0.5f / 255,
+       256},
+      {"half.exr", PixelFormat::RgbaHalf, ImageFormat::Exr, 8, PixelFormat::RgbaHalf, 0.0f, 1024},
+      {"bytes16.png", PixelFormat::Rgba8, ImageFormat::Png, 16, PixelFormat::RgbaHalf,
+       0.5f / 255 + 1.0f / 2048, 256},
+  };
+  for (const auto& c : cases) {
+    const RgbaImage picture = converted(ramp, c.from);
+    writeImageFile(picture, folder.file(c.name), c.format, c.depth);
+    const RgbaImage back = readImageFile(folder.file(c.name));
+    ASSERT_EQ(back.format, c.readAs) << c.name;
+    ASSERT_EQ(back.width, 1024) << c.name;
+    std::set<float> levels;
+    float worst = 0;
+    for (int32_t x = 0; x < 1024; ++x) {
+      levels.insert(back.channel(x, 0, 0));
+      for (int32_t y = 0; y < 2; ++y) {
+        for (int ch = 0; ch < 4; ++ch) {
+          const float held = ramp.channel(x, y, ch);
+          const float expected = c.format == ImageFormat::Exr ? held : std::clamp(held, 0.0f, 1.0f);
+          worst = std::max(worst, std::abs(back.channel(x, y, ch) - expected));
+        }
+      }
+    }
+    EXPECT_LE(worst, c.tolerance + 1e-6f) << c.name;
+    EXPECT_EQ(levels.size(), c.levels) << c.name;
+  }
+  EXPECT_THROW(writeImageFile(ramp, folder.file("x.png"), ImageFormat::Png, 10),
+               std::runtime_error);
 }
 
 // Twelve counter frames in each container, then frames asked in order and out of order.
@@ -85,12 +172,74 @@ TEST(VideoFiles, DecodedFrameNShowsCounterN) {
           << name << " " << index;
     EXPECT_EQ(readCounterCode(reader.frameAt(6 / 25.0, 2 * width, 2 * height)), 6) << name;
   }
-  // Odd sizes are padded to even ones.
-  writeCounterVideo(folder.file("odd.mp4"), VideoContainer::Mp4, 65, 37, 1, 3);
-  VideoReader reader(folder.file("odd.mp4"));
-  EXPECT_EQ(reader.info().width, 66);
-  EXPECT_EQ(reader.info().height, 38);
-  EXPECT_EQ(readCounterCode(reader.frameAt(0, 66, 38)), 3);
+  // Odd sizes are padded to even ones where the chroma is subsampled, from either kind of
+  // picture; full chroma keeps the size.
+  VideoEncoding h265 = encodingFor("h265"), ffv1 = encodingFor("ffv1");
+  h265.bitDepth = 10;
+  const struct {
+    const char* name;
+    VideoEncoding encoding;
+    PixelFormat pictures;
+    int32_t width, height;
+  } odd[] = {{"odd8.mkv", encodingFor("h264"), PixelFormat::Rgba8, 66, 38},
+             {"odd10.mkv", h265, PixelFormat::RgbaHalf, 66, 38},
+             {"odd.mkv", ffv1, PixelFormat::RgbaHalf, 65, 37}};
+  for (const auto& c : odd) {
+    writeCounterVideo(folder.file(c.name), VideoContainer::Mkv, 65, 37, 1, 3, c.encoding,
+                      c.pictures);
+    VideoReader reader(folder.file(c.name));
+    EXPECT_EQ(reader.info().width, c.width) << c.name;
+    EXPECT_EQ(reader.info().height, c.height) << c.name;
+    EXPECT_EQ(readCounterCode(reader.frameAt(0, c.width, c.height)), 3) << c.name;
+  }
+}
+
+// A ramp of 1024 steps through each kind of picture and video depth, lossless 4:4:4 so that
+// only the depth limits it: a half-float picture in a 10-bit video keeps far more levels than 8
+// bits can (decoded by ffmpeg to 16-bit grey), and 8-bit pictures and 8-bit videos stay within
+// 256. The right colour tags come with each.
+TEST(VideoFiles, TenBitVideoKeepsTheLevelsOfHalfFloatPictures) {
+  ScratchDirectory folder;
+  const RgbaImage ramp = fineRamp(1024, 4);
+  const struct {
+    const char* name;
+    PixelFormat picture;
+    int32_t depth;
+    std::size_t fewest, most;  // distinct grey levels along the ramp
+  } cases[] = {
+      // Limited range has some 877 luma levels in 10 bits, 220 in 8.
+      {"half10.mkv", PixelFormat::RgbaHalf, 10, 800, 1024},
+      {"bytes10.mkv", PixelFormat::Rgba8, 10, 200, 256},
+      {"half8.mkv", PixelFormat::RgbaHalf, 8, 200, 256},
+  };
+  for (const auto& c : cases) {
+    VideoEncoding encoding = encodingFor("ffv1");
+    encoding.bitDepth = c.depth;
+    const std::string path = folder.file(c.name);
+    VideoWriter writer(path, VideoContainer::Mkv, 1024, 4, 25.0, encoding);
+    writer.write(converted(ramp, c.picture));
+    writer.finish();
+    const std::string grey =
+        commandOutput("ffmpeg -v error -i " + path + " -f rawvideo -pix_fmt gray16le -");
+    ASSERT_EQ(grey.size(), 1024u * 4 * 2) << c.name;
+    std::set<uint16_t> levels;
+    for (std::size_t x = 0; x < 1024; ++x) {
+      uint16_t level;
+      std::memcpy(&level, &grey[x * 2], 2);
+      levels.insert(level);
+    }
+    EXPECT_GE(levels.size(), c.fewest) << c.name;
+    EXPECT_LE(levels.size(), c.most) << c.name;
+    EXPECT_EQ(commandOutput(
+                  "ffprobe -v error -show_entries stream=pix_fmt,color_space -of csv=p=0 " + path),
+              std::string(c.depth == 10 ? "yuv444p10le" : "yuv444p") + ",bt709\n")
+        << c.name;
+  }
+  // A setting the codec does not have is refused before any file is made.
+  VideoEncoding h264TenBit = encodingFor("h264");
+  h264TenBit.bitDepth = 10;
+  EXPECT_THROW(VideoWriter(folder.file("no.mp4"), VideoContainer::Mp4, 64, 36, 25.0, h264TenBit),
+               std::invalid_argument);
 }
 
 // A video whose index is intact but whose picture data is damaged past some point, as a copy
@@ -131,20 +280,28 @@ TEST(OutputTarget, NamesChooseTheKindOfOutput) {
     const char* path;
     OutputKind kind;
     ImageFormat format;
+    const char* codec;  // a video's default
+    int32_t bitDepth;
   } cases[] = {
-      {"out.png", OutputKind::Still, ImageFormat::Png},
-      {"dir/OUT.EXR", OutputKind::Still, ImageFormat::Exr},
-      {"frames/f_%04d.png", OutputKind::Sequence, ImageFormat::Png},
-      {"f%d.exr", OutputKind::Sequence, ImageFormat::Exr},
-      {"clip.mp4", OutputKind::Video, ImageFormat::Png},
-      {"clip.MKV", OutputKind::Video, ImageFormat::Png},
-      {"clip.mov", OutputKind::Video, ImageFormat::Png},
+      {"out.png", OutputKind::Still, ImageFormat::Png, "", 8},
+      {"dir/OUT.EXR", OutputKind::Still, ImageFormat::Exr, "", 8},
+      {"frames/f_%04d.png", OutputKind::Sequence, ImageFormat::Png, "", 8},
+      {"f%d.exr", OutputKind::Sequence, ImageFormat::Exr, "", 8},
+      {"clip.mp4", OutputKind::Video, ImageFormat::Png, "h264", 8},
+      {"clip.MKV", OutputKind::Video, ImageFormat::Png, "h264", 8},
+      {"clip.mov", OutputKind::Video, ImageFormat::Png, "prores", 10},
+      {"clip.webm", OutputKind::Video, ImageFormat::Png, "vp9", 8},
   };
   for (const auto& c : cases) {
     const OutputTarget target = parseOutputTarget(c.path);
     EXPECT_EQ(target.kind, c.kind) << c.path;
     if (c.kind != OutputKind::Video) {
       EXPECT_EQ(target.imageFormat, c.format) << c.path;
+      EXPECT_EQ(target.imageBitDepth, c.bitDepth) << c.path;
+    } else {
+      EXPECT_EQ(target.video.codec, c.codec) << c.path;
+      EXPECT_EQ(target.video.bitDepth, c.bitDepth) << c.path;
+      EXPECT_EQ(target.video.colour, ColourDescription::bt709()) << c.path;
     }
   }
   for (const char* bad : {"out.jpg", "out", "f_%04d.mp4", "f_%s.png", "f_%04d_%04d.png",
