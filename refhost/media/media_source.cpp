@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cctype>
 #include <cmath>
+#include <cstring>
 
 #include "refhost/media/image_files.h"
 #include "refhost/media/video_reader.h"
@@ -89,6 +90,54 @@ class VideoSource : public MediaSource {
   double rate_;
 };
 
+// A media's pictures shown whole at their own proportions inside the size asked for.
+class ProportionalSource : public MediaSource {
+ public:
+  explicit ProportionalSource(std::shared_ptr<MediaSource> inner)
+      : inner_(std::move(inner)), info_(inner_->info()) {}
+  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override {
+    const Fitted fitted = fit(width, height);
+    if (fitted.width == width && fitted.height == height)
+      return inner_->frame(index, width, height, format);
+    RgbaImage inside = inner_->frame(index, fitted.width, fitted.height, format);
+    RgbaImage picture(width, height, format);
+    const std::size_t pixel = bytesPerPixel(format);
+    for (int32_t y = 0; y < fitted.height; ++y)
+      std::memcpy(
+          &picture
+               .pixels[((static_cast<std::size_t>(y + fitted.top)) * width + fitted.left) * pixel],
+          &inside.pixels[static_cast<std::size_t>(y) * fitted.width * pixel],
+          static_cast<std::size_t>(fitted.width) * pixel);
+    return picture;
+  }
+  int32_t frameCount() const override { return inner_->frameCount(); }
+  bool changesOverTime() const override { return inner_->changesOverTime(); }
+  MediaInfo info() const override { return info_; }
+
+ private:
+  struct Fitted {
+    int32_t width, height, left, top;
+  };
+  // The largest picture of the media's proportions inside the size, centred; within a pixel of
+  // the size, the size itself.
+  Fitted fit(int32_t width, int32_t height) const {
+    if (info_.width <= 0 || info_.height <= 0 || width <= 0 || height <= 0)
+      return {width, height, 0, 0};
+    const double scale = std::min(static_cast<double>(width) / info_.width,
+                                  static_cast<double>(height) / info_.height);
+    const auto w = static_cast<int32_t>(std::lround(info_.width * scale));
+    const auto h = static_cast<int32_t>(std::lround(info_.height * scale));
+    if (std::abs(w - width) <= 1 && std::abs(h - height) <= 1) return {width, height, 0, 0};
+    return {std::clamp(w, 1, width), std::clamp(h, 1, height),
+            (width - std::clamp(w, 1, width)) / 2, (height - std::clamp(h, 1, height)) / 2};
+  }
+
+  std::shared_ptr<MediaSource> inner_;
+  MediaInfo info_;
+};
+
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double compositionRate);
+
 }  // namespace
 
 std::vector<uint8_t> MediaSource::glRows(int32_t index, int32_t width, int32_t height,
@@ -132,6 +181,14 @@ bool isVideoPath(const std::string& path) {
 }
 
 std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, double compositionRate) {
+  std::shared_ptr<MediaSource> source = opened(spec, compositionRate);
+  if (spec.keepProportions) return std::make_shared<ProportionalSource>(std::move(source));
+  return source;
+}
+
+namespace {
+
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double compositionRate) {
   switch (spec.kind) {
     case MediaSpec::Kind::Pattern:
       return std::make_shared<PatternSource>(spec.pattern);
@@ -143,5 +200,7 @@ std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, double compo
   }
   return nullptr;
 }
+
+}  // namespace
 
 }  // namespace refhost

@@ -37,6 +37,9 @@ struct MediaSpec {
   Pattern pattern = Pattern::Counter;
   std::array<float, 4> colour{0, 0, 0, 1};  // red, green, blue, alpha from 0 to 1
   std::string path;                         // a file, as open() will find it
+  // A picture of other proportions than the size asked for is shown whole at its own
+  // proportions, centred, with transparent bars beside it ("contain"), instead of stretched.
+  bool keepProportions = false;
   // What the media turned out to hold when it was first opened (a scene's media are opened
   // as the scene is read); empty until then.
   std::optional<MediaInfo> info;

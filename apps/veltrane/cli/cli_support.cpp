@@ -51,7 +51,10 @@ Arguments parseArguments(const std::vector<std::string>& args,
     const OptionDefinition& definition = definitions[i];
     declared.push_back(definition.takesValue
                            ? app.add_option(definition.name, values[i])
-                                 ->multi_option_policy(CLI::MultiOptionPolicy::TakeLast)
+                                 ->multi_option_policy(definition.repeatable
+                                                           ? CLI::MultiOptionPolicy::Join
+                                                           : CLI::MultiOptionPolicy::TakeLast)
+                                 ->delimiter('\0')
                            : app.add_flag(definition.name)->disable_flag_override());
   }
   app.add_option("arguments", parsed.positional);
@@ -71,7 +74,17 @@ Arguments parseArguments(const std::vector<std::string>& args,
       throw UsageError("unknown option '" + extra.substr(0, extra.find('=')) + "'");
   }
   for (std::size_t i = 0; i < definitions.size(); ++i) {
-    if (declared[i]->count() > 0) parsed.options[definitions[i].name] = values[i];
+    if (declared[i]->count() == 0) continue;
+    if (definitions[i].repeatable) {
+      // Joined as CLI11 met them, last given first: put them back in the order given.
+      std::vector<std::string> given;
+      for (const std::string& value : declared[i]->as<std::vector<std::string>>())
+        given.insert(given.begin(), value);
+      std::string joined;
+      for (const std::string& value : given) joined += (joined.empty() ? "" : ";") + value;
+      values[i] = joined;
+    }
+    parsed.options[definitions[i].name] = values[i];
   }
   return parsed;
 }

@@ -21,6 +21,8 @@ class UsageError : public std::runtime_error {
 struct OptionDefinition {
   std::string name;  // "--plugin"
   bool takesValue = false;
+  // May be given more than once: the values are kept, in order, joined by ';'.
+  bool repeatable = false;
 };
 
 // Options seen, by name; a flag maps to "". Accepts "--name value" and "--name=value".

@@ -39,10 +39,13 @@ std::string mediaFileProblem(const std::filesystem::path& path) {
 
 MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
   const char* expected =
-      "a source: {\"pattern\": NAME}, {\"color\": [r, g, b, a]} or {\"file\": PATH}";
-  if (!field.present() || !field.json().is_object() || field.json().size() != 1)
+      "a source: {\"pattern\": NAME}, {\"color\": [r, g, b, a]} or {\"file\": PATH}, the last "
+      "with \"fit\" if it is to keep its proportions";
+  if (!field.present() || !field.json().is_object() || field.json().empty()) field.fail(expected);
+  field.requireObject({"pattern", "color", "file", "fit"});
+  const bool withFit = field.member("fit").present();
+  if (field.json().size() != (withFit ? 2u : 1u) || (withFit && !field.member("file").present()))
     field.fail(expected);
-  field.requireObject({"pattern", "color", "file"});
   if (JsonField pattern = field.member("pattern"); pattern.present()) {
     auto chosen = refhost::patternFromName(pattern.string("a pattern name"));
     if (!chosen) pattern.fail("one of " + patternList());
@@ -62,6 +65,11 @@ MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
     file.fail("an image or video file (relative to the scene file; " + path.string() + " " +
               problem + ")");
   MediaSpec spec = MediaSpec::ofFile(path.lexically_normal().string());
+  if (JsonField fit = field.member("fit"); fit.present()) {
+    const std::string how = fit.string("\"stretch\" or \"contain\"");
+    if (how != "stretch" && how != "contain") fit.fail("\"stretch\" or \"contain\"");
+    spec.keepProportions = how == "contain";
+  }
   try {
     // Opened once to prove it decodes, and to learn what the composition needs to know of it.
     spec.info = refhost::openMediaSource(spec, 25.0)->info();

@@ -1,0 +1,356 @@
+// Building the scene of a split from its clips.
+#include "commands/split_scene.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <filesystem>
+#include <sstream>
+
+#include "cli/cli_support.h"
+#include "refhost/media/media_source.h"
+#include "refhost/media/test_patterns.h"
+
+namespace veltrane_cli {
+namespace {
+
+constexpr int32_t kMaxClips = 9;
+// Generated pictures and stills have no size or rate of their own.
+constexpr std::array<int32_t, 2> kDefaultSize{1920, 1080};
+constexpr double kDefaultRate = 25;
+
+std::string layerGuid(std::size_t clip) {
+  char text[40];
+  std::snprintf(text, sizeof text, "5b1170e0-0000-4000-8000-%012zu", clip);
+  return text;
+}
+
+std::vector<std::string> splitAt(const std::string& text, char separator) {
+  std::vector<std::string> parts;
+  std::stringstream stream(text);
+  for (std::string part; std::getline(stream, part, separator);) parts.push_back(part);
+  if (!text.empty() && text.back() == separator) parts.push_back("");
+  return parts;
+}
+
+std::optional<std::array<double, 3>> hexColour(std::string text) {
+  if (!text.empty() && text[0] == '#') text.erase(0, 1);
+  const std::pair<const char*, const char*> named[] = {
+      {"black", "000000"}, {"white", "ffffff"}, {"grey", "808080"}, {"gray", "808080"},
+      {"red", "ff0000"},   {"green", "00ff00"}, {"blue", "0000ff"}, {"yellow", "ffff00"}};
+  for (const auto& [name, hex] : named)
+    if (text == name) text = hex;
+  if (text.size() != 6 || text.find_first_not_of("0123456789abcdefABCDEF") != std::string::npos)
+    return std::nullopt;
+  std::array<double, 3> colour{};
+  for (int c = 0; c < 3; ++c)
+    colour[c] = std::stoi(text.substr(static_cast<std::size_t>(2 * c), 2), nullptr, 16) / 255.0;
+  return colour;
+}
+
+// A clip as a scene source, opened once to prove it shows a picture and to learn what it is.
+struct Clip {
+  nlohmann::ordered_json source;
+  refhost::MediaInfo info;
+  bool video = false;
+  std::string name;
+};
+
+Clip readClip(const std::string& argument) {
+  const std::string shown = "argument '" + argument + "'";
+  Clip clip;
+  refhost::MediaSpec spec;
+  if (argument.rfind("pattern:", 0) == 0) {
+    const std::string name = argument.substr(8);
+    auto pattern = refhost::patternFromName(name);
+    if (!pattern)
+      throw UsageError(shown +
+                       ": expected pattern:bars, pattern:checker, pattern:gradient or "
+                       "pattern:counter");
+    clip.source = {{"pattern", name}};
+    clip.name = name;
+    return clip;
+  }
+  if (argument.rfind("color:", 0) == 0) {
+    auto colour = hexColour(argument.substr(6));
+    if (!colour) throw UsageError(shown + ": expected color:RRGGBB (hexadecimal) or a colour name");
+    clip.source = {{"color", {(*colour)[0], (*colour)[1], (*colour)[2]}}};
+    clip.name = argument.substr(6);
+    return clip;
+  }
+  std::error_code error;
+  const auto status = std::filesystem::status(argument, error);
+  if (status.type() == std::filesystem::file_type::not_found)
+    throw UsageError(shown + ": expected a video or image file, and there is no such file");
+  if (std::filesystem::is_directory(status))
+    throw UsageError(shown + ": expected a video or image file, got a folder");
+  try {
+    clip.info =
+        refhost::openMediaSource(refhost::MediaSpec::ofFile(argument), kDefaultRate)->info();
+  } catch (const std::exception& failure) {
+    std::string why = failure.what();
+    // The reader names the file already; the argument says it again.
+    if (why.rfind(argument + ": ", 0) == 0) why.erase(0, argument.size() + 2);
+    throw UsageError(shown + ": expected a video or image file that shows a picture (" + why + ")");
+  }
+  clip.video = refhost::isVideoPath(argument);
+  clip.source = {{"file", argument}, {"fit", "contain"}};
+  clip.name = std::filesystem::path(argument).stem().string();
+  return clip;
+}
+
+int32_t framesOf(const Clip& clip, double rate) {
+  if (!clip.video || !(clip.info.duration > 0)) return 0;
+  return std::max(1, static_cast<int32_t>(std::ceil(clip.info.duration * rate - 1e-6)));
+}
+
+nlohmann::ordered_json valueJson(const refhost::ParamValue& value, const std::string& id) {
+  auto number = [](double v) { return std::round(v * 1e4) / 1e4; };  // no float noise in files
+  if (id.rfind("inputLayer", 0) == 0) return std::string(value.layer);
+  if (id == "numberOfCuts" || id == "cutType" || id.rfind("inputFrameShift", 0) == 0)
+    return value.integer;
+  if (id.rfind("cutPosition", 0) == 0 || id.rfind("inputFrameTranslation", 0) == 0)
+    return {number(value.number[0]), number(value.number[1])};
+  return number(value.number[0]);
+}
+
+}  // namespace
+
+SplitScene buildSplitScene(const SplitRequest& request) {
+  if (request.clips.empty()) throw UsageError("expects 1 to 9 clips, got none");
+  if (request.clips.size() > static_cast<std::size_t>(kMaxClips))
+    throw UsageError("expects 1 to 9 clips, got " + std::to_string(request.clips.size()));
+  std::vector<Clip> clips;
+  for (const std::string& argument : request.clips) clips.push_back(readClip(argument));
+
+  const std::string layoutName =
+      request.layout.value_or(defaultLayoutFor(static_cast<int32_t>(clips.size())));
+  const std::optional<std::size_t> layout = findLayout(layoutName);
+  if (!layout)
+    throw UsageError("option '--layout': expected one of " + layoutNames() + ", got '" +
+                     layoutName + "'");
+  const LayoutInfo& info = layouts()[*layout];
+  if (static_cast<int32_t>(clips.size()) > info.regions)
+    throw UsageError("option '--layout': " + layoutName + " shows " + std::to_string(info.regions) +
+                     " pictures, fewer than the " + std::to_string(clips.size()) + " clips given");
+  for (const FrameNudge& nudge : request.nudges)
+    if (nudge.input < 1 || nudge.input > static_cast<int32_t>(clips.size()))
+      throw UsageError("option '--frame': expected a clip number from 1 to " +
+                       std::to_string(clips.size()) + ", got " + std::to_string(nudge.input));
+
+  SplitScene split;
+  const Clip& first = clips.front();
+  std::array<int32_t, 2> size = kDefaultSize;
+  if (first.info.width > 0 && first.info.height > 0) size = {first.info.width, first.info.height};
+  if (request.size) size = *request.size;
+  const double rate = request.fps.value_or(
+      first.video && first.info.frameRate > 0 ? first.info.frameRate : kDefaultRate);
+  // Stills and generated pictures have no length: they last as long as the composition. A
+  // first clip without one leaves the length to the longest video.
+  int32_t longest = 0, shortest = 0;
+  for (const Clip& clip : clips) {
+    const int32_t frames = framesOf(clip, rate);
+    if (frames == 0) continue;
+    longest = std::max(longest, frames);
+    shortest = shortest == 0 ? frames : std::min(shortest, frames);
+  }
+  int32_t duration = request.length == SplitRequest::Length::Longest    ? longest
+                     : request.length == SplitRequest::Length::Shortest ? shortest
+                                                                        : framesOf(first, rate);
+  if (duration == 0) duration = longest;
+  duration = std::max(duration, 1);  // stills and generated pictures alone: one frame
+
+  LayoutPlan plan;
+  try {
+    plan = planLayout(*layout, size[0], size[1], request.layoutOptions);
+  } catch (const std::invalid_argument& refusal) {
+    const char* option = request.layoutOptions.gap ? "--gap" : "--radial-centre";
+    throw UsageError(std::string("option '") + option + "': " + refusal.what());
+  }
+  if (static_cast<int32_t>(clips.size()) < info.regions)
+    split.notes.push_back(layoutName + " shows " + std::to_string(info.regions) +
+                          " pictures; the " + std::to_string(clips.size()) + " clip" +
+                          (clips.size() == 1 ? "" : "s") + " given fill them again in order");
+
+  std::vector<std::string> sources{refhost::kNoLayer};
+  std::vector<Point> pictureSizes;
+  nlohmann::ordered_json layers = nlohmann::ordered_json::array();
+  for (std::size_t i = 0; i < clips.size(); ++i) {
+    const Clip& clip = clips[i];
+    // A clip keeps its proportions: its picture's content at scale 100 is the largest of its
+    // shape inside the frame.
+    Point content{double(size[0]), double(size[1])};
+    if (clip.info.width > 0 && clip.info.height > 0) {
+      const double scale =
+          std::min(size[0] / double(clip.info.width), size[1] / double(clip.info.height));
+      content = {clip.info.width * scale, clip.info.height * scale};
+    }
+    pictureSizes.push_back(content);
+    if (i == 0) continue;
+    sources.push_back(layerGuid(i));
+    layers.push_back({{"guid", layerGuid(i)}, {"name", clip.name}, {"source", clip.source}});
+    if (clip.video || clip.info.width == 0) layers.back()["frameCount"] = duration;
+  }
+
+  nlohmann::ordered_json params = nlohmann::ordered_json::object();
+  for (const ParamEdit& edit : layoutEdits(plan, size[0], size[1], sources, pictureSizes))
+    params[edit.id] = valueJson(edit.value, edit.id);
+  params["cutType"] = plan.radial ? "Radial" : "Local";
+  for (const FrameNudge& nudge : request.nudges) {
+    // The clip's input: where the layout puts the clip's place among the sources.
+    for (std::size_t k = 0; k < plan.inputs.size(); ++k) {
+      if (k % clips.size() != static_cast<std::size_t>(nudge.input - 1)) continue;
+      const std::string n = std::to_string(plan.inputs[k]);
+      nlohmann::ordered_json& at = params["inputFrameTranslation" + n];
+      at = {at[0].get<double>() + nudge.offset[0], at[1].get<double>() + nudge.offset[1]};
+      params["inputFrameScale" + n] =
+          params["inputFrameScale" + n].get<double>() * nudge.scale / 100;
+      params["inputFrameRotation" + n] = nudge.rotation;
+    }
+  }
+  if (request.border) {
+    params["borderWidth"] = request.border->width;
+    params["borderColor"] = {request.border->colour[0], request.border->colour[1],
+                             request.border->colour[2]};
+    params["borderAlpha"] = request.border->opacity;
+  }
+
+  nlohmann::ordered_json source = first.source;
+  split.document = {{"description", "veltrane split of " + std::to_string(clips.size()) + " clip" +
+                                        (clips.size() == 1 ? "" : "s") + ", layout " + layoutName},
+                    {"width", size[0]},
+                    {"height", size[1]},
+                    {"fps", rate},
+                    {"duration", duration},
+                    {"source", source},
+                    {"layers", layers},
+                    {"params", params}};
+  return split;
+}
+
+std::array<int32_t, 2> parseFrameSize(const std::string& option, const std::string& text) {
+  const std::string::size_type x = text.find('x');
+  const std::string expected = "option '" + option + "' expects WIDTHxHEIGHT from 2x2 to " +
+                               "16384x16384 (e.g. 1920x1080), got '" + text + "'";
+  if (x == std::string::npos) throw UsageError(expected);
+  std::array<int32_t, 2> size{};
+  try {
+    size = {parseInt32(option, text.substr(0, x)), parseInt32(option, text.substr(x + 1))};
+  } catch (const UsageError&) {
+    throw UsageError(expected);
+  }
+  if (size[0] < 2 || size[1] < 2 || size[0] > 16384 || size[1] > 16384) throw UsageError(expected);
+  return size;
+}
+
+double parseNumber(const std::string& option, const std::string& text) {
+  std::size_t used = 0;
+  double value = 0;
+  try {
+    value = std::stod(text, &used);
+  } catch (const std::exception&) {
+    used = 0;
+  }
+  if (used == 0 || used != text.size() || !std::isfinite(value))
+    throw UsageError("option '" + option + "' expects a number, got '" + text + "'");
+  return value;
+}
+
+Point parsePoint(const std::string& option, const std::string& text) {
+  const std::vector<std::string> parts = splitAt(text, ',');
+  if (parts.size() != 2)
+    throw UsageError("option '" + option +
+                     "' expects X,Y (pixels from the frame's centre, y up), "
+                     "got '" +
+                     text + "'");
+  return {parseNumber(option, parts[0]), parseNumber(option, parts[1])};
+}
+
+BorderSetting parseBorder(const std::string& option, const std::string& text) {
+  const std::vector<std::string> parts = splitAt(text, ',');
+  if (parts.empty() || parts.size() > 3)
+    throw UsageError("option '" + option + "' expects WIDTH[,COLOUR[,OPACITY]], got '" + text +
+                     "'");
+  BorderSetting border;
+  border.width = parseNumber(option, parts[0]);
+  if (border.width < 0 || border.width > 200)
+    throw UsageError("option '" + option + "' expects a width from 0 to 200 pixels, got '" +
+                     parts[0] + "'");
+  border.colour = {1, 1, 1};
+  if (parts.size() > 1) {
+    auto colour = hexColour(parts[1]);
+    if (!colour)
+      throw UsageError("option '" + option +
+                       "' expects a colour as RRGGBB or a name (black, "
+                       "white, grey, red, green, blue, yellow), got '" +
+                       parts[1] + "'");
+    border.colour = *colour;
+  }
+  if (parts.size() > 2) {
+    border.opacity = parseNumber(option, parts[2]);
+    if (border.opacity < 0 || border.opacity > 1)
+      throw UsageError("option '" + option + "' expects an opacity from 0 to 1, got '" + parts[2] +
+                       "'");
+  }
+  return border;
+}
+
+FrameNudge parseNudge(const std::string& option, const std::string& text) {
+  const std::string expected = "option '" + option + "' expects N:X,Y[,SCALE[,ROTATION]] (clip " +
+                               "N from 1, offset in pixels, scale in percent, degrees), got '" +
+                               text + "'";
+  const std::string::size_type colon = text.find(':');
+  if (colon == std::string::npos) throw UsageError(expected);
+  const std::vector<std::string> parts = splitAt(text.substr(colon + 1), ',');
+  if (parts.size() < 2 || parts.size() > 4) throw UsageError(expected);
+  FrameNudge nudge;
+  nudge.input = parseInt32(option, text.substr(0, colon));
+  nudge.offset = {parseNumber(option, parts[0]), parseNumber(option, parts[1])};
+  if (parts.size() > 2) nudge.scale = parseNumber(option, parts[2]);
+  if (parts.size() > 3) nudge.rotation = parseNumber(option, parts[3]);
+  if (!(nudge.scale > 0) || nudge.scale > 10000)
+    throw UsageError("option '" + option + "' expects a scale above 0 and up to 10000 percent");
+  return nudge;
+}
+
+const std::vector<OptionDefinition> kSplitOptions = {
+    {"--layout", true},        {"--size", true},   {"--fps", true},
+    {"--duration", true},      {"--angle", true},  {"--gap", true},
+    {"--radial-centre", true}, {"--border", true}, {"--frame", true, true}};
+
+SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
+                              const std::map<std::string, std::string>& options) {
+  SplitRequest request;
+  request.clips = clips;
+  auto given = [&](const char* name) -> const std::string* {
+    auto found = options.find(name);
+    return found == options.end() ? nullptr : &found->second;
+  };
+  if (auto* text = given("--layout")) request.layout = *text;
+  if (auto* text = given("--size")) request.size = parseFrameSize("--size", *text);
+  if (auto* text = given("--fps")) {
+    request.fps = parseNumber("--fps", *text);
+    if (*request.fps < 0.001 || *request.fps > 1000)
+      throw UsageError("option '--fps' expects a rate from 0.001 to 1000, got '" + *text + "'");
+  }
+  if (auto* text = given("--duration")) request.length = parseLength("--duration", *text);
+  if (auto* text = given("--angle")) request.layoutOptions.angle = parseNumber("--angle", *text);
+  if (auto* text = given("--gap")) request.layoutOptions.gap = parseNumber("--gap", *text);
+  if (auto* text = given("--radial-centre"))
+    request.layoutOptions.radialCentre = parsePoint("--radial-centre", *text);
+  if (auto* text = given("--border")) request.border = parseBorder("--border", *text);
+  if (auto* text = given("--frame"))
+    for (const std::string& one : splitAt(*text, ';'))
+      if (!one.empty()) request.nudges.push_back(parseNudge("--frame", one));
+  return request;
+}
+
+SplitRequest::Length parseLength(const std::string& option, const std::string& text) {
+  if (text == "first") return SplitRequest::Length::First;
+  if (text == "longest") return SplitRequest::Length::Longest;
+  if (text == "shortest") return SplitRequest::Length::Shortest;
+  throw UsageError("option '" + option + "' expects first, longest or shortest, got '" + text +
+                   "'");
+}
+
+}  // namespace veltrane_cli
