@@ -19,6 +19,8 @@ const Command kCommands[] = {
      &veltrane_cli::runInfo},
     {"render", "render frames of a scene to a still image, an image sequence or a video",
      &veltrane_cli::runRender},
+    {"split", "put your own clips side by side along angled cuts, in one command",
+     &veltrane_cli::runSplit},
     {"interact", "replay viewer events (pointer, keys, menus, undo) on a scene",
      &veltrane_cli::runInteract},
     {"bench", "measure milliseconds per frame across frame sizes and cut counts",

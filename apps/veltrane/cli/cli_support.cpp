@@ -52,9 +52,8 @@ Arguments parseArguments(const std::vector<std::string>& args,
     declared.push_back(definition.takesValue
                            ? app.add_option(definition.name, values[i])
                                  ->multi_option_policy(definition.repeatable
-                                                           ? CLI::MultiOptionPolicy::Join
+                                                           ? CLI::MultiOptionPolicy::TakeAll
                                                            : CLI::MultiOptionPolicy::TakeLast)
-                                 ->delimiter('\0')
                            : app.add_flag(definition.name)->disable_flag_override());
   }
   app.add_option("arguments", parsed.positional);
@@ -78,8 +77,7 @@ Arguments parseArguments(const std::vector<std::string>& args,
     if (definitions[i].repeatable) {
       // Joined as CLI11 met them, last given first: put them back in the order given.
       std::vector<std::string> given;
-      for (const std::string& value : declared[i]->as<std::vector<std::string>>())
-        given.insert(given.begin(), value);
+      for (const std::string& value : declared[i]->results()) given.insert(given.begin(), value);
       std::string joined;
       for (const std::string& value : given) joined += (joined.empty() ? "" : ";") + value;
       values[i] = joined;

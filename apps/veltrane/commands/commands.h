@@ -15,6 +15,7 @@ struct Command {
 
 int runInfo(const std::vector<std::string>& args);
 int runRender(const std::vector<std::string>& args);
+int runSplit(const std::vector<std::string>& args);
 int runInteract(const std::vector<std::string>& args);
 int runBench(const std::vector<std::string>& args);
 int runSoak(const std::vector<std::string>& args);

@@ -11,6 +11,7 @@
 #include "events/event_replay.h"
 #include "events/event_script.h"
 #include "output/call_log.h"
+#include "output/made_folder.h"
 #include "refhost/platform/staged_file.h"
 #include "scene/scene_document.h"
 #include "scene/scene_engine.h"
@@ -53,33 +54,6 @@ const char kInteractHelp[] =
     "                  during it to FILE\n"
     "  -h, --help      show this help\n";
 
-// The --overlay folder, made where it is missing; a run that fails removes the folders it made.
-class OverlayFolder {
- public:
-  explicit OverlayFolder(const std::string& path) {
-    std::error_code error;
-    if (fs::exists(path, error) && !fs::is_directory(path, error))
-      throw UsageError("option '--overlay' expects a folder, '" + path + "' is a file");
-    for (fs::path missing = path; !missing.empty() && !fs::exists(missing, error);
-         missing = missing.parent_path())
-      made_.push_back(missing);  // deepest first
-    fs::create_directories(path, error);
-    if (error) throw std::runtime_error(path + ": cannot create the folder: " + error.message());
-  }
-  ~OverlayFolder() {
-    std::error_code ignored;
-    if (!kept_)
-      for (const fs::path& folder : made_) fs::remove(folder, ignored);
-  }
-  OverlayFolder(const OverlayFolder&) = delete;
-  OverlayFolder& operator=(const OverlayFolder&) = delete;
-  void keep() { kept_ = true; }
-
- private:
-  std::vector<fs::path> made_;
-  bool kept_ = false;
-};
-
 }  // namespace
 
 int runInteract(const std::vector<std::string>& args) {
@@ -106,10 +80,10 @@ int runInteract(const std::vector<std::string>& args) {
   noteStopSignals();
   Scene scene = loadScene(parsed.positional.front());
   EventScript script = loadEventScript(options["--events"]);
-  std::optional<OverlayFolder> overlayFolder;
+  std::optional<MadeFolder> overlayFolder;
   std::unique_ptr<refhost::FrameSink> overlays;
   if (options.count("--overlay")) {
-    overlayFolder.emplace(options["--overlay"]);
+    overlayFolder.emplace(options["--overlay"], "--overlay");
     refhost::OutputTarget target =
         refhost::parseOutputTarget(options["--overlay"] + "/event_%04d.png");
     overlays = refhost::openFrameSink(target, scene.composition.width, scene.composition.height,

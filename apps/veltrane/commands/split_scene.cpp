@@ -192,20 +192,38 @@ SplitScene buildSplitScene(const SplitRequest& request) {
     if (clip.video || clip.info.width == 0) layers.back()["frameCount"] = duration;
   }
 
+  // The values the layout sets, less those a scene leaves at their declared defaults (an unused
+  // cut, an input at the frame's placement), so that the saved scene reads as a person's.
   nlohmann::ordered_json params = nlohmann::ordered_json::object();
-  for (const ParamEdit& edit : layoutEdits(plan, size[0], size[1], sources, pictureSizes))
-    params[edit.id] = valueJson(edit.value, edit.id);
+  for (const ParamEdit& edit : layoutEdits(plan, size[0], size[1], sources, pictureSizes)) {
+    nlohmann::ordered_json value = valueJson(edit.value, edit.id);
+    const bool zeroPoint = value == nlohmann::ordered_json({0, 0});
+    const bool byDefault = (edit.id.rfind("cutPosition", 0) == 0 && zeroPoint) ||
+                           (edit.id.rfind("inputFrameTranslation", 0) == 0 && zeroPoint) ||
+                           (edit.id.rfind("cutDirection_", 0) == 0 &&
+                            value == (edit.id == "cutDirection_0" ? 225 : 0)) ||
+                           (edit.id.rfind("inputFrameScale", 0) == 0 && value == 100) ||
+                           ((edit.id.rfind("inputFrameRotation", 0) == 0 ||
+                             edit.id.rfind("inputFrameShift", 0) == 0) &&
+                            value == 0) ||
+                           (edit.id.rfind("inputLayer", 0) == 0 && value == refhost::kNoLayer) ||
+                           (edit.id == "numberOfCuts" && value == 1);
+    if (!byDefault) params[edit.id] = value;
+  }
   params["cutType"] = plan.radial ? "Radial" : "Local";
   for (const FrameNudge& nudge : request.nudges) {
     // The clip's input: where the layout puts the clip's place among the sources.
     for (std::size_t k = 0; k < plan.inputs.size(); ++k) {
       if (k % clips.size() != static_cast<std::size_t>(nudge.input - 1)) continue;
       const std::string n = std::to_string(plan.inputs[k]);
-      nlohmann::ordered_json& at = params["inputFrameTranslation" + n];
-      at = {at[0].get<double>() + nudge.offset[0], at[1].get<double>() + nudge.offset[1]};
-      params["inputFrameScale" + n] =
-          params["inputFrameScale" + n].get<double>() * nudge.scale / 100;
-      params["inputFrameRotation" + n] = nudge.rotation;
+      const std::string translation = "inputFrameTranslation" + n, scale = "inputFrameScale" + n;
+      const Point at = params.contains(translation) ? Point{params[translation][0].get<double>(),
+                                                            params[translation][1].get<double>()}
+                                                    : Point{0, 0};
+      params[translation] = {at[0] + nudge.offset[0], at[1] + nudge.offset[1]};
+      const double framed = params.contains(scale) ? params[scale].get<double>() : 100;
+      params[scale] = framed * nudge.scale / 100;
+      if (nudge.rotation != 0) params["inputFrameRotation" + n] = nudge.rotation;
     }
   }
   if (request.border) {
@@ -314,9 +332,8 @@ FrameNudge parseNudge(const std::string& option, const std::string& text) {
 }
 
 const std::vector<OptionDefinition> kSplitOptions = {
-    {"--layout", true},        {"--size", true},   {"--fps", true},
-    {"--duration", true},      {"--angle", true},  {"--gap", true},
-    {"--radial-centre", true}, {"--border", true}, {"--frame", true, true}};
+    {"--layout", true}, {"--size", true}, {"--fps", true},           {"--duration", true},
+    {"--angle", true},  {"--gap", true},  {"--radial-centre", true}, {"--border", true}};
 
 SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
                               const std::map<std::string, std::string>& options) {
@@ -341,7 +358,7 @@ SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
   if (auto* text = given("--border")) request.border = parseBorder("--border", *text);
   if (auto* text = given("--frame"))
     for (const std::string& one : splitAt(*text, ';'))
-      if (!one.empty()) request.nudges.push_back(parseNudge("--frame", one));
+      if (one.find(':') != std::string::npos) request.nudges.push_back(parseNudge("--frame", one));
   return request;
 }
 

@@ -57,7 +57,8 @@ SplitScene buildSplitScene(const SplitRequest& request);
 // The options that shape a split, as `split` and `view` take them.
 extern const std::vector<OptionDefinition> kSplitOptions;
 // The request of the clips and the options (--size, --fps, --duration, --layout, --angle, --gap,
-// --radial-centre, --border, --frame; --frame may be given more than once, as "N:...;N:...").
+// --radial-centre, --border, and the nudges among the --frame values: those of the form N:X,Y,
+// the values of a repeated --frame joined by ';').
 SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
                               const std::map<std::string, std::string>& options);
 

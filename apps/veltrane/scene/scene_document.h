@@ -41,6 +41,11 @@ Scene sceneFromJson(const nlohmann::ordered_json& document, const std::string& f
 nlohmann::ordered_json savedScene(const Scene& scene, const refhost::ParamPanel& panel,
                                   const std::string& toDirectory);
 
+// The document with its relative file sources rewritten from `fromDirectory` to `toDirectory`,
+// so that a scene saved there finds the same media.
+nlohmann::ordered_json movedTo(nlohmann::ordered_json document, const std::string& fromDirectory,
+                               const std::string& toDirectory);
+
 // Writes the document as a person writes a scene (what fits on a line stays on one) under a
 // temporary name beside `path` and renames it into place. Throws std::runtime_error naming
 // the file when it cannot be written.

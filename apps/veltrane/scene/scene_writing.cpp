@@ -80,13 +80,17 @@ nlohmann::ordered_json savedScene(const Scene& scene, const refhost::ParamPanel&
     if (!isDefault) params[param.id] = values[param.id];
   }
   document["params"] = params;
-  fs::path from = fs::absolute(directoryOf(scene.file)).lexically_normal();
+  return movedTo(document, directoryOf(scene.file), toDirectory);
+}
+
+nlohmann::ordered_json movedTo(nlohmann::ordered_json document, const std::string& fromDirectory,
+                               const std::string& toDirectory) {
+  fs::path from = fs::absolute(fromDirectory).lexically_normal();
   fs::path to = fs::absolute(toDirectory).lexically_normal();
-  if (from != to) {
-    moveFileSource(document, from, to);
-    if (document.contains("layers") && document["layers"].is_array()) {
-      for (nlohmann::ordered_json& layer : document["layers"]) moveFileSource(layer, from, to);
-    }
+  if (from == to) return document;
+  moveFileSource(document, from, to);
+  if (document.contains("layers") && document["layers"].is_array()) {
+    for (nlohmann::ordered_json& layer : document["layers"]) moveFileSource(layer, from, to);
   }
   return document;
 }

@@ -1,0 +1,134 @@
+// `veltrane split` end to end: the frames a split renders are the frames `render` makes of the
+// scene it saves, clips of other proportions keep theirs, a layout with more regions than clips
+// says so, and bad input is one line with status 2 and nothing written.
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <nlohmann/json.hpp>
+
+#include "cli_runner.h"
+#include "refhost/media/image_files.h"
+
+namespace {
+
+using nlohmann::json;
+
+// Small clips made with FFmpeg's test sources: 1 s at 25 fps.
+std::string clip(const ScratchDirectory& folder, const std::string& name, const std::string& size,
+                 const std::string& source = "testsrc2") {
+  const std::string path = folder.file(name);
+  commandOutput("ffmpeg -v error -y -f lavfi -i " + source + "=size=" + size +
+                ":rate=25 -t 1 -pix_fmt yuv420p " + path);
+  return path;
+}
+
+// Frames 0 to 4 as PNGs, by split and by render of the scene split saved: the same bytes.
+void expectTheSceneItSavesRendersTheSame(const ScratchDirectory& folder,
+                                         const std::vector<std::string>& clipsAndOptions) {
+  std::vector<std::string> args{"split"};
+  args.insert(args.end(), clipsAndOptions.begin(), clipsAndOptions.end());
+  args.insert(args.end(), {"-o", folder.file("split/f%04d.png"), "--frames", "0-4", "--save-scene",
+                           folder.file("saved/split.json")});
+  CliRun split = runCli(args);
+  ASSERT_EQ(split.status, 0) << split.err;
+  CliRun render = runCli({"render", folder.file("saved/split.json"), "-o",
+                          folder.file("render/f%04d.png"), "--frames", "0-4"});
+  ASSERT_EQ(render.status, 0) << render.err;
+  for (int frame = 0; frame < 5; ++frame) {
+    const std::string name = "/f000" + std::to_string(frame) + ".png";
+    EXPECT_EQ(slurp(folder.file("split") + name), slurp(folder.file("render") + name)) << name;
+  }
+}
+
+TEST(SplitCommand, RendersWhatTheSceneItSavesRenders) {
+  ScratchDirectory folder;
+  const std::string a = clip(folder, "a.mp4", "160x90"), b = clip(folder, "b.mp4", "160x90");
+  expectTheSceneItSavesRendersTheSame(folder, {a, b, "--border", "4,ff8000"});
+  const json saved = json::parse(slurp(folder.file("saved/split.json")));
+  EXPECT_EQ(saved["width"], 160);
+  EXPECT_EQ(saved["fps"], 25.0);
+  EXPECT_EQ(saved["duration"], 25);
+  EXPECT_EQ(saved["source"]["file"], a);
+  EXPECT_EQ(saved["params"]["borderWidth"], 4.0);
+
+  // Four of different proportions (a portrait clip, a still), each framed on its region.
+  ScratchDirectory four;
+  const std::string portrait = clip(four, "p.mp4", "90x160", "testsrc");
+  const std::string still = four.file("still.png");
+  commandOutput("ffmpeg -v error -y -f lavfi -i smptebars=size=120x90 -frames:v 1 " + still);
+  expectTheSceneItSavesRendersTheSame(
+      four, {clip(four, "a.mp4", "160x90"), portrait, still, clip(four, "c.mp4", "160x90"),
+             "--frame", "2:5,-5,110,10"});
+  const json params = json::parse(slurp(four.file("saved/split.json")))["params"];
+  EXPECT_EQ(params["numberOfCuts"], 3) << "four clips make a 2x2 grid";
+  // The portrait clip is shown at its own proportions: framing scales its narrow picture up.
+  bool portraitFramed = false;
+  for (int j = 0; j < 9; ++j) {
+    const std::string n = std::to_string(j);
+    if (params.value("inputLayer" + n, "") != "5b1170e0-0000-4000-8000-000000000001") continue;
+    portraitFramed = params["inputFrameScale" + n].get<double>() > 100;
+    EXPECT_EQ(params["inputFrameRotation" + n], 10.0);
+  }
+  EXPECT_TRUE(portraitFramed) << params;
+}
+
+TEST(SplitCommand, ALayoutWithMoreRegionsThanClipsShowsThemAgainAndSaysSo) {
+  ScratchDirectory folder;
+  CliRun run = runCli({"split", clip(folder, "a.mp4", "160x90"), "pattern:checker", "--layout",
+                       "grid-2x2", "-o", folder.file("out.png")});
+  ASSERT_EQ(run.status, 0) << run.err;
+  EXPECT_NE(run.err.find("veltrane split: note: grid-2x2 shows 4 pictures; the 2 clips given "
+                         "fill them again in order"),
+            std::string::npos)
+      << run.err;
+}
+
+TEST(SplitCommand, RefusesBadInputWithOneLineAndWritesNothing) {
+  ScratchDirectory folder;
+  const std::string a = clip(folder, "a.mp4", "160x90");
+  writeText(folder.file("text.mp4"), "not a video");
+  commandOutput("ffmpeg -v error -y -f lavfi -i sine=frequency=440 -t 0.5 " +
+                folder.file("sound.mp4"));
+  const std::string out = folder.file("out.png");
+  const std::vector<std::string> tenClips(10, a);
+  struct Case {
+    std::vector<std::string> args;
+    std::string line;  // how the one line on stderr starts
+  };
+  std::vector<std::string> tooMany{"split"};
+  tooMany.insert(tooMany.end(), tenClips.begin(), tenClips.end());
+  tooMany.insert(tooMany.end(), {"-o", out});
+  const Case cases[] = {
+      {{"split", a, folder.file("missing.mp4"), "-o", out},
+       "veltrane split: argument '" + folder.file("missing.mp4") +
+           "': expected a video or image file, and there is no such file"},
+      {{"split", folder.file("text.mp4"), "-o", out},
+       "veltrane split: argument '" + folder.file("text.mp4") +
+           "': expected a video or image file that shows a picture"},
+      {{"split", a, folder.file("sound.mp4"), "-o", out},
+       "veltrane split: argument '" + folder.file("sound.mp4") +
+           "': expected a video or image file that shows a picture"},
+      {tooMany, "veltrane split: expects 1 to 9 clips, got 10"},
+      {{"split", a, a, a, "--layout", "diagonal-2", "-o", out},
+       "veltrane split: option '--layout': diagonal-2 shows 2 pictures, fewer than the 3 clips"},
+      {{"split", a, "--layout", "zigzag", "-o", out},
+       "veltrane split: option '--layout': expected one of diagonal-2, vertical-2, horizontal-2, "
+       "slanted-2"},
+      {{"split", a, a, "--frame", "3:0,0", "-o", out},
+       "veltrane split: option '--frame': expected a clip number from 1 to 2, got 3"},
+      {{"split", a, a, "--gap", "20", "-o", out},
+       "veltrane split: option '--gap': the cuts of diagonal-2 do not run side by side"},
+      {{"split", a, "--border", "4,mauve", "-o", out},
+       "veltrane split: option '--border' expects a colour as RRGGBB or a name"},
+      {{"split", a}, "veltrane split: needs -o OUT (or --save-scene FILE.json alone)"},
+  };
+  for (const Case& c : cases) {
+    CliRun run = runCli(c.args);
+    EXPECT_EQ(run.status, 2) << c.line << "\n" << run.err;
+    EXPECT_EQ(run.err.rfind(c.line, 0), 0u) << run.err;
+    EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << run.err;
+    EXPECT_FALSE(std::filesystem::exists(out)) << c.line;
+  }
+}
+
+}  // namespace
