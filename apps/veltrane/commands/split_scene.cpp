@@ -20,7 +20,7 @@ constexpr std::array<int32_t, 2> kDefaultSize{1920, 1080};
 constexpr double kDefaultRate = 25;
 
 std::string layerGuid(std::size_t clip) {
-  char text[40];
+  char text[48];  // room for any size_t
   std::snprintf(text, sizeof text, "5b1170e0-0000-4000-8000-%012zu", clip);
   return text;
 }
@@ -179,13 +179,7 @@ SplitScene buildSplitScene(const SplitRequest& request) {
     const Clip& clip = clips[i];
     // A clip keeps its proportions: its picture's content at scale 100 is the largest of its
     // shape inside the frame.
-    Point content{double(size[0]), double(size[1])};
-    if (clip.info.width > 0 && clip.info.height > 0) {
-      const double scale =
-          std::min(size[0] / double(clip.info.width), size[1] / double(clip.info.height));
-      content = {clip.info.width * scale, clip.info.height * scale};
-    }
-    pictureSizes.push_back(content);
+    pictureSizes.push_back(contentSize(clip.info.width, clip.info.height, true, size[0], size[1]));
     if (i == 0) continue;
     sources.push_back(layerGuid(i));
     layers.push_back({{"guid", layerGuid(i)}, {"name", clip.name}, {"source", clip.source}});

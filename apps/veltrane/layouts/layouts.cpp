@@ -175,7 +175,19 @@ Framing frameOnRegion(const RegionShape& region, Point pictureSize) {
     }
   }
   framing.scale = needed * 100;
+  // To a ten-thousandth of a pixel and of a percent, as a scene keeps them, so that a centre on
+  // the frame's axis is 0 and not a rounding error's 1e-15; the scale upwards, still covering.
+  const auto kept = [](double value) { return std::round(value * 1e4) / 1e4 + 0.0; };
+  framing.translation = {kept(framing.translation[0]), kept(framing.translation[1])};
+  framing.scale = std::ceil(framing.scale * 1e4 - 1e-6) / 1e4;
   return framing;
+}
+
+Point contentSize(int32_t pictureWidth, int32_t pictureHeight, bool keepsProportions,
+                  double width, double height) {
+  if (!keepsProportions || pictureWidth <= 0 || pictureHeight <= 0) return {width, height};
+  const double scale = std::min(width / pictureWidth, height / pictureHeight);
+  return {pictureWidth * scale, pictureHeight * scale};
 }
 
 std::vector<ParamEdit> layoutEdits(const LayoutPlan& plan, double width, double height,

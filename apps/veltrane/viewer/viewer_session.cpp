@@ -143,15 +143,28 @@ void ViewerSession::applyEdits(const std::string& stepName,
   engine_->endEdit();
 }
 
+veltrane_cli::Point ViewerSession::pictureSizeOf(const std::string& layerGuid) const {
+  const refhost::Composition& composition = scene_.composition;
+  const refhost::MediaSpec* media = &composition.source;
+  for (const refhost::CompositionLayer& layer : composition.layers)
+    if (layer.layer.guid == layerGuid) media = &layer.media;
+  const refhost::MediaInfo info = media->info.value_or(refhost::MediaInfo{});
+  return veltrane_cli::contentSize(info.width, info.height, media->keepProportions,
+                                   composition.width, composition.height);
+}
+
 void ViewerSession::applyPreset(std::size_t index) {
   std::vector<std::string> sources{refhost::kNoLayer};
   for (const refhost::CompositionLayer& layer : scene_.composition.layers)
     sources.push_back(layer.layer.guid);
+  std::vector<veltrane_cli::Point> pictureSizes;
+  for (const std::string& source : sources) pictureSizes.push_back(pictureSizeOf(source));
   const refhost::Composition& composition = scene_.composition;
   const veltrane_cli::LayoutPlan plan =
       veltrane_cli::planLayout(index, composition.width, composition.height);
   applyEdits(std::string("Preset ") + veltrane_cli::layouts().at(index).menuName,
-             veltrane_cli::layoutEdits(plan, composition.width, composition.height, sources));
+             veltrane_cli::layoutEdits(plan, composition.width, composition.height, sources,
+                                       pictureSizes));
 }
 
 void ViewerSession::fitPicturesToRegions() {
@@ -169,9 +182,9 @@ void ViewerSession::fitPicturesToRegions() {
   std::vector<veltrane_cli::ParamEdit> edits;
   for (const veltrane_cli::RegionShape& region :
        veltrane_cli::planRegions(plan, composition.width, composition.height)) {
-    const veltrane_cli::Framing framing = veltrane_cli::frameOnRegion(
-        region, {double(composition.width), double(composition.height)});
     const std::string n = std::to_string(region.input);
+    const veltrane_cli::Framing framing = veltrane_cli::frameOnRegion(
+        region, pictureSizeOf(std::string(engine_->valueAt("inputLayer" + n, frame_).layer)));
     edits.push_back({"inputFrameTranslation" + n,
                      refhost::ParamValue::ofPoint(static_cast<float>(framing.translation[0]),
                                                   static_cast<float>(framing.translation[1]))});

@@ -113,6 +113,10 @@ class ViewerSession {
   void attempt(const std::string& what, Action&& action);
   // The edits as one undo step of the name, each parameter that changes reported.
   void applyEdits(const std::string& stepName, const std::vector<veltrane_cli::ParamEdit>& edits);
+  // The content size at scale 100 of the picture of a layer (kNoLayer or the own layer's GUID
+  // for the effect's own input): smaller than the frame along one side for media kept at their
+  // own proportions.
+  veltrane_cli::Point pictureSizeOf(const std::string& layerGuid) const;
   // Runs a viewer event; a failure becomes the status, and any change asks for a new render.
   template <typename Event>
   refhost::ViewerOutcome event(const std::string& what, Event&& run);
