@@ -7,31 +7,35 @@
 namespace refhost {
 namespace {
 
-// Frames a source decodes ahead of the render: enough to cover a slow frame, few enough that
-// four 1080p sources hold under 100 MB; and never more than 40 MB a source, so that nine 4K
-// sources of half floats (66 MB a frame) wait with one frame each.
+// Frames a source decodes ahead of the render: enough to cover a slow frame. All the sources
+// of a composition share 128 MB for them: four 1080p sources in 8 bits (three frames each, 8 MB
+// a frame) fit whole, and larger frames are held a few at a time between all the sources
+// instead of some for each: nine 4K sources in half floats (66 MB a frame) would otherwise
+// hold 600 MB or more.
 constexpr int32_t kDecodeAhead = 3;
-constexpr std::size_t kDecodeAheadBytes = std::size_t{40} << 20;
+constexpr std::size_t kDecodeAheadBytes = std::size_t{128} << 20;
 
 // Sources that change over time (videos, the counter) decode ahead on a worker thread each.
-std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double rate) {
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double rate,
+                                    const std::shared_ptr<DecodeAheadBudget>& budget) {
   std::shared_ptr<MediaSource> source = openMediaSource(spec, rate);
   if (!source->changesOverTime()) return source;
-  return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead, kDecodeAheadBytes);
+  return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead, budget);
 }
 
 // Another reader of the same media, opened when its first frame is asked for; a media that
 // looks the same at every frame shares the one it has.
 std::function<FrameSource()> streamOpener(const MediaSpec& spec, double rate,
-                                          const std::shared_ptr<MediaSource>& first) {
+                                          const std::shared_ptr<MediaSource>& first,
+                                          const std::shared_ptr<DecodeAheadBudget>& budget) {
   if (!first->changesOverTime()) return [first] { return frameSourceOf(first); };
-  return [spec, rate] {
+  return [spec, rate, budget] {
     auto source = std::make_shared<std::shared_ptr<MediaSource>>();
-    return FrameSource(
-        [spec, rate, source](int32_t frame, int32_t width, int32_t height, PixelFormat format) {
-          if (!*source) *source = opened(spec, rate);
-          return (*source)->glRows(frame, width, height, format);
-        });
+    return FrameSource([spec, rate, budget, source](int32_t frame, int32_t width, int32_t height,
+                                                    PixelFormat format) {
+      if (!*source) *source = opened(spec, rate, budget);
+      return (*source)->glRows(frame, width, height, format);
+    });
   };
 }
 
@@ -78,7 +82,8 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
                                         PixelFormat format) {
   InstalledComposition installed;
   const double rate = composition.frameRate;
-  installed.source = opened(composition.source, rate);
+  const auto budget = std::make_shared<DecodeAheadBudget>(kDecodeAheadBytes);
+  installed.source = opened(composition.source, rate, budget);
   installed.sourceFrameCount =
       installed.source->frameCount() > 0 ? installed.source->frameCount() : composition.duration;
   FrameSettings settings;
@@ -91,7 +96,7 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
   settings.format = format;
   engine.setFrameSettings(settings);
   const std::function<FrameSource()> sourceStreams =
-      streamOpener(composition.source, rate, installed.source);
+      streamOpener(composition.source, rate, installed.source, budget);
   engine.setSourceFrames(frameSourceOf(installed.source), sourceStreams);
 
   Layer own;
@@ -110,9 +115,9 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
 
   for (const CompositionLayer& entry : composition.layers) {
     Layer layer = entry.layer;
-    std::shared_ptr<MediaSource> media = opened(entry.media, rate);
+    std::shared_ptr<MediaSource> media = opened(entry.media, rate, budget);
     layer.source = frameSourceOf(media);
-    layer.openStream = streamOpener(entry.media, rate, media);
+    layer.openStream = streamOpener(entry.media, rate, media, budget);
     engine.addLayer(layer);
   }
   return installed;

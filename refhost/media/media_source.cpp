@@ -96,19 +96,27 @@ class ProportionalSource : public MediaSource {
   explicit ProportionalSource(std::shared_ptr<MediaSource> inner)
       : inner_(std::move(inner)), info_(inner_->info()) {}
   RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override {
+    RgbaImage picture(width, height, format);
+    picture.pixels = flipRows(glRows(index, width, height, format), width, height);
+    return picture;
+  }
+  // Straight from the media's own rows: a picture that fills the size is passed on as it
+  // comes, without a copy (large frames of several media are in flight at once).
+  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
+                              PixelFormat format) override {
     const Fitted fitted = fit(width, height);
     if (fitted.width == width && fitted.height == height)
-      return inner_->frame(index, width, height, format);
-    RgbaImage inside = inner_->frame(index, fitted.width, fitted.height, format);
-    RgbaImage picture(width, height, format);
+      return inner_->glRows(index, width, height, format);
+    const std::vector<uint8_t> inside = inner_->glRows(index, fitted.width, fitted.height, format);
     const std::size_t pixel = bytesPerPixel(format);
+    std::vector<uint8_t> rows(static_cast<std::size_t>(width) * height * pixel);
+    // Rows count from the bottom here: the bars below the picture are the ones at the end.
+    const int32_t bottom = height - fitted.height - fitted.top;
     for (int32_t y = 0; y < fitted.height; ++y)
-      std::memcpy(
-          &picture
-               .pixels[((static_cast<std::size_t>(y + fitted.top)) * width + fitted.left) * pixel],
-          &inside.pixels[static_cast<std::size_t>(y) * fitted.width * pixel],
-          static_cast<std::size_t>(fitted.width) * pixel);
-    return picture;
+      std::memcpy(&rows[((static_cast<std::size_t>(y + bottom)) * width + fitted.left) * pixel],
+                  &inside[static_cast<std::size_t>(y) * fitted.width * pixel],
+                  static_cast<std::size_t>(fitted.width) * pixel);
+    return rows;
   }
   int32_t frameCount() const override { return inner_->frameCount(); }
   bool changesOverTime() const override { return inner_->changesOverTime(); }

@@ -15,9 +15,12 @@ extern "C" {
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <condition_variable>
 #include <cstdarg>
 #include <cstring>
+#include <mutex>
 #include <stdexcept>
+#include <thread>
 #include <vector>
 
 namespace refhost {
@@ -287,6 +290,36 @@ struct Scaler {
   ~Scaler() { sws_freeContext(context); }
 };
 
+// Large pictures are converted at most as many at a time as the machine has cores: more could
+// not run faster, and each holds its picture and a scratch copy (100 MB and more for 4K in
+// half floats) while it runs.
+class ConversionSlots {
+ public:
+  ConversionSlots() : free_(std::max(1u, std::thread::hardware_concurrency())) {}
+  void take() {
+    std::unique_lock<std::mutex> lock(mutex_);
+    freed_.wait(lock, [this] { return free_ > 0; });
+    --free_;
+  }
+  void giveBack() {
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      ++free_;
+    }
+    freed_.notify_one();
+  }
+
+ private:
+  std::mutex mutex_;
+  std::condition_variable freed_;
+  unsigned free_;
+};
+
+ConversionSlots& largeConversions() {
+  static ConversionSlots slots;
+  return slots;
+}
+
 }  // namespace
 
 struct VideoReader::Decoder {
@@ -297,7 +330,11 @@ struct VideoReader::Decoder {
   AVFrame* decoded = nullptr;  // scratch for avcodec_receive_frame
   AVFrame* current = nullptr;  // the last frame decoded
   Scaler eightBits, sixteenBits;
-  std::vector<uint8_t> stored;  // the converted picture before it is turned upright
+  // The converted picture before it is turned upright. Kept for the next frame up to about a
+  // 1080p picture; a larger one is given back after each frame, since many large media may be
+  // open at once and allocating it again costs little next to converting it.
+  std::vector<uint8_t> stored;
+  static constexpr std::size_t kStoredKeptUpTo = std::size_t{16} << 20;
   int stream = -1;
   AVRational timeBase{1, 25};
   // Every frame's presentation time in the stream's time base, in presentation order.
@@ -339,10 +376,21 @@ struct VideoReader::Decoder {
     const std::string refusal = refusalOf(info.colour);
     if (!refusal.empty()) throw std::runtime_error(path + ": " + refusal);
 
-    // Frame and slice threads as the machine has cores: decoding keeps up with the render
-    // instead of running on the caller's thread alone.
-    codec->thread_count = 0;
-    codec->thread_type = FF_THREAD_FRAME | FF_THREAD_SLICE;
+    // Threads as the machine has cores, so that decoding keeps up with the render instead of
+    // running on the caller's thread alone. Each frame thread holds pictures of its own besides
+    // the reference pictures, so frame threads (at most four) are for pictures up to about
+    // 1080p 4:2:2 at 10 bits; larger ones, nine of which may be open for one render, decode with
+    // slice threads (wavefronts in HEVC), which hold no extra pictures.
+    const int decodedBytes =
+        av_image_get_buffer_size(codec->pix_fmt, codec->width, codec->height, 1);
+    constexpr int kFrameThreadsUpTo = 8 << 20;
+    if (decodedBytes > 0 && decodedBytes <= kFrameThreadsUpTo) {
+      codec->thread_count = static_cast<int>(std::min(std::thread::hardware_concurrency() + 1, 5u));
+      codec->thread_type = FF_THREAD_FRAME | FF_THREAD_SLICE;
+    } else {
+      codec->thread_count = 0;
+      codec->thread_type = FF_THREAD_SLICE;
+    }
     if ((result = avcodec_open2(codec, decoderCodec, nullptr)) < 0) fail("decoder refused", result);
     packet = av_packet_alloc();
     decoded = av_frame_alloc();
@@ -604,8 +652,20 @@ std::vector<uint8_t> VideoReader::glRowsAt(double seconds, int32_t width, int32_
   decoder_->show(decoder_->frameShownAt(seconds));
   width = std::max(width, 0);
   height = std::max(height, 0);
-  std::vector<uint8_t> rows(bytesPerPixel(format) * width * height);
-  if (!rows.empty()) decoder_->convert(width, height, format, rows.data());
+  const std::size_t bytes = bytesPerPixel(format) * width * height;
+  const bool large = bytes > Decoder::kStoredKeptUpTo;
+  if (large) largeConversions().take();
+  std::vector<uint8_t> rows;
+  try {
+    rows.resize(bytes);
+    if (!rows.empty()) decoder_->convert(width, height, format, rows.data());
+  } catch (...) {
+    if (large) largeConversions().giveBack();
+    throw;
+  }
+  if (decoder_->stored.capacity() > Decoder::kStoredKeptUpTo)
+    std::vector<uint8_t>().swap(decoder_->stored);
+  if (large) largeConversions().giveBack();
   return rows;
 }
 

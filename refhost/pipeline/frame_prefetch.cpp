@@ -2,14 +2,32 @@
 #include "refhost/pipeline/frame_prefetch.h"
 
 #include <algorithm>
+#include <chrono>
 
 namespace refhost {
 
+bool DecodeAheadBudget::take(std::size_t bytes) {
+  std::lock_guard<std::mutex> lock(mutex_);
+  if (bytes > capacity_ - used_) return false;
+  used_ += bytes;
+  return true;
+}
+
+void DecodeAheadBudget::giveBack(std::size_t bytes) {
+  std::lock_guard<std::mutex> lock(mutex_);
+  used_ -= std::min(bytes, used_);
+}
+
+std::size_t DecodeAheadBudget::inUse() const {
+  std::lock_guard<std::mutex> lock(mutex_);
+  return used_;
+}
+
 PrefetchingSource::PrefetchingSource(std::shared_ptr<MediaSource> inner, int32_t depth,
-                                     std::size_t budgetBytes)
+                                     std::shared_ptr<DecodeAheadBudget> budget)
     : inner_(std::move(inner)),
       depth_(std::max(depth, 1)),
-      budgetBytes_(budgetBytes),
+      budget_(std::move(budget)),
       frameCount_(inner_->frameCount()),
       info_(inner_->info()),
       worker_([this] { work(); }) {}
@@ -21,23 +39,45 @@ PrefetchingSource::~PrefetchingSource() {
   }
   changed_.notify_all();
   worker_.join();
+  dropWaiting(ready_.begin(), ready_.end());
+}
+
+std::size_t PrefetchingSource::frameBytes() const {
+  return static_cast<std::size_t>(std::max(width_, 0)) *
+         static_cast<std::size_t>(std::max(height_, 0)) * bytesPerPixel(format_);
+}
+
+void PrefetchingSource::dropWaiting(std::map<int32_t, Prepared>::iterator from,
+                                    std::map<int32_t, Prepared>::iterator to) {
+  if (budget_)
+    for (auto it = from; it != to; ++it) budget_->giveBack(it->second.budgeted);
+  ready_.erase(from, to);
 }
 
 void PrefetchingSource::work() {
   std::unique_lock<std::mutex> lock(mutex_);
   for (;;) {
     changed_.wait(lock, [this] {
-      return stopping_ ||
-             (running_ && !failed_ && ready_.size() < static_cast<size_t>(waitingLimit()));
+      return stopping_ || (running_ && !failed_ && ready_.size() < static_cast<size_t>(depth_));
     });
     if (stopping_) return;
+    Prepared prepared;
+    // A frame before it is asked for needs room in the budget; without it the worker looks
+    // again shortly (the room is made by other sources' frames being taken) or as soon as
+    // this source is asked for a frame.
+    if (budget_ && next_ > wanted_) {
+      if (!budget_->take(frameBytes())) {
+        changed_.wait_for(lock, std::chrono::milliseconds(5));
+        continue;
+      }
+      prepared.budgeted = frameBytes();
+    }
     const int32_t index = next_++;
     preparing_ = index;
     const uint64_t generation = generation_;
     const int32_t width = width_, height = height_;
     const PixelFormat format = format_;
     lock.unlock();
-    Prepared prepared;
     try {
       prepared.rows = inner_->glRows(index, width, height, format);
     } catch (...) {
@@ -45,9 +85,12 @@ void PrefetchingSource::work() {
     }
     lock.lock();
     // Dropped when the caller has started over or moved past it meanwhile.
-    if (generation != generation_) continue;
+    if (generation != generation_ || index < wanted_) {
+      if (budget_) budget_->giveBack(prepared.budgeted);
+      if (generation == generation_) preparing_.reset();
+      continue;
+    }
     preparing_.reset();
-    if (index < wanted_) continue;
     if (prepared.error) {
       failed_ = true;
       failedAt_ = index;
@@ -67,16 +110,8 @@ bool PrefetchingSource::onCourse(int32_t index, int32_t width, int32_t height,
   return index >= lowest && index < next_ + depth_;
 }
 
-int32_t PrefetchingSource::waitingLimit() const {
-  const std::size_t frameBytes = static_cast<std::size_t>(std::max(width_, 1)) *
-                                 static_cast<std::size_t>(std::max(height_, 1)) *
-                                 bytesPerPixel(format_);
-  const std::size_t fitting = std::max<std::size_t>(budgetBytes_ / frameBytes, 1);
-  return static_cast<int32_t>(std::min<std::size_t>(fitting, static_cast<std::size_t>(depth_)));
-}
-
 void PrefetchingSource::restart(int32_t index, int32_t width, int32_t height, PixelFormat format) {
-  ready_.clear();
+  dropWaiting(ready_.begin(), ready_.end());
   width_ = width;
   height_ = height;
   format_ = format;
@@ -94,12 +129,14 @@ std::vector<uint8_t> PrefetchingSource::glRows(int32_t index, int32_t width, int
   // Frames before this one are not wanted any more; dropping them lets the worker go on, and
   // it skips straight to this one if it is not there yet.
   wanted_ = index;
-  ready_.erase(ready_.begin(), ready_.lower_bound(index));
+  dropWaiting(ready_.begin(), ready_.lower_bound(index));
   next_ = std::max(next_, index);
   changed_.notify_all();
   changed_.wait(lock, [&] { return ready_.count(index) > 0; });
   Prepared prepared = std::move(ready_[index]);
   ready_.erase(index);
+  // Handed over, the frame is the caller's and leaves the budget.
+  if (budget_) budget_->giveBack(prepared.budgeted);
   changed_.notify_all();
   if (prepared.error) {
     // The worker waits at a failed frame; asked again, it starts over there and fails anew.

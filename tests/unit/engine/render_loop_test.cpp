@@ -5,7 +5,9 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <filesystem>
+#include <thread>
 
 #include "refhost/engine/composition.h"
 #include "refhost/media/image_files.h"
@@ -44,6 +46,38 @@ TEST(PrefetchingSource, GivesTheWrappedSourcesFramesWhateverTheOrder) {
   for (int attempt = 0; attempt < 2; ++attempt)
     EXPECT_THROW(ahead.glRows(7, 2, 2, PixelFormat::Rgba8), std::runtime_error);
   EXPECT_EQ(ahead.glRows(8, 2, 2, PixelFormat::Rgba8), direct.glRows(8, 2, 2, PixelFormat::Rgba8));
+}
+
+// Sources sharing a budget for frames decoded ahead: frames ahead take room in it while they
+// wait and give it back when handed over or dropped, frames asked for go ahead without room,
+// and nothing stays taken once the sources are gone.
+TEST(PrefetchingSource, FramesAheadShareOneBudget) {
+  constexpr std::size_t kFrame = 4 * 2 * 4;  // 4x2 pixels in 8 bits
+  auto budget = std::make_shared<DecodeAheadBudget>(2 * kFrame);
+  NumberedSource direct;
+  const auto waitFor = [&](std::size_t bytes) {
+    for (int i = 0; i < 2000 && budget->inUse() != bytes; ++i)
+      std::this_thread::sleep_for(std::chrono::milliseconds(1));
+    return budget->inUse();
+  };
+  {
+    PrefetchingSource first(std::make_shared<NumberedSource>(), 3, budget);
+    PrefetchingSource second(std::make_shared<NumberedSource>(), 3, budget);
+    EXPECT_EQ(first.glRows(0, 4, 2, PixelFormat::Rgba8),
+              direct.glRows(0, 4, 2, PixelFormat::Rgba8));
+    // The first source fills the budget with frames 1 and 2 and can hold no third.
+    EXPECT_EQ(waitFor(2 * kFrame), 2 * kFrame);
+    // With no room left, the second source's frames still come when asked for.
+    for (int32_t frame = 0; frame < 4; ++frame)
+      EXPECT_EQ(second.glRows(frame, 4, 2, PixelFormat::Rgba8),
+                direct.glRows(frame, 4, 2, PixelFormat::Rgba8));
+    EXPECT_LE(budget->inUse(), 2 * kFrame);
+    // Frames handed over, or dropped by a jump, give their room back.
+    EXPECT_EQ(first.glRows(9, 4, 2, PixelFormat::Rgba8),
+              direct.glRows(9, 4, 2, PixelFormat::Rgba8));
+    EXPECT_LE(waitFor(2 * kFrame), 2 * kFrame);
+  }
+  EXPECT_EQ(budget->inUse(), 0u);
 }
 
 std::unique_ptr<Engine> engineOver(std::shared_ptr<MediaSource> source) {

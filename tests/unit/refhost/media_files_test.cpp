@@ -89,6 +89,30 @@ TEST(ImageFiles, StillsRoundTripExactlyAndStretchAsSources) {
   EXPECT_EQ(frame.pixel(5, 3), (Rgba8{10, 20, 30, 255}));
   EXPECT_EQ(source->frameCount(), 0);
 
+  // Kept at its proportions, a 2x4 picture stands unscaled and centred in a 7x4 frame between
+  // transparent bars (the odd column falls to the right), top row first as a frame, bottom row
+  // first as GL rows.
+  RgbaImage tall(2, 4);
+  for (int32_t i = 0; i < 8; ++i) {
+    const uint8_t red = i < 4 ? 255 : 0;  // red over blue
+    const uint8_t px[4] = {red, 0, static_cast<uint8_t>(255 - red), 255};
+    std::copy(px, px + 4, tall.pixels.begin() + 4 * i);
+  }
+  writeImageFile(tall, folder.file("tall.png"), ImageFormat::Png);
+  MediaSpec contained = MediaSpec::ofFile(folder.file("tall.png"));
+  contained.keepProportions = true;
+  auto kept = openMediaSource(contained, 25.0);
+  const RgbaImage shown = kept->frame(0, 7, 4, PixelFormat::Rgba8);
+  for (int32_t y = 0; y < 4; ++y)
+    for (int32_t x = 0; x < 7; ++x) {
+      const bool inside = x >= 2 && x < 4;
+      const Rgba8 expected = !inside ? Rgba8{0, 0, 0, 0}
+                             : y < 2 ? Rgba8{255, 0, 0, 255}
+                                     : Rgba8{0, 0, 255, 255};
+      EXPECT_EQ(shown.pixel(x, y), expected) << x << "," << y;
+    }
+  EXPECT_EQ(kept->glRows(0, 7, 4, PixelFormat::Rgba8), flipRows(shown.pixels, 7, 4));
+
   std::ofstream(folder.file("junk.png")) << "not an image";
   for (const char* bad : {"junk.png", "missing.mp4"}) {
     try {
