@@ -162,7 +162,9 @@ void writeWithDisplayMatrix(const std::string& from, const std::string& to, int 
   // After the version, flags, two times, the track id, a reserved word, the duration (32 or 64
   // bits each by the version), 8 reserved bytes and 8 of layer, group and volume.
   std::size_t at = box + 4 + 4 + (bytes[box + 4] == 1 ? 32 : 20) + 16;
-  for (int value : {a << 16, b << 16, 0, c << 16, d << 16, 0, 0, 0, 1 << 30}) {
+  // 1.0 in 16.16, multiplied rather than shifted in: the entries may be negative.
+  constexpr int kOne = 1 << 16;
+  for (int value : {a * kOne, b * kOne, 0, c * kOne, d * kOne, 0, 0, 0, 1 << 30}) {
     for (int shift = 24; shift >= 0; shift -= 8)
       bytes[at++] = static_cast<char>(static_cast<uint32_t>(value) >> shift & 0xFF);
   }
