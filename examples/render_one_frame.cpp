@@ -20,7 +20,11 @@ int main(int argc, char** argv) {
     refhost::EngineOptions options;
     options.modulePath = argv[1];
     refhost::Engine engine(std::move(options));  // loads the module, makes a headless context
-    engine.setFrameSettings({320, 180, 25.0});
+    refhost::FrameSettings settings;  // 8-bit frames, square pixels
+    settings.width = 320;
+    settings.height = 180;
+    settings.frameRate = 25.0;
+    engine.setFrameSettings(settings);
 
     // The effect's own source: whatever the front end decodes, here a horizontal ramp, handed
     // over as RGBA rows from the bottom up, as GL stores them.
