@@ -1,0 +1,147 @@
+// The filter: one track's picture is the effect's own source, and its inputs show that picture
+// or the same track at other frames (time-shifted copies). There is no lower track: "lower"
+// names a layer the host does not have, which the effect shows as its own source.
+#include <cstdio>
+#include <cstring>
+#include <set>
+#include <string>
+
+#include "effect_service.h"
+#include "mlt_services.h"
+#include "track_frames.h"
+
+namespace veltrane_mlt {
+namespace {
+
+const char* const kStateProperty = "_veltrane_state";
+
+EffectService& effectOf(mlt_filter filter) {
+  return *static_cast<EffectService*>(
+      mlt_properties_get_data(MLT_FILTER_PROPERTIES(filter), kStateProperty, nullptr));
+}
+
+// Filters of this thread that are fetching a frame of their own track: the fetched frame passes
+// through the same filter, which must leave it alone instead of fetching again.
+thread_local std::set<mlt_filter> fetching;
+
+class Fetching {
+ public:
+  explicit Fetching(mlt_filter filter) : filter_(filter) { fetching.insert(filter); }
+  ~Fetching() { fetching.erase(filter_); }
+  Fetching(const Fetching&) = delete;
+  Fetching& operator=(const Fetching&) = delete;
+
+ private:
+  mlt_filter filter_;
+};
+
+bool isProducer(mlt_service service) {
+  switch (mlt_service_identify(service)) {
+    case mlt_service_producer_type:
+    case mlt_service_playlist_type:
+    case mlt_service_tractor_type:
+    case mlt_service_chain_type:
+      return true;
+    default:
+      return false;
+  }
+}
+
+// Where the frame lies in the producer the filter is attached to (or, for a filter placed on a
+// tractor's track, in that track), noted while the frame is made: by the time its picture is
+// asked for, the producer has moved on.
+TrackTime trackTimeOf(mlt_filter filter, mlt_frame frame) {
+  TrackTime time;
+  mlt_properties properties = MLT_FILTER_PROPERTIES(filter);
+  auto attachedTo =
+      static_cast<mlt_service>(mlt_properties_get_data(properties, "service", nullptr));
+  time.position = static_cast<int32_t>(mlt_filter_get_position(filter, frame));
+  if (attachedTo && isProducer(attachedTo)) {
+    time.producer = reinterpret_cast<mlt_producer>(attachedTo);
+  } else {
+    time.producer =
+        multitrackTrack(MLT_FILTER_SERVICE(filter), mlt_properties_get_int(properties, "track"));
+    time.position = static_cast<int32_t>(mlt_frame_get_position(frame));
+  }
+  if (!canSeek(time.producer) || !clipCanSeek(frame)) time.producer = nullptr;
+  time.length = time.producer ? static_cast<int32_t>(mlt_producer_get_playtime(time.producer))
+                              : time.position + 1;
+  return time;
+}
+
+// The frame's notes of one filter: a frame may pass through several filters of this kind.
+std::string noteName(mlt_filter filter, const char* what) {
+  char prefix[48];
+  std::snprintf(prefix, sizeof prefix, "_veltrane.%p.", static_cast<void*>(filter));
+  return prefix + std::string(what);
+}
+
+int filterImage(mlt_frame frame, uint8_t** image, mlt_image_format* format, int* width, int* height,
+                int) {
+  auto filter = static_cast<mlt_filter>(mlt_frame_pop_service(frame));
+  mlt_properties noted = MLT_FRAME_PROPERTIES(frame);
+  const mlt_position position = mlt_filter_get_position(filter, frame);
+  const mlt_position length = mlt_filter_get_length2(filter, frame);
+
+  *format = mlt_image_rgba;
+  int error = mlt_frame_get_image(frame, image, format, width, height, 1);
+  if (error || !*image || *format != mlt_image_rgba) return error ? error : 1;
+  const int32_t w = *width, h = *height;
+  const std::size_t size = static_cast<std::size_t>(w) * h * 4;
+
+  RenderRequest request;
+  request.width = w;
+  request.height = h;
+  fillComposition(MLT_FILTER_SERVICE(filter), request);
+  request.own.position = mlt_properties_get_int(noted, noteName(filter, "position").c_str());
+  request.own.length = mlt_properties_get_int(noted, noteName(filter, "length").c_str());
+  request.own.current = *image;
+  if (auto producer = static_cast<mlt_producer>(
+          mlt_properties_get_data(noted, noteName(filter, "producer").c_str(), nullptr))) {
+    request.own.other = [filter, producer, frame](int32_t at, int32_t pictureWidth,
+                                                  int32_t pictureHeight) {
+      Fetching guard(filter);
+      return pictureAt(producer, at, pictureWidth, pictureHeight, frame);
+    };
+  }
+
+  auto* out = static_cast<uint8_t*>(mlt_pool_alloc(static_cast<int>(size)));
+  if (!effectOf(filter).render(static_cast<int>(position), static_cast<int>(length), request,
+                               out)) {
+    mlt_pool_release(out);
+    return 0;  // the picture stays as it came
+  }
+  mlt_frame_set_image(frame, out, static_cast<int>(size), mlt_pool_release);
+  *image = out;
+  return 0;
+}
+
+mlt_frame filterProcess(mlt_filter filter, mlt_frame frame) {
+  if (fetching.count(filter)) return frame;
+  TrackTime time = trackTimeOf(filter, frame);
+  mlt_properties noted = MLT_FRAME_PROPERTIES(frame);
+  mlt_properties_set_int(noted, noteName(filter, "position").c_str(), time.position);
+  mlt_properties_set_int(noted, noteName(filter, "length").c_str(), time.length);
+  mlt_properties_set_data(noted, noteName(filter, "producer").c_str(), time.producer, 0, nullptr,
+                          nullptr);
+  mlt_frame_push_service(frame, filter);
+  mlt_frame_push_get_image(frame, filterImage);
+  return frame;
+}
+
+}  // namespace
+
+mlt_filter makeFilter(const char* modulePath) {
+  mlt_filter filter = mlt_filter_new();
+  if (!filter) return nullptr;
+  mlt_properties properties = MLT_FILTER_PROPERTIES(filter);
+  if (modulePath && *modulePath) mlt_properties_set(properties, kModuleProperty, modulePath);
+  mlt_properties_set_data(
+      properties, kStateProperty,
+      new EffectService(MLT_FILTER_SERVICE(filter), false, "the picture"), 0,
+      [](void* state) { delete static_cast<EffectService*>(state); }, nullptr);
+  filter->process = filterProcess;
+  return filter;
+}
+
+}  // namespace veltrane_mlt

@@ -1,0 +1,174 @@
+// One thread's engine: the module driven through refhost's engine, fed with MLT's pictures.
+#include "frame_renderer.h"
+
+#include <algorithm>
+#include <cstring>
+
+#include "property_values.h"
+#include "refhost/pipeline/frame_readback.h"
+#include "track_frames.h"
+
+namespace veltrane_mlt {
+namespace {
+
+// Host textures of one frame, given back to the host's pool however the frame ends.
+class FrameTextures {
+ public:
+  FrameTextures(refhost::Host& host, int32_t width, int32_t height, const uint8_t* sourceRows)
+      : host_(host) {
+    source = host.createTexture(width, height, sourceRows);
+    output = host.createTexture(width, height);
+  }
+  ~FrameTextures() {
+    host_.deleteTexture(output.id);
+    host_.deleteTexture(source.id);
+    host_.setPixelScale(1);
+  }
+  FrameTextures(const FrameTextures&) = delete;
+  FrameTextures& operator=(const FrameTextures&) = delete;
+
+  TextureRecord source{};
+  TextureRecord output{};
+
+ private:
+  refhost::Host& host_;
+};
+
+bool sameSettings(const refhost::FrameSettings& a, const refhost::FrameSettings& b) {
+  return a.width == b.width && a.height == b.height && a.frameRate == b.frameRate &&
+         a.pixelAspect == b.pixelAspect && a.sourceFrameCount == b.sourceFrameCount &&
+         a.ownLayerGuid == b.ownLayerGuid;
+}
+
+}  // namespace
+
+FrameRenderer::FrameRenderer(const std::string& modulePath, bool withLowerTrack)
+    : withLowerTrack_(withLowerTrack) {
+  std::unique_ptr<refhost::GlContext> context;
+  try {
+    context = std::make_unique<refhost::GlContext>(refhost::GlProfile::Core);
+  } catch (const std::exception& error) {
+    throw GlUnavailable(error.what());
+  }
+  refhost::EngineOptions options;
+  options.modulePath = modulePath;
+  options.context = std::move(context);
+  engine_ = std::make_unique<refhost::Engine>(std::move(options));
+
+  auto ownRows = [this](int32_t frame, int32_t width, int32_t height, refhost::PixelFormat) {
+    return request_ ? rowsOf(request_->own, frame, width, height) : std::vector<uint8_t>();
+  };
+  engine_->setSourceFrames(ownRows);
+  // The layer picker lists the track the effect sits on first, as the host lists its own
+  // layer; choosing it means the own source.
+  refhost::Layer own;
+  own.guid = kOwnLayerGuid;
+  own.name = "This track";
+  own.source = ownRows;
+  engine_->addLayer(own);
+  if (withLowerTrack_) {
+    refhost::Layer lower;
+    lower.guid = kLowerLayerGuid;
+    lower.name = "Lower track";
+    lower.source = [this](int32_t frame, int32_t width, int32_t height, refhost::PixelFormat) {
+      return request_ ? rowsOf(request_->lower, frame, width, height) : std::vector<uint8_t>();
+    };
+    engine_->addLayer(lower);
+  }
+  engine_->start();
+  engine_->createInstance();
+  for (const refhost::Param& param : engine_->panel().params())
+    applied_.push_back(param.state.value);
+}
+
+FrameRenderer::~FrameRenderer() = default;
+
+std::vector<uint8_t> FrameRenderer::rowsOf(const TrackPictures& track, int32_t position,
+                                           int32_t width, int32_t height) const {
+  // Called by the host from inside the plug-in's render: nothing may be thrown through it. An
+  // empty answer is a frame the host does not have, which the effect shows as such.
+  try {
+    const std::size_t rowBytes = static_cast<std::size_t>(width) * 4;
+    std::vector<uint8_t> other;
+    const uint8_t* pixels = nullptr;
+    if (position == track.position && width == request_->width && height == request_->height &&
+        track.current) {
+      pixels = track.current;
+    } else if (track.other) {
+      other = track.other(position, width, height);
+      if (other.size() != rowBytes * static_cast<std::size_t>(height)) return {};
+      pixels = other.data();
+    } else {
+      return {};
+    }
+    std::vector<uint8_t> rows(rowBytes * static_cast<std::size_t>(height));
+    copyRowsFlipped(pixels, rows.data(), rowBytes, height);
+    return rows;
+  } catch (const std::exception&) {
+    return {};
+  }
+}
+
+void FrameRenderer::applyComposition(const RenderRequest& request) {
+  refhost::FrameSettings settings;
+  settings.width = request.compositionWidth;
+  settings.height = request.compositionHeight;
+  settings.frameRate = request.frameRate;
+  settings.pixelAspect = request.pixelAspect;
+  settings.sourceFrameCount = request.own.length;
+  settings.ownLayerGuid = kOwnLayerGuid;
+  if (!sameSettings(settings, engine_->frameSettings())) engine_->setFrameSettings(settings);
+
+  // The frame number is the own track's position, and a transition's tracks share their
+  // positions (the composition's): every layer starts at frame 0 and plays its track's frames.
+  std::vector<refhost::Layer>& layers = engine_->host().layers();
+  const TrackPictures* tracks[] = {&request.own, &request.lower};
+  for (std::size_t i = 0; i < layers.size() && i < 2; ++i) {
+    layers[i].frameCount = std::max(1, tracks[i]->length);
+    layers[i].width = request.compositionWidth;
+    layers[i].height = request.compositionHeight;
+  }
+}
+
+void FrameRenderer::applyValues(const std::vector<refhost::ParamValue>& values) {
+  const std::vector<refhost::Param>& params = engine_->panel().params();
+  for (std::size_t i = 0; i < params.size() && i < values.size(); ++i) {
+    if (values[i] == applied_[i]) continue;
+    engine_->setParam(params[i].id, values[i]);
+    applied_[i] = values[i];
+  }
+}
+
+void FrameRenderer::render(const RenderRequest& request, uint8_t* out) {
+  struct Current {
+    const RenderRequest*& slot;
+    ~Current() { slot = nullptr; }
+  } current{request_};
+  request_ = &request;
+  applyComposition(request);
+  applyValues(request.values);
+
+  const int32_t width = request.width, height = request.height;
+  const std::size_t rowBytes = static_cast<std::size_t>(width) * 4;
+  upload_.resize(rowBytes * static_cast<std::size_t>(height));
+  copyRowsFlipped(request.own.current, upload_.data(), rowBytes, height);
+
+  refhost::Host& host = engine_->host();
+  FrameTextures textures(host, width, height, upload_.data());
+  // A picture of another size than the composition's (an editor's preview) is rendered as the
+  // host renders previews: everything in pixels scaled to it.
+  if (width != request.compositionWidth || height != request.compositionHeight)
+    host.setPixelScale(static_cast<double>(height) / request.compositionHeight);
+  refhost::FrameSettings settings = engine_->frameSettings();
+  settings.width = width;
+  settings.height = height;
+  {
+    refhost::RenderFrame frame(host, settings, request.own.position, textures.source,
+                               textures.output);
+    engine_->render(frame);
+  }
+  refhost::RgbaImage picture = refhost::readBack(textures.output.id, width, height);
+  std::memcpy(out, picture.pixels.data(), rowBytes * static_cast<std::size_t>(height));
+}
+
+}  // namespace veltrane_mlt

@@ -1,0 +1,12 @@
+// The services this MLT module registers.
+#pragma once
+
+#include <framework/mlt.h>
+
+namespace veltrane_mlt {
+
+// `modulePath`, when given (the service's argument), sets the `plugin` property.
+mlt_transition makeTransition(const char* modulePath);
+mlt_filter makeFilter(const char* modulePath);
+
+}  // namespace veltrane_mlt

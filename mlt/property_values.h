@@ -1,0 +1,40 @@
+// The effect's parameters as MLT properties: each declared parameter is read from the property
+// of the same id at a frame's position, keyframes interpolated by MLT, and checked the way the
+// module would check it.
+#pragma once
+
+#include <framework/mlt.h>
+
+#include <string>
+#include <vector>
+
+#include "refhost/engine.h"
+
+namespace veltrane_mlt {
+
+// The GUID a layer parameter holds for the lower track of a transition.
+extern const char* const kLowerLayerGuid;
+// The GUID of the track the effect itself is applied to.
+extern const char* const kOwnLayerGuid;
+
+// A property whose text the module would refuse; the parameter took its default.
+struct Refusal {
+  std::string id;
+  std::string text;
+  std::string reason;  // e.g. "expected a number from 0 to 200"
+};
+
+struct ParamReading {
+  // Every declared parameter with its value, in declaration order.
+  std::vector<refhost::ParamValue> values;
+  std::vector<Refusal> refusals;
+};
+
+// Reads every parameter of `panel` from `properties` at `position` of an item `length` frames
+// long. An unset property gives the declared default; so does a refused one, reported in
+// `refusals`. Numbers, angles, points and colours follow MLT's keyframes ("0=15;100=75");
+// choices, booleans and layers hold MLT's key at or before the position.
+ParamReading readParams(mlt_properties properties, const refhost::ParamPanel& panel, int position,
+                        int length);
+
+}  // namespace veltrane_mlt

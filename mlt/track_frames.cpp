@@ -1,0 +1,132 @@
+// Seeking tracks for time-shifted pictures, and the pixel copies between MLT and GL.
+#include "track_frames.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstring>
+
+namespace veltrane_mlt {
+
+mlt_producer multitrackTrack(mlt_service service, int index) {
+  // A tractor's field chains its filters and transitions one after another in front of the
+  // multitrack; the first input of each leads down to it.
+  for (int depth = 0; service && depth < 1000; ++depth) {
+    if (mlt_service_identify(service) == mlt_service_multitrack_type) {
+      mlt_multitrack multitrack = reinterpret_cast<mlt_multitrack>(service);
+      if (index < 0 || index >= mlt_multitrack_count(multitrack)) return nullptr;
+      return mlt_multitrack_track(multitrack, index);
+    }
+    service = mlt_service_producer(service);
+  }
+  return nullptr;
+}
+
+bool canSeek(mlt_producer producer) {
+  if (!producer || mlt_producer_get_playtime(producer) <= 0) return false;
+  mlt_properties properties = MLT_PRODUCER_PROPERTIES(producer);
+  return !mlt_properties_get(properties, "seekable") ||
+         mlt_properties_get_int(properties, "seekable") != 0;
+}
+
+namespace {
+
+bool saysUnseekable(mlt_producer producer) {
+  if (!producer) return false;
+  mlt_properties properties = MLT_PRODUCER_PROPERTIES(producer);
+  return mlt_properties_get(properties, "seekable") &&
+         mlt_properties_get_int(properties, "seekable") == 0;
+}
+
+}  // namespace
+
+bool clipCanSeek(mlt_frame frame) {
+  mlt_producer clip = mlt_frame_get_original_producer(frame);
+  return !saysUnseekable(clip) && !(clip && saysUnseekable(mlt_producer_cut_parent(clip)));
+}
+
+namespace {
+
+// Puts the play head back without mlt_producer_seek's side effect at the end: seeking to the
+// end pauses a producer, which a play head one past its last frame (where reading in order
+// leaves it) must not do.
+void restorePosition(mlt_producer producer, mlt_position position) {
+  if (position >= 0 && position < mlt_producer_get_playtime(producer)) {
+    mlt_producer_seek(producer, position);
+    return;
+  }
+  mlt_properties properties = MLT_PRODUCER_PROPERTIES(producer);
+  mlt_properties_set_position(properties, "_position", position);
+  mlt_properties_set_position(properties, "_frame", mlt_producer_get_in(producer) + position);
+}
+
+}  // namespace
+
+std::vector<uint8_t> pictureAt(mlt_producer producer, int32_t position, int32_t width,
+                               int32_t height, mlt_frame like) {
+  if (!canSeek(producer) || position < 0 || position >= mlt_producer_get_playtime(producer) ||
+      width <= 0 || height <= 0)
+    return {};
+  mlt_service service = MLT_PRODUCER_SERVICE(producer);
+  mlt_frame frame = nullptr;
+  const mlt_position before = mlt_producer_position(producer);
+  mlt_producer_seek(producer, position);
+  int failed = mlt_service_get_frame(service, &frame, 0);
+  restorePosition(producer, before);
+  if (failed || !frame) {
+    if (frame) mlt_frame_close(frame);
+    return {};
+  }
+  if (like) {
+    mlt_properties_pass_list(MLT_FRAME_PROPERTIES(frame), MLT_FRAME_PROPERTIES(like),
+                             "rescale.interp, consumer_deinterlace, deinterlace_method, "
+                             "consumer_tff, consumer_color_trc, consumer.progressive");
+    mlt_frame_set_aspect_ratio(frame, mlt_frame_get_aspect_ratio(like));
+  }
+  mlt_image_format format = mlt_image_rgba;
+  int frameWidth = width, frameHeight = height;
+  uint8_t* image = nullptr;
+  std::vector<uint8_t> picture;
+  if (!mlt_frame_get_image(frame, &image, &format, &frameWidth, &frameHeight, 0) && image &&
+      format == mlt_image_rgba && frameWidth > 0 && frameHeight > 0) {
+    picture = frameWidth == width && frameHeight == height
+                  ? std::vector<uint8_t>(image, image + std::size_t(width) * height * 4)
+                  : stretched(image, frameWidth, frameHeight, width, height);
+  }
+  mlt_frame_close(frame);
+  return picture;
+}
+
+std::vector<uint8_t> stretched(const uint8_t* from, int32_t fromWidth, int32_t fromHeight,
+                               int32_t width, int32_t height) {
+  std::vector<uint8_t> to(std::size_t(width) * height * 4);
+  const double scaleX = double(fromWidth) / width, scaleY = double(fromHeight) / height;
+  for (int32_t y = 0; y < height; ++y) {
+    const double sourceY = std::clamp((y + 0.5) * scaleY - 0.5, 0.0, fromHeight - 1.0);
+    const int32_t y0 = static_cast<int32_t>(sourceY), y1 = std::min(y0 + 1, fromHeight - 1);
+    const double fy = sourceY - y0;
+    for (int32_t x = 0; x < width; ++x) {
+      const double sourceX = std::clamp((x + 0.5) * scaleX - 0.5, 0.0, fromWidth - 1.0);
+      const int32_t x0 = static_cast<int32_t>(sourceX), x1 = std::min(x0 + 1, fromWidth - 1);
+      const double fx = sourceX - x0;
+      const uint8_t* p00 = from + (std::size_t(y0) * fromWidth + x0) * 4;
+      const uint8_t* p01 = from + (std::size_t(y0) * fromWidth + x1) * 4;
+      const uint8_t* p10 = from + (std::size_t(y1) * fromWidth + x0) * 4;
+      const uint8_t* p11 = from + (std::size_t(y1) * fromWidth + x1) * 4;
+      uint8_t* out = to.data() + (std::size_t(y) * width + x) * 4;
+      for (int c = 0; c < 4; ++c) {
+        const double top = p00[c] + (p01[c] - p00[c]) * fx;
+        const double bottom = p10[c] + (p11[c] - p10[c]) * fx;
+        out[c] = static_cast<uint8_t>(std::lround(top + (bottom - top) * fy));
+      }
+    }
+  }
+  return to;
+}
+
+void copyRowsFlipped(const uint8_t* from, uint8_t* to, std::size_t rowBytes, int32_t rows) {
+  for (int32_t row = 0; row < rows; ++row)
+    std::memcpy(to + std::size_t(rows - 1 - row) * rowBytes, from + std::size_t(row) * rowBytes,
+                rowBytes);
+}
+
+}  // namespace veltrane_mlt
