@@ -81,7 +81,13 @@ FrameRenderer::FrameRenderer(const std::string& modulePath, bool withLowerTrack)
     applied_.push_back(param.state.value);
 }
 
-FrameRenderer::~FrameRenderer() = default;
+FrameRenderer::~FrameRenderer() {
+  // The read-back's buffers belong to the engine's context.
+  if (readback_) {
+    engine_->gl().makeCurrent();
+    readback_.reset();
+  }
+}
 
 std::vector<uint8_t> FrameRenderer::rowsOf(const TrackPictures& track, int32_t position,
                                            int32_t width, int32_t height) const {
@@ -167,8 +173,14 @@ void FrameRenderer::render(const RenderRequest& request, uint8_t* out) {
                                textures.output);
     engine_->render(frame);
   }
-  refhost::RgbaImage picture = refhost::readBack(textures.output.id, width, height);
-  std::memcpy(out, picture.pixels.data(), rowBytes * static_cast<std::size_t>(height));
+  if (!readback_ || readbackWidth_ != width || readbackHeight_ != height) {
+    readback_.reset();
+    readback_ = std::make_unique<refhost::FrameReadback>(width, height, 1);
+    readbackWidth_ = width;
+    readbackHeight_ = height;
+  }
+  readback_->start(textures.output.id);
+  readback_->collectInto(out);
 }
 
 }  // namespace veltrane_mlt

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "refhost/engine.h"
+#include "refhost/pipeline/frame_readback.h"
 
 namespace veltrane_mlt {
 
@@ -70,6 +71,9 @@ class FrameRenderer {
   bool withLowerTrack_;
   const RenderRequest* request_ = nullptr;  // the frame being rendered, for the frame sources
   std::vector<uint8_t> upload_;             // the own picture turned bottom row first
+  // Kept from frame to frame while the size stays: a new one would allocate its buffer anew.
+  std::unique_ptr<refhost::FrameReadback> readback_;
+  int32_t readbackWidth_ = 0, readbackHeight_ = 0;
   std::vector<refhost::ParamValue> applied_;
 };
 

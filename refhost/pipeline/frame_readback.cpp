@@ -60,6 +60,12 @@ bool FrameReadback::start(uint32_t texture) {
 }
 
 RgbaImage FrameReadback::collect() {
+  RgbaImage picture(width_, height_, format_);
+  collectInto(picture.pixels.data());
+  return picture;
+}
+
+void FrameReadback::collectInto(uint8_t* to) {
   if (pending_.empty()) throw std::logic_error("refhost::FrameReadback::collect: nothing read");
   const Pending read = pending_.front();
   pending_.pop_front();
@@ -68,19 +74,17 @@ RgbaImage FrameReadback::collect() {
   }
   glDeleteSync(fence);
 
-  RgbaImage picture(width_, height_, format_);
   const std::size_t row = rowBytes(width_, format_);
   glBindBuffer(GL_PIXEL_PACK_BUFFER, read.buffer);
-  const auto bytes = static_cast<GLsizeiptr>(picture.pixels.size());
+  const auto bytes = static_cast<GLsizeiptr>(row * static_cast<std::size_t>(height_));
   const auto* mapped = static_cast<const uint8_t*>(
       glMapBufferRange(GL_PIXEL_PACK_BUFFER, 0, bytes, GL_MAP_READ_BIT));
   // GL's rows run bottom up; the copy out of the buffer turns them the right way up.
-  if (mapped) copyRowsFlipped(mapped, picture.pixels.data(), row, height_);
+  if (mapped) copyRowsFlipped(mapped, to, row, height_);
   if (mapped) glUnmapBuffer(GL_PIXEL_PACK_BUFFER);
   glBindBuffer(GL_PIXEL_PACK_BUFFER, 0);
   free_.push_back(read.buffer);
   if (!mapped) throw std::runtime_error("cannot map the read-back buffer of a rendered frame");
-  return picture;
 }
 
 RgbaImage readBack(uint32_t texture, int32_t width, int32_t height, PixelFormat format) {

@@ -30,6 +30,9 @@ class FrameReadback {
   // The oldest read as a picture, top row first; waits for GL where it has not finished.
   // Throws std::logic_error when nothing is in flight.
   RgbaImage collect();
+  // The same into the caller's memory (width x height pixels of the format), for a caller
+  // that keeps its own buffer from frame to frame.
+  void collectInto(uint8_t* to);
 
  private:
   struct Pending {

@@ -72,7 +72,11 @@ TEST(EngineEmbedding, RendersFromTheCallersContextAndTextures) {
     options.modulePath = VELTRANE_MODULE_PATH;
     options.context = GlContext::adoptCurrent(GlProfile::Core, [&] { own.makeCurrent(); });
     Engine engine(std::move(options));
-    engine.setFrameSettings({kWidth, kHeight, 30.0});
+    FrameSettings settings;
+    settings.width = kWidth;
+    settings.height = kHeight;
+    settings.frameRate = 30.0;
+    engine.setFrameSettings(settings);
     engine.start();
     engine.createInstance();
 
