@@ -108,7 +108,7 @@ std::vector<uint8_t> FrameRenderer::rowsOf(const TrackPictures& track, int32_t p
       return {};
     }
     std::vector<uint8_t> rows(rowBytes * static_cast<std::size_t>(height));
-    copyRowsFlipped(pixels, rows.data(), rowBytes, height);
+    refhost::copyRowsFlipped(pixels, rows.data(), rowBytes, height);
     return rows;
   } catch (const std::exception&) {
     return {};
@@ -157,7 +157,8 @@ void FrameRenderer::render(const RenderRequest& request, uint8_t* out) {
   const int32_t width = request.width, height = request.height;
   const std::size_t rowBytes = static_cast<std::size_t>(width) * 4;
   upload_.resize(rowBytes * static_cast<std::size_t>(height));
-  copyRowsFlipped(request.own.current, upload_.data(), rowBytes, height);
+  // MLT's pictures run top row first, GL's textures bottom row first.
+  refhost::copyRowsFlipped(request.own.current, upload_.data(), rowBytes, height);
 
   refhost::Host& host = engine_->host();
   FrameTextures textures(host, width, height, upload_.data());

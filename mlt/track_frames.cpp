@@ -1,9 +1,8 @@
-// Seeking tracks for time-shifted pictures, and the pixel copies between MLT and GL.
+// Seeking tracks for time-shifted pictures, and stretching a picture to the render's size.
 #include "track_frames.h"
 
 #include <algorithm>
 #include <cmath>
-#include <cstring>
 
 namespace veltrane_mlt {
 
@@ -121,12 +120,6 @@ std::vector<uint8_t> stretched(const uint8_t* from, int32_t fromWidth, int32_t f
     }
   }
   return to;
-}
-
-void copyRowsFlipped(const uint8_t* from, uint8_t* to, std::size_t rowBytes, int32_t rows) {
-  for (int32_t row = 0; row < rows; ++row)
-    std::memcpy(to + std::size_t(rows - 1 - row) * rowBytes, from + std::size_t(row) * rowBytes,
-                rowBytes);
 }
 
 }  // namespace veltrane_mlt

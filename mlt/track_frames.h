@@ -1,5 +1,5 @@
 // Pictures of a track at other positions than the frame being rendered: finding the producer
-// that can be sought for them, and fetching, stretching and turning pictures as GL wants them.
+// that can be sought for them, and fetching and stretching pictures to the render's size.
 #pragma once
 
 #include <framework/mlt.h>
@@ -39,9 +39,5 @@ std::vector<uint8_t> pictureAt(mlt_producer producer, int32_t position, int32_t 
 // fromWidth x fromHeight RGBA pixels.
 std::vector<uint8_t> stretched(const uint8_t* from, int32_t fromWidth, int32_t fromHeight,
                                int32_t width, int32_t height);
-
-// Copies `rows` rows of `rowBytes` bytes in the opposite order: MLT's top-first pictures to
-// GL's bottom-first textures and back.
-void copyRowsFlipped(const uint8_t* from, uint8_t* to, std::size_t rowBytes, int32_t rows);
 
 }  // namespace veltrane_mlt
