@@ -20,7 +20,7 @@ int main(int argc, char** argv) {
     refhost::EngineOptions options;
     options.modulePath = argv[1];
     refhost::Engine engine(std::move(options));  // loads the module, makes a headless context
-    refhost::FrameSettings settings;  // 8-bit frames, square pixels
+    refhost::FrameSettings settings;             // 8-bit frames, square pixels
     settings.width = 320;
     settings.height = 180;
     settings.frameRate = 25.0;

@@ -183,8 +183,8 @@ Framing frameOnRegion(const RegionShape& region, Point pictureSize) {
   return framing;
 }
 
-Point contentSize(int32_t pictureWidth, int32_t pictureHeight, bool keepsProportions,
-                  double width, double height) {
+Point contentSize(int32_t pictureWidth, int32_t pictureHeight, bool keepsProportions, double width,
+                  double height) {
   if (!keepsProportions || pictureWidth <= 0 || pictureHeight <= 0) return {width, height};
   const double scale = std::min(width / pictureWidth, height / pictureHeight);
   return {pictureWidth * scale, pictureHeight * scale};

@@ -71,8 +71,8 @@ Framing frameOnRegion(const RegionShape& region, Point pictureSize);
 // The size of a picture's content at scale 100 in a frame of `width` x `height`: the frame's
 // own for a picture that is stretched to it (or has no size of its own, 0 x 0), else the
 // largest of the picture's proportions inside the frame.
-Point contentSize(int32_t pictureWidth, int32_t pictureHeight, bool keepsProportions,
-                  double width, double height);
+Point contentSize(int32_t pictureWidth, int32_t pictureHeight, bool keepsProportions, double width,
+                  double height);
 
 // Every cut and input parameter of the plan (unused cuts and inputs back to their defaults).
 // The inputs the plan shows take `sources` in turn (a layer GUID each, the null GUID for the

@@ -55,9 +55,9 @@ TEST(DocumentedExamples, TheEventScriptsResultIsWhatInteractGives) {
 // (its description names the layout and the number of pictures), and there is one for every
 // layout, so that the documented scenes cannot fall behind the layouts.
 TEST(DocumentedExamples, EveryLayoutsPresetSceneIsWhatSplitMakes) {
-  const std::vector<std::string> pictures{
-      "pattern:counter", "pattern:bars",  "pattern:checker", "pattern:gradient", "color:1a8c99",
-      "color:f2a626",    "color:80408c",  "color:668c33",    "color:4d5973"};
+  const std::vector<std::string> pictures{"pattern:counter",  "pattern:bars", "pattern:checker",
+                                          "pattern:gradient", "color:1a8c99", "color:f2a626",
+                                          "color:80408c",     "color:668c33", "color:4d5973"};
   std::vector<std::string> presets;
   for (const auto& entry : std::filesystem::directory_iterator(kDocs + "examples/presets")) {
     presets.push_back(entry.path().stem().string());
