@@ -66,15 +66,10 @@ class StillImageSource : public MediaSource {
   RgbaImage scaled_;
 };
 
-class VideoSource : public MediaSource {
+class VideoSource : public GlRowsSource {
  public:
   VideoSource(const std::string& path, double compositionRate)
       : reader_(path), rate_(compositionRate > 0 ? compositionRate : 25.0) {}
-  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override {
-    RgbaImage picture(width, height, format);
-    picture.pixels = flipRows(glRows(index, width, height, format), width, height);
-    return picture;
-  }
   std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
                               PixelFormat format) override {
     return reader_.glRowsAt(index / rate_, width, height, format);
@@ -91,15 +86,10 @@ class VideoSource : public MediaSource {
 };
 
 // A media's pictures shown whole at their own proportions inside the size asked for.
-class ProportionalSource : public MediaSource {
+class ProportionalSource : public GlRowsSource {
  public:
   explicit ProportionalSource(std::shared_ptr<MediaSource> inner)
       : inner_(std::move(inner)), info_(inner_->info()) {}
-  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override {
-    RgbaImage picture(width, height, format);
-    picture.pixels = flipRows(glRows(index, width, height, format), width, height);
-    return picture;
-  }
   // Straight from the media's own rows: a picture that fills the size is passed on as it
   // comes, without a copy (large frames of several media are in flight at once).
   std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
@@ -152,6 +142,12 @@ std::vector<uint8_t> MediaSource::glRows(int32_t index, int32_t width, int32_t h
                                          PixelFormat format) {
   RgbaImage image = frame(index, width, height, format);
   return flipRows(image.pixels, image.width, image.height);
+}
+
+RgbaImage GlRowsSource::frame(int32_t index, int32_t width, int32_t height, PixelFormat format) {
+  RgbaImage picture(width, height, format);
+  picture.pixels = flipRows(glRows(index, width, height, format), width, height);
+  return picture;
 }
 
 MediaSpec MediaSpec::ofPattern(Pattern pattern) {

@@ -67,6 +67,15 @@ class MediaSource {
   virtual MediaInfo info() const { return {}; }
 };
 
+// A media that makes its pictures in GL's row order (decoders writing straight into upload
+// order, queues of such rows): the top-first picture is those rows turned over.
+class GlRowsSource : public MediaSource {
+ public:
+  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) final;
+  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
+                              PixelFormat format) override = 0;
+};
+
 // Throws std::runtime_error naming the file when a file cannot be opened or decoded, or holds
 // what the host does not show (see VideoReader). Composition frame n at `compositionRate`
 // frames a second shows the media's picture whose presentation time is the latest at or before

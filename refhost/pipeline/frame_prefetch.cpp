@@ -146,11 +146,4 @@ std::vector<uint8_t> PrefetchingSource::glRows(int32_t index, int32_t width, int
   return std::move(prepared.rows);
 }
 
-RgbaImage PrefetchingSource::frame(int32_t index, int32_t width, int32_t height,
-                                   PixelFormat format) {
-  RgbaImage image(width, height, format);
-  image.pixels = flipRows(glRows(index, width, height, format), image.width, image.height);
-  return image;
-}
-
 }  // namespace refhost

@@ -41,7 +41,7 @@ class DecodeAheadBudget {
 // or far ahead of the worker starts it over there. At most `depth` frames wait; each frame
 // prepared before it is asked for holds its bytes in `budget` (when one is given) until it is
 // handed over or dropped, and the worker waits while they do not fit.
-class PrefetchingSource : public MediaSource {
+class PrefetchingSource : public GlRowsSource {
  public:
   PrefetchingSource(std::shared_ptr<MediaSource> inner, int32_t depth,
                     std::shared_ptr<DecodeAheadBudget> budget = nullptr);
@@ -49,7 +49,6 @@ class PrefetchingSource : public MediaSource {
   PrefetchingSource(const PrefetchingSource&) = delete;
   PrefetchingSource& operator=(const PrefetchingSource&) = delete;
 
-  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override;
   std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
                               PixelFormat format) override;
   int32_t frameCount() const override { return frameCount_; }

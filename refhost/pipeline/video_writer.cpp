@@ -26,18 +26,9 @@ std::string errorText(int code) {
   return buffer;
 }
 
+// FFmpeg's muxers are named as the containers' file extensions, but for Matroska's.
 const char* muxerName(VideoContainer container) {
-  switch (container) {
-    case VideoContainer::Mp4:
-      return "mp4";
-    case VideoContainer::Mov:
-      return "mov";
-    case VideoContainer::Mkv:
-      return "matroska";
-    case VideoContainer::Webm:
-      return "webm";
-  }
-  return "mp4";
+  return container == VideoContainer::Mkv ? "matroska" : containerExtension(container);
 }
 
 // Half floats to 16 bits a channel, clamped to 0 to 1 and rounded, one lookup a sample.
