@@ -174,11 +174,9 @@ void FrameRenderer::render(const RenderRequest& request, uint8_t* out) {
                                textures.output);
     engine_->render(frame);
   }
-  if (!readback_ || readbackWidth_ != width || readbackHeight_ != height) {
+  if (!readback_ || readback_->width() != width || readback_->height() != height) {
     readback_.reset();
     readback_ = std::make_unique<refhost::FrameReadback>(width, height, 1);
-    readbackWidth_ = width;
-    readbackHeight_ = height;
   }
   readback_->start(textures.output.id);
   readback_->collectInto(out);

@@ -73,7 +73,6 @@ class FrameRenderer {
   std::vector<uint8_t> upload_;             // the own picture turned bottom row first
   // Kept from frame to frame while the size stays: a new one would allocate its buffer anew.
   std::unique_ptr<refhost::FrameReadback> readback_;
-  int32_t readbackWidth_ = 0, readbackHeight_ = 0;
   std::vector<refhost::ParamValue> applied_;
 };
 

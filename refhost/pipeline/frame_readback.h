@@ -25,6 +25,8 @@ class FrameReadback {
   // Starts reading the texture into the next free buffer; false when `depth` reads are in
   // flight already (collect one first).
   bool start(uint32_t texture);
+  int32_t width() const { return width_; }
+  int32_t height() const { return height_; }
   int32_t inFlight() const { return static_cast<int32_t>(pending_.size()); }
   bool full() const { return inFlight() >= static_cast<int32_t>(buffers_.size()); }
   // The oldest read as a picture, top row first; waits for GL where it has not finished.
