@@ -14,10 +14,9 @@ namespace {
 using namespace veltrane;
 
 // A 1920 x 1080 layout of `cuts` cuts spread over the frame at assorted angles.
-// The reference host serves the parameters, its call log off as in a long render.
+// The reference host serves the parameters, with no call log, as in a long render.
 void fillLayout(refhost::Host& host, int cuts, bool radial) {
   using refhost::ParamValue;
-  host.setCallLogging(false);
   declareParameters(host.handle(), &host.api());
   host.setValue(param::kNumberOfCuts, ParamValue::ofInt(cuts));
   host.setValue(param::kCutType, ParamValue::ofInt(radial ? kCutTypeRadial : 0));

@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "refhost/engine.h"
+#include "refhost/gl/headless_context.h"
 #include "refhost/media/image_files.h"
 #include "refhost/pipeline/frame_readback.h"
 
@@ -18,6 +19,7 @@ int main(int argc, char** argv) {
   }
   try {
     refhost::EngineOptions options;
+    options.makeContext = refhost::makeHeadlessContext;
     options.modulePath = argv[1];
     refhost::Engine engine(std::move(options));  // loads the module, makes a headless context
     refhost::FrameSettings settings;             // 8-bit frames, square pixels

@@ -5,6 +5,7 @@
 #include <cstring>
 
 #include "property_values.h"
+#include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
 #include "track_frames.h"
 
@@ -14,24 +15,22 @@ namespace {
 // Host textures of one frame, given back to the host's pool however the frame ends.
 class FrameTextures {
  public:
-  FrameTextures(refhost::Host& host, int32_t width, int32_t height, const uint8_t* sourceRows)
-      : host_(host) {
-    source = host.createTexture(width, height, sourceRows);
-    output = host.createTexture(width, height);
+  FrameTextures(refhost::Engine& engine, int32_t width, int32_t height, const uint8_t* sourceRows)
+      : engine_(engine) {
+    textures.source = engine.createTexture(width, height, sourceRows);
+    textures.output = engine.createTexture(width, height);
   }
   ~FrameTextures() {
-    host_.deleteTexture(output.id);
-    host_.deleteTexture(source.id);
-    host_.setPixelScale(1);
+    engine_.deleteTexture(textures.output.id);
+    engine_.deleteTexture(textures.source.id);
   }
   FrameTextures(const FrameTextures&) = delete;
   FrameTextures& operator=(const FrameTextures&) = delete;
 
-  TextureRecord source{};
-  TextureRecord output{};
+  refhost::CallerTextures textures;
 
  private:
-  refhost::Host& host_;
+  refhost::Engine& engine_;
 };
 
 bool sameSettings(const refhost::FrameSettings& a, const refhost::FrameSettings& b) {
@@ -46,7 +45,7 @@ FrameRenderer::FrameRenderer(const std::string& modulePath, bool withLowerTrack)
     : withLowerTrack_(withLowerTrack) {
   std::unique_ptr<refhost::GlContext> context;
   try {
-    context = std::make_unique<refhost::GlContext>(refhost::GlProfile::Core);
+    context = refhost::makeHeadlessContext(refhost::GlProfile::Core);
   } catch (const std::exception& error) {
     throw GlUnavailable(error.what());
   }
@@ -127,12 +126,17 @@ void FrameRenderer::applyComposition(const RenderRequest& request) {
 
   // The frame number is the own track's position, and a transition's tracks share their
   // positions (the composition's): every layer starts at frame 0 and plays its track's frames.
-  std::vector<refhost::Layer>& layers = engine_->host().layers();
   const TrackPictures* tracks[] = {&request.own, &request.lower};
-  for (std::size_t i = 0; i < layers.size() && i < 2; ++i) {
-    layers[i].frameCount = std::max(1, tracks[i]->length);
-    layers[i].width = request.compositionWidth;
-    layers[i].height = request.compositionHeight;
+  for (std::size_t i = 0; i < engine_->layers().size() && i < 2; ++i) {
+    refhost::Layer layer = engine_->layers()[i];
+    const int32_t frameCount = std::max(1, tracks[i]->length);
+    if (layer.frameCount == frameCount && layer.width == request.compositionWidth &&
+        layer.height == request.compositionHeight)
+      continue;
+    layer.frameCount = frameCount;
+    layer.width = request.compositionWidth;
+    layer.height = request.compositionHeight;
+    engine_->setLayer(i, layer);
   }
 }
 
@@ -160,25 +164,15 @@ void FrameRenderer::render(const RenderRequest& request, uint8_t* out) {
   // MLT's pictures run top row first, GL's textures bottom row first.
   refhost::copyRowsFlipped(request.own.current, upload_.data(), rowBytes, height);
 
-  refhost::Host& host = engine_->host();
-  FrameTextures textures(host, width, height, upload_.data());
   // A picture of another size than the composition's (an editor's preview) is rendered as the
-  // host renders previews: everything in pixels scaled to it.
-  if (width != request.compositionWidth || height != request.compositionHeight)
-    host.setPixelScale(static_cast<double>(height) / request.compositionHeight);
-  refhost::FrameSettings settings = engine_->frameSettings();
-  settings.width = width;
-  settings.height = height;
-  {
-    refhost::RenderFrame frame(host, settings, request.own.position, textures.source,
-                               textures.output);
-    engine_->render(frame);
-  }
+  // engine renders previews: everything in pixels scaled to it.
+  FrameTextures frame(*engine_, width, height, upload_.data());
+  engine_->render(request.own.position, frame.textures);
   if (!readback_ || readback_->width() != width || readback_->height() != height) {
     readback_.reset();
     readback_ = std::make_unique<refhost::FrameReadback>(width, height, 1);
   }
-  readback_->start(textures.output.id);
+  readback_->start(frame.textures.output.id);
   readback_->collectInto(out);
 }
 

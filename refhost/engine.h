@@ -8,7 +8,8 @@
 //
 //   refhost::EngineOptions options;
 //   options.modulePath = "lib/veltrane.so";
-//   refhost::Engine engine(std::move(options));     // loads the module, makes a GL context
+//   options.context = myContext;                      // or makeContext, see below
+//   refhost::Engine engine(std::move(options));     // loads the module
 //   engine.setFrameSettings({1920, 1080, 25.0});     // the composition's frame
 //   engine.setSourceFrames(mySource);                // where the effect's own input comes from
 //   engine.start();                                  // messages 0 and 2: the panel is declared
@@ -21,6 +22,11 @@
 // Every message is checked: an answer the message never gives, a texture or buffer the plug-in
 // kept, or a GL error throws std::runtime_error naming the message. The engine and the module
 // are driven from one thread, the one the GL context belongs to.
+//
+// The engine and the host core below it depend on no platform library: the GL context comes
+// from the caller (a window's, an editor's, a canvas's, or a headless one from
+// refhost/gl/headless_context.h) and pictures arrive as FrameSource functions that a front end's
+// decoders implement. examples/render_one_frame.cpp is a whole front end on this header alone.
 #pragma once
 
 #include <cstdint>
@@ -33,7 +39,9 @@
 #include <string>
 #include <vector>
 
+#include "refhost/core/effect_vocabulary.h"
 #include "refhost/core/host.h"
+#include "refhost/core/instruments.h"
 #include "refhost/core/module.h"
 #include "refhost/core/params.h"
 #include "refhost/engine/render_frame.h"
@@ -42,13 +50,17 @@
 namespace refhost {
 
 struct EngineOptions {
+  // The module's file, loaded through the platform's loader; or, for a module linked into the
+  // program, its entry points (then `modulePath` only names it in messages).
   std::string modulePath;
+  std::optional<ModuleEntryPoints> entryPoints;
   GlProfile profile = GlProfile::Core;
-  // False: no GL at all, for messages that draw nothing (loading, declaring, instances).
-  bool gl = true;
-  // A context the caller made and made current (a window's, an editor's): the engine draws in
-  // it and never destroys it. Null: the engine makes its own headless one.
+  // The context the engine draws in, made current: adopted from a window, an editor or a
+  // canvas (GlContext::adoptCurrent), or a headless one (makeHeadlessContext). Without one the
+  // engine asks `makeContext` for one of `profile`; with neither it runs without GL, for
+  // messages that draw nothing (loading, declaring, instances).
   std::unique_ptr<GlContext> context;
+  std::function<std::unique_ptr<GlContext>(GlProfile)> makeContext;
   // The host product code GetHostId answers from the start.
   int32_t hostId = 0;
   // What failures name as the document they come from, e.g. a scene file: "scene.json".
@@ -61,6 +73,9 @@ struct EngineOptions {
   // without it no line is ever formatted.
   std::function<void(int32_t message, int32_t result, const std::vector<std::string>& calls)>
       onMessage;
+  // What a test watches and breaks in the host (see instruments.h); borrowed. A call log given
+  // here holds every call from the start, never cleared by the engine.
+  HostInstruments instruments;
 };
 
 // Not enough memory to render frames of the composition's size. Its text names the document,
@@ -131,7 +146,6 @@ class Engine {
   void createInstance();
   // Messages 4 and 1.
   void finish();
-  bool hasInstance() const { return instance_; }
 
   // ---- The composition ---------------------------------------------------------------------
   void setFrameSettings(const FrameSettings& settings);
@@ -142,17 +156,21 @@ class Engine {
     host_->setSourceFrames(std::move(source), std::move(openStream));
   }
   void addLayer(const Layer& layer) { host_->addLayer(layer); }
+  // Replaces layer `index` (a clip that grew, a track's new size); out of range throws.
+  void setLayer(std::size_t index, const Layer& layer);
   const std::vector<Layer>& layers() const { return host_->layers(); }
 
   // ---- Parameters --------------------------------------------------------------------------
   const ParamPanel& panel() const { return host_->panel(); }
+  // Which declared parameter is which (see effect_vocabulary.h); from start() on, else throws
+  // std::logic_error.
+  const EffectVocabulary& vocabulary() const;
   // Throws std::out_of_range for an id the module never declared.
   const Param& param(const std::string& id) const { return host_->param(id); }
   ParamValue valueAt(const std::string& id, int32_t time) const { return host_->valueAt(id, time); }
   // A value set by the caller, not a person: no undo step. With an instance the change is
   // reported (message 7) at once; before one, createInstance() reports it.
   void setParam(const std::string& id, const ParamValue& value);
-  void setParamState(const std::string& id, const ParamState& state);
   // A document's values: all stored first, then each reported once in the order given, changed
   // or not, as a host does when it opens a document.
   void setParams(const std::vector<std::pair<std::string, ParamState>>& states);
@@ -160,6 +178,8 @@ class Engine {
   // Each edit is reported at once.
   void beginEdit(const std::string& stepName);
   void edit(const std::string& id, const ParamState& state);
+  // Several edits at once (a preset): all stored, then each changed one reported.
+  void edit(const std::vector<std::pair<std::string, ParamState>>& states);
   void endEdit();
   bool undo();
   bool redo();
@@ -176,14 +196,30 @@ class Engine {
   // from the source frames, an output of the frame's size. The picture stays in the returned
   // frame's output texture until it is destroyed.
   std::unique_ptr<RenderFrame> render(int32_t frame);
-  // The same into textures the caller made.
+  // The same in two steps, so that a caller can time them apart: the frame's textures made and
+  // its source uploaded, then the messages.
+  std::unique_ptr<RenderFrame> prepare(int32_t frame);
+  void render(RenderFrame& frame);
+  // The same into textures the caller made (in the engine's context). Textures of another size
+  // than the composition's are a preview (see renderPreview) at their size.
   void render(int32_t frame, const CallerTextures& textures);
   // A preview: the frame rendered at 1 / `divisor` of its size, with every value measured in
-  // frame pixels scaled to match (see Host::setPixelScale), so that it shows the full render
-  // at a quarter (divisor 2) or a sixteenth (4) of the cost. Divisor 1 is the full render.
+  // frame pixels scaled to match (points and widths in pixels, the composition's and layers'
+  // sizes), so that it shows the full render at a quarter (divisor 2) or a sixteenth (4) of the
+  // cost. Divisor 1 is the full render.
   std::unique_ptr<RenderFrame> renderPreview(int32_t frame, int32_t divisor);
-  // The same with a render context the caller filled (its textures included).
-  void render(RenderFrame& frame);
+
+  // Host textures in the engine's context for a caller's frames: RGBA8 pixels (rows from the
+  // bottom), or uninitialised storage for null. Given back with deleteTexture.
+  TextureRecord createTexture(int32_t width, int32_t height, const void* pixels = nullptr);
+  void deleteTexture(uint32_t id);
+  // Seconds spent so far producing and uploading frames the plug-in fetched (wall clock, and
+  // CPU time of the thread that delivered them): the host's share of the renders' time.
+  double frameDeliverySeconds() const { return host_->frameDeliverySeconds(); }
+  double frameDeliveryCpuSeconds() const { return host_->frameDeliveryCpuSeconds(); }
+  // GL textures the host has made so far: its pool stops growing once a job's first frames
+  // are in flight.
+  std::size_t texturesMade() const { return host_->texturePool().created(); }
 
   // ---- The viewer --------------------------------------------------------------------------
   void setViewer(const ViewerSettings& settings);
@@ -215,10 +251,8 @@ class Engine {
   const std::vector<std::string>& popupMenus() const { return host_->popupMenus(); }
 
   // ---- Below the engine --------------------------------------------------------------------
-  // The host and its GL context, for what the engine does not wrap (failure injection, the
-  // call log a test turns on, the texture pool, the frame-delivery clock).
-  Host& host() { return *host_; }
-  GlContext& gl() { return *host_->gl(); }
+  // The context the engine draws in; throws std::logic_error when it was given none.
+  GlContext& gl();
   const Module& module() const { return module_; }
   const std::string& documentName() const { return documentName_; }
 
@@ -232,6 +266,9 @@ class Engine {
 
  private:
   ViewerOutcome viewerEvent(const std::function<int32_t(std::vector<SentMessage>&)>& action);
+  // Renders into `frame` with everything in pixels scaled to its size against the
+  // composition's.
+  void renderScaled(RenderFrame& frame);
   int32_t pointer(int32_t message, int32_t x, int32_t y, double button,
                   std::vector<SentMessage>& sent);
   void reportProblems();
@@ -240,6 +277,8 @@ class Engine {
 
   Module module_;
   std::unique_ptr<Host> host_;
+  CallLog messageCalls_;  // the calls of the last message, for onMessage
+  std::optional<EffectVocabulary> vocabulary_;
   std::string documentName_;
   std::function<void(const std::string&)> onHostProblem_;
   std::function<void(int32_t, int32_t, const std::vector<std::string>&)> onMessage_;

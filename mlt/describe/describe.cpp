@@ -250,7 +250,7 @@ int main(int argc, char** argv) {
   try {
     refhost::EngineOptions options;
     options.modulePath = argv[1];
-    options.gl = false;  // declaring the panel draws nothing
+    // No context: declaring the panel draws nothing.
     refhost::Engine engine(std::move(options));
     engine.start();
     const ParamPanel& panel = engine.panel();

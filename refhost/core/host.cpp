@@ -115,21 +115,6 @@ ParamValue Host::valueAt(const std::string& id, int32_t time) const {
   return param(id).valueAt(time);
 }
 
-std::vector<std::string> Host::callsTo(const std::string& operation) const {
-  std::vector<std::string> lines;
-  for (const std::string& line : callLog_) {
-    if (line.compare(0, operation.size(), operation) == 0 &&
-        (line.size() == operation.size() || line[operation.size()] == ' '))
-      lines.push_back(line);
-  }
-  return lines;
-}
-
-void Host::failDeclarationCall(int k) {
-  failDeclarationAt_ = k;
-  declarationCalls_ = 0;
-}
-
 void Host::clearViewerRecords() {
   cursorShapes_.clear();
   redraws_ = 0;

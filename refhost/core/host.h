@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "host/wisp_api.h"
+#include "refhost/core/instruments.h"
 #include "refhost/core/module.h"
 #include "refhost/core/params.h"
 #include "refhost/core/undo.h"
@@ -112,7 +113,6 @@ class Host {
   // ---- Configuration ---------------------------------------------------------------------
   void setHostId(int32_t code) { hostId_ = code; }
   int32_t hostId() const { return hostId_; }
-  void setHostIdentifier(const std::wstring& identifier) { hostIdentifier_ = identifier; }
   void setVerbose(bool verbose) { api_.verbose = verbose ? 1 : 0; }
   void setTextureFormatMode(uint32_t mode) { api_.textureFormatMode = mode; }
   void setTimeInfo(int32_t width, int32_t height, double frameRate);
@@ -128,15 +128,12 @@ class Host {
   PixelFormat frameFormat() const { return frameFormat_; }
 
   // ---- GL --------------------------------------------------------------------------------
-  // Creates the host's context (and makes it current). Throws std::runtime_error with the
-  // reason when none can be made.
-  GlContext& attachGl(GlProfile profile = GlProfile::Core);
-  // Draws in the given context (a window's, adopted) instead of one of the host's own.
+  // Draws in the given context: a headless one of the host's own (headless_context.h), or a
+  // window's, an editor's, a canvas's, adopted.
   GlContext& attachGl(std::unique_ptr<GlContext> context);
   // Uses a context another host made, so that hosts in turn can drive one plug-in whose GL
   // programs live in it; each host's own GL objects still go with the host.
   GlContext& shareGl(std::shared_ptr<GlContext> context);
-  std::shared_ptr<GlContext> sharedGl() const { return gl_; }
   GlContext* gl() { return gl_.get(); }
   uint32_t framebuffer() const { return framebuffer_; }
   // A texture the host's framebuffer shows before every drawing message (colour attachment 0,
@@ -196,32 +193,13 @@ class Host {
   }
   const FrameSource& sourceFrames() const { return sourceFrames_; }
 
-  // ---- Call log and problems -------------------------------------------------------------
-  // One line per host operation the plug-in called, in order: the operation's name and its
-  // arguments (ids and GUIDs bare, display texts quoted, GL enums in hex, pointers to data as
-  // "data" or "null"), e.g. `SetParamEnabled cutPosition_global 0`.
-  const std::vector<std::string>& callLog() const { return callLog_; }
-  // The lines of one operation (the text before the first space equals `operation`).
-  std::vector<std::string> callsTo(const std::string& operation) const;
-  void clearCallLog() { callLog_.clear(); }
-  // The log is a test instrument, off unless asked for: it grows by every call the plug-in
-  // makes, and formatting its lines costs more than most of the calls themselves.
-  void setCallLogging(bool on) { callLogging_ = on; }
-  bool callLogging() const { return callLogging_; }
+  // ---- Test instruments and problems -----------------------------------------------------
+  // The call log and the failures a test hands the host (see instruments.h); both borrowed.
+  void setInstruments(const HostInstruments& instruments) { instruments_ = instruments; }
   // What the host refused or found wrong in a call: unknown ids, kind mismatches, null
   // pointers, releases of names it never handed out, an EndUndo without BeginUndo.
   const std::vector<std::string>& problems() const { return problems_; }
   void clearProblems() { problems_.clear(); }
-
-  // ---- Failure injection -----------------------------------------------------------------
-  // The k-th declaration call (BeginParamGroup, EndParamGroup, Add*Param) from now on, counted
-  // from 1, answers 1 and declares nothing; 0 turns it off.
-  void failDeclarationCall(int k);
-  int declarationCallCount() const { return declarationCalls_; }
-  void setRefuseSourceFrames(bool refuse) { refuseSourceFrames_ = refuse; }
-  void setRefuseLayerFrames(bool refuse) { refuseLayerFrames_ = refuse; }
-  void setFailLayerQueries(bool fail) { failLayerQueries_ = fail; }
-  void setFailTimeInfo(bool fail) { failTimeInfo_ = fail; }
 
   // ---- Resource accounting ---------------------------------------------------------------
   // Textures from AllocateTexture and buffers from AcquireBuffer not yet given back. Frames
@@ -268,11 +246,15 @@ class Host {
     Host* host;
   };
 
-  // `line` makes the text; it is called only while the log is kept, so a render without the
-  // log formats nothing.
+  // `line` makes the text; it is called only while a log is kept, so a render without one
+  // formats nothing.
   template <typename Line>
   void log(Line&& line) {
-    if (callLogging_) callLog_.push_back(line());
+    if (instruments_.callLog) instruments_.callLog->record(line());
+  }
+  // The failures a test asked for; a host given none fails nothing.
+  bool faulty(bool FaultPlan::*fault) const {
+    return instruments_.faults && instruments_.faults->*fault;
   }
   void problem(std::string text) { problems_.push_back(std::move(text)); }
   // The interface's reserved arguments are 0; anything else is the plug-in misusing it.
@@ -389,17 +371,9 @@ class Host {
   // source) and offset.
   std::map<std::pair<std::string, int32_t>, FrameSource> streams_;
 
-  std::vector<std::string> callLog_;
-  bool callLogging_ = false;
+  HostInstruments instruments_;
   std::vector<std::string> problems_;
   std::vector<MessageRecord> messages_;
-
-  int failDeclarationAt_ = 0;
-  int declarationCalls_ = 0;
-  bool refuseSourceFrames_ = false;
-  bool refuseLayerFrames_ = false;
-  bool failLayerQueries_ = false;
-  bool failTimeInfo_ = false;
 
   std::shared_ptr<GlContext> gl_;
   uint32_t framebuffer_ = 0;

@@ -63,7 +63,7 @@ void Host::getLayerInfo(int32_t index, char* guidBuffer, char* nameBuffer, int32
 int32_t Host::queryLayerState(const char* guid, int32_t timeMs, LayerState* out) {
   log([&] { return std::string("QueryLayerState " + logId(guid) + " " + std::to_string(timeMs)); });
   const Layer* layer = findLayer(guid);
-  if (failLayerQueries_ || !layer || !out) {
+  if (faulty(&FaultPlan::failLayerQueries) || !layer || !out) {
     if (!out) problem("QueryLayerState with a null record");
     return 1;
   }
@@ -83,7 +83,7 @@ int32_t Host::queryLayerState(const char* guid, int32_t timeMs, LayerState* out)
 
 int32_t Host::getTimeInfo(WispTimeInfo* out) {
   log([&] { return std::string("GetTimeInfo"); });
-  if (failTimeInfo_ || !out) return 1;
+  if (faulty(&FaultPlan::failTimeInfo) || !out) return 1;
   *out = timeInfo_;
   out->width = scaled(out->width);
   out->height = scaled(out->height);
@@ -97,7 +97,7 @@ int32_t Host::scaled(int32_t pixels) const {
 
 int32_t Host::getSourceFrame(void* renderContext, int32_t frameIndex, TextureRecord* out) {
   log([&] { return std::string("GetSourceFrame " + std::to_string(frameIndex)); });
-  if (refuseSourceFrames_) return 1;
+  if (faulty(&FaultPlan::refuseSourceFrames)) return 1;
   // A source frame at another index has the size of the source the render context carries.
   int32_t width = timeInfo_.width;
   int32_t height = timeInfo_.height;
@@ -128,7 +128,7 @@ int32_t Host::renderLayerFrame(void* renderContext, const char* guid, int32_t fr
                                TextureRecord* out) {
   log([&] { return std::string("RenderLayerFrame " + logId(guid) + " " + std::to_string(frame)); });
   const Layer* layer = findLayer(guid);
-  if (refuseLayerFrames_ || !layer) return 1;
+  if (faulty(&FaultPlan::refuseLayerFrames) || !layer) return 1;
   if (!layer->source)
     return deliverFrame(frameCounterSource(static_cast<uint8_t>(layer - layers_.data() + 1)), frame,
                         scaled(layer->width), scaled(layer->height), out);

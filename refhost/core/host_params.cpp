@@ -20,8 +20,7 @@ std::vector<std::string> splitChoices(const std::string& list) {
 }  // namespace
 
 bool Host::declarationRefused() {
-  ++declarationCalls_;
-  return failDeclarationAt_ > 0 && declarationCalls_ == failDeclarationAt_;
+  return instruments_.faults && instruments_.faults->refusesNextDeclaration();
 }
 
 int32_t Host::declare(Param param) {

@@ -40,12 +40,6 @@ void dropTextures(TexturePool& pool, std::set<uint32_t>& names) {
 
 }  // namespace
 
-GlContext& Host::attachGl(GlProfile profile) {
-  releaseGl();
-  gl_ = std::make_shared<GlContext>(profile);
-  return *gl_;
-}
-
 GlContext& Host::shareGl(std::shared_ptr<GlContext> context) {
   releaseGl();
   gl_ = std::move(context);

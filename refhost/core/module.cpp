@@ -75,7 +75,16 @@ Module::Module(const std::string& path) : path_(path) {
   }
 }
 
-Module::~Module() { closeSharedLibrary(handle_); }
+Module::Module(const ModuleEntryPoints& entryPoints, std::string name)
+    : path_(std::move(name)), pluginInfo_(entryPoints.pluginInfo), notify_(entryPoints.notify) {
+  if (!pluginInfo_ || !notify_)
+    throw std::invalid_argument("plug-in module '" + path_ +
+                                "': PluginInfo and Notify are both needed");
+}
+
+Module::~Module() {
+  if (handle_) closeSharedLibrary(handle_);
+}
 
 Registration Module::readRegistration() const {
   // The buffers have exactly the sizes the record promises; the module's bounded copies may

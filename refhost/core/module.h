@@ -28,13 +28,24 @@ struct Registration {
   std::string versionText() const;  // "1.2.0.0"
 };
 
-// Owns the library handle; the module stays loaded until the Module is destroyed, so every Host
-// driving it must be destroyed first.
+// The module's two exports, where a program links the module in instead of loading it (a
+// browser build, a static test).
+struct ModuleEntryPoints {
+  PluginInfoFunction pluginInfo = nullptr;
+  NotifyFunction notify = nullptr;
+};
+
+// A loaded module owns the library handle; it stays loaded until the Module is destroyed, so
+// every Host driving it must be destroyed first.
 class Module {
  public:
-  // Throws std::runtime_error naming the path and what was wrong: no such file, not a loadable
-  // shared library (also a truncated one, or one for another machine), or an export missing.
+  // Loads the shared library at `path` through the platform's loader. Throws
+  // std::runtime_error naming the path and what was wrong: no such file, not a loadable shared
+  // library (also a truncated one, or one for another machine), or an export missing.
   explicit Module(const std::string& path);
+  // A module linked into the program: nothing is loaded or unloaded. `name` stands for the
+  // path in messages. Throws std::invalid_argument when an entry point is missing.
+  Module(const ModuleEntryPoints& entryPoints, std::string name);
   ~Module();
   Module(const Module&) = delete;
   Module& operator=(const Module&) = delete;

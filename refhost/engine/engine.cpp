@@ -2,8 +2,8 @@
 // renders and the viewer's events.
 #include "refhost/engine.h"
 
-#include <cctype>
 #include <new>
+#include <utility>
 
 namespace refhost {
 namespace {
@@ -14,32 +14,41 @@ std::string expectedText(std::initializer_list<int32_t> expected) {
   return text;
 }
 
-// The overlay reads the handles' parameters of the selected input and of no other input:
-// "inputFrameTranslation3" and its siblings, numbered by the input.
-constexpr char kInputFramePrefix[] = "inputFrame";
+// Runs `undo` when the scope ends, by return or by exception: what a step set up for one
+// message (records, a draw target, a scale) never outlives it.
+template <typename Undo>
+class OnExit {
+ public:
+  explicit OnExit(Undo undo) : undo_(std::move(undo)) {}
+  ~OnExit() { undo_(); }
+  OnExit(const OnExit&) = delete;
+  OnExit& operator=(const OnExit&) = delete;
 
-std::optional<int32_t> inputOf(const std::string& id) {
-  if (id.compare(0, sizeof kInputFramePrefix - 1, kInputFramePrefix) != 0) return std::nullopt;
-  std::size_t digits = id.size();
-  while (digits > 0 && std::isdigit(static_cast<unsigned char>(id[digits - 1]))) --digits;
-  if (digits == id.size() || id.size() - digits > 4) return std::nullopt;
-  return std::stoi(id.substr(digits));
+ private:
+  Undo undo_;
+};
+
+Module loadModule(const EngineOptions& options) {
+  if (options.entryPoints) return Module(*options.entryPoints, options.modulePath);
+  return Module(options.modulePath);
 }
 
 }  // namespace
 
 Engine::Engine(EngineOptions options)
-    : module_(options.modulePath),
+    : module_(loadModule(options)),
       host_(std::make_unique<Host>(module_)),
       documentName_(std::move(options.documentName)),
       onHostProblem_(std::move(options.onHostProblem)),
       onMessage_(std::move(options.onMessage)) {
   host_->setHostId(options.hostId);
-  host_->setCallLogging(static_cast<bool>(onMessage_));
+  HostInstruments instruments = options.instruments;
+  if (onMessage_ && !instruments.callLog) instruments.callLog = &messageCalls_;
+  host_->setInstruments(instruments);
   if (options.context)
     host_->attachGl(std::move(options.context));
-  else if (options.gl)
-    host_->attachGl(options.profile);
+  else if (options.makeContext)
+    host_->attachGl(options.makeContext(options.profile));
   setViewer(ViewerSettings{});
 }
 
@@ -66,26 +75,33 @@ void Engine::setFrameSettings(const FrameSettings& settings) {
   setViewer(viewer);
 }
 
+GlContext& Engine::gl() {
+  if (!host_->gl())
+    throw std::logic_error(
+        "the engine was given no GL context (EngineOptions::context or "
+        "makeContext) and cannot draw");
+  return *host_->gl();
+}
+
 int32_t Engine::send(int32_t message, void* context, void* event,
                      std::initializer_list<int32_t> expected) {
+  if (Host::isDrawingMessage(message) || message == kMessagePrepareGl) gl();
   GlContext* gl = host_->gl();
   if (gl) gl->clearErrors();
-  // A kept log holds the calls of this message only: what a caller may inspect, and never more
-  // than one message's worth over a long render.
-  host_->clearCallLog();
-  host_->setRenderContext(context);
-  host_->setEvent(event);
+  // The engine's own log holds the calls of this message only: never more than one message's
+  // worth over a long render.
+  messageCalls_.clear();
   int32_t result = 0;
-  try {
+  {
+    host_->setRenderContext(context);
+    host_->setEvent(event);
+    OnExit records([&] {
+      host_->setRenderContext(nullptr);
+      host_->setEvent(nullptr);
+    });
     result = host_->send(message);
-  } catch (...) {
-    host_->setRenderContext(nullptr);
-    host_->setEvent(nullptr);
-    throw;
   }
-  host_->setRenderContext(nullptr);
-  host_->setEvent(nullptr);
-  if (onMessage_) onMessage_(message, result, host_->callLog());
+  if (onMessage_) onMessage_(message, result, messageCalls_.lines());
   reportProblems();
   // Nothing reads the host's message history or frame requests; over a long render they
   // would grow by every message.
@@ -125,8 +141,16 @@ void Engine::start() {
   send(kMessageLoad);
   loaded_ = true;
   send(kMessageDeclareParameters);
+  vocabulary_.emplace(host_->panel());
   reported_ = snapshot();
 }
+
+const EffectVocabulary& Engine::vocabulary() const {
+  if (!vocabulary_) throw std::logic_error("the module's parameters are declared by start()");
+  return *vocabulary_;
+}
+
+void Engine::setLayer(std::size_t index, const Layer& layer) { host_->layers().at(index) = layer; }
 
 void Engine::createInstance() {
   send(kMessageCreateInstance);
@@ -172,11 +196,6 @@ void Engine::setParam(const std::string& id, const ParamValue& value) {
   reportChanges();
 }
 
-void Engine::setParamState(const std::string& id, const ParamState& state) {
-  host_->editStateWithoutUndo(id, state);
-  reportChanges();
-}
-
 void Engine::setParams(const std::vector<std::pair<std::string, ParamState>>& states) {
   for (const auto& [id, state] : states) host_->editStateWithoutUndo(id, state);
   if (!instance_) return;
@@ -193,6 +212,13 @@ void Engine::beginEdit(const std::string& stepName) { host_->beginEdit(stepName)
 
 void Engine::edit(const std::string& id, const ParamState& state) {
   host_->editState(id, state);
+  reportChanges();
+}
+
+void Engine::edit(const std::vector<std::pair<std::string, ParamState>>& states) {
+  for (const auto& [id, state] : states) {
+    if (!(host_->param(id).state == state)) host_->editState(id, state);
+  }
   reportChanges();
 }
 
@@ -236,39 +262,55 @@ void Engine::render(RenderFrame& frame) {
   }
 }
 
-std::unique_ptr<RenderFrame> Engine::render(int32_t frame) {
-  std::unique_ptr<RenderFrame> rendered;
+void Engine::renderScaled(RenderFrame& frame) {
+  const WispRenderContext& context = frame.context();
+  if (context.width == settings_.width && context.height == settings_.height) return render(frame);
+  host_->setPixelScale(static_cast<double>(context.height) / settings_.height);
+  OnExit scale([&] { host_->setPixelScale(1); });
+  render(frame);
+}
+
+std::unique_ptr<RenderFrame> Engine::prepare(int32_t frame) {
+  gl();
   try {
-    rendered = std::make_unique<RenderFrame>(*host_, settings_, frame);
+    return std::make_unique<RenderFrame>(*host_, settings_, frame);
   } catch (const std::bad_alloc&) {
     throwFrameMemoryError();
   }
+}
+
+std::unique_ptr<RenderFrame> Engine::render(int32_t frame) {
+  std::unique_ptr<RenderFrame> rendered = prepare(frame);
   render(*rendered);
   return rendered;
 }
 
 std::unique_ptr<RenderFrame> Engine::renderPreview(int32_t frame, int32_t divisor) {
   if (divisor <= 1) return render(frame);
+  gl();
   FrameSettings preview = settings_;
   preview.width = std::max(1, settings_.width / divisor);
   preview.height = std::max(1, settings_.height / divisor);
-  host_->setPixelScale(static_cast<double>(preview.height) / settings_.height);
-  std::unique_ptr<RenderFrame> rendered;
-  try {
-    rendered = std::make_unique<RenderFrame>(*host_, preview, frame);
-    render(*rendered);
-  } catch (...) {
-    host_->setPixelScale(1);
-    throw;
-  }
-  host_->setPixelScale(1);
+  auto rendered = std::make_unique<RenderFrame>(*host_, preview, frame);
+  renderScaled(*rendered);
   return rendered;
 }
 
 void Engine::render(int32_t frame, const CallerTextures& textures) {
-  RenderFrame rendered(*host_, settings_, frame, textures.source, textures.output);
-  render(rendered);
+  gl();
+  FrameSettings settings = settings_;
+  settings.width = textures.output.imageWidth;
+  settings.height = textures.output.imageHeight;
+  RenderFrame rendered(*host_, settings, frame, textures.source, textures.output);
+  renderScaled(rendered);
 }
+
+TextureRecord Engine::createTexture(int32_t width, int32_t height, const void* pixels) {
+  gl();
+  return host_->createTexture(width, height, pixels);
+}
+
+void Engine::deleteTexture(uint32_t id) { host_->deleteTexture(id); }
 
 void Engine::setViewer(const ViewerSettings& settings) {
   viewer_ = makeViewerContext(settings_.width, settings_.height, settings.viewScaleX,
@@ -356,13 +398,8 @@ ViewerOutcome Engine::redoSteps(int32_t steps) {
 
 void Engine::drawOverlay(uint32_t texture, int32_t width, int32_t height) {
   host_->setDrawTarget(texture, width, height);
-  try {
-    send(kMessageDrawOverlay, &viewer_, nullptr, {1});
-  } catch (...) {
-    host_->setDrawTarget(0, 0, 0);
-    throw;
-  }
-  host_->setDrawTarget(0, 0, 0);
+  OnExit target([&] { host_->setDrawTarget(0, 0, 0); });
+  send(kMessageDrawOverlay, &viewer_, nullptr, {1});
 }
 
 ViewerState Engine::viewerState() {
@@ -372,18 +409,20 @@ ViewerState Engine::viewerState() {
     probeWidth_ = settings_.width;
     probeHeight_ = settings_.height;
   }
+  // The overlay reads the handles' parameters of the selected input and of no other input.
   std::vector<const Param*> read;
-  host_->setReadRecord(&read);
-  try {
+  {
+    host_->setReadRecord(&read);
+    OnExit record([&] { host_->setReadRecord(nullptr); });
     drawOverlay(probeTarget_, probeWidth_, probeHeight_);
-  } catch (...) {
-    host_->setReadRecord(nullptr);
-    throw;
   }
-  host_->setReadRecord(nullptr);
   ViewerState state;
   for (const Param* param : read) {
-    if ((state.selectedInput = inputOf(param->id))) break;
+    const auto input = vocabulary().inputOf(param->id);
+    if (input && input->first != InputParam::Layer) {
+      state.selectedInput = input->second;
+      break;
+    }
   }
   state.pointerOverSelection = send(kMessagePointerOverSelection, &viewer_, nullptr, {0, 1}) == 1;
   return state;

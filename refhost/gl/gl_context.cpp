@@ -4,50 +4,78 @@
 
 #include <GL/glew.h>
 
+#include <cstdio>
 #include <stdexcept>
 
 namespace refhost {
 
-GlContext::GlContext(GlProfile profile) : profile_(profile) {
-  createPlatformContext();
-  watchDebugOutput();
-}
+namespace {
 
-GlContext::GlContext(GlProfile profile, std::function<void()> makeCurrent)
-    : profile_(profile), adoptedMakeCurrent_(std::move(makeCurrent)) {
+constexpr int kMostPolledErrors = 16;
+
+// A context someone else made and destroys: only making it current again is ours.
+class AdoptedContext : public PlatformContext {
+ public:
+  explicit AdoptedContext(std::function<void()> makeCurrent)
+      : makeCurrent_(std::move(makeCurrent)) {}
+  void makeCurrent() override { makeCurrent_(); }
+
+ private:
+  std::function<void()> makeCurrent_;
+};
+
+}  // namespace
+
+GlContext::GlContext(GlProfile profile, std::unique_ptr<PlatformContext> platform)
+    : profile_(profile), platform_(std::move(platform)) {
   watchDebugOutput();
 }
 
 std::unique_ptr<GlContext> GlContext::adoptCurrent(GlProfile profile,
                                                    std::function<void()> makeCurrent) {
-  return std::unique_ptr<GlContext>(new GlContext(profile, std::move(makeCurrent)));
+  return std::make_unique<GlContext>(profile,
+                                     std::make_unique<AdoptedContext>(std::move(makeCurrent)));
 }
 
 void GlContext::watchDebugOutput() {
   glewExperimental = GL_TRUE;
   glewInit();  // headless EGL answers "no GLX display" here but every entry point is loaded
   glGetError();
-  if (!glDebugMessageCallback)
-    throw std::runtime_error("the OpenGL context offers no glDebugMessageCallback");
+  // WebGL has no debug output: its errors are polled instead (see errors()).
+  debugOutput_ = glDebugMessageCallback != nullptr;
+  if (!debugOutput_) return;
   glEnable(GL_DEBUG_OUTPUT);
   glEnable(GL_DEBUG_OUTPUT_SYNCHRONOUS);
   glDebugMessageCallback(reinterpret_cast<GLDEBUGPROC>(&GlContext::debugCallback), this);
 }
 
 GlContext::~GlContext() {
-  if (adoptedMakeCurrent_) {
+  if (debugOutput_) {
+    makeCurrent();
     glDebugMessageCallback(nullptr, nullptr);
-    return;
-  }
-  if (context_) {
-    glDebugMessageCallback(nullptr, nullptr);
-    destroyPlatformContext();
   }
 }
 
-void GlContext::makeCurrent() {
-  if (adoptedMakeCurrent_) return adoptedMakeCurrent_();
-  makePlatformContextCurrent();
+const std::vector<GlDebugMessage>& GlContext::errors() {
+  if (!debugOutput_) {
+    // Bounded: a lost WebGL context answers with an error of its own before it falls silent.
+    for (int polled = 0; polled < kMostPolledErrors; ++polled) {
+      const GLenum error = glGetError();
+      if (error == GL_NO_ERROR) break;
+      char text[48];
+      std::snprintf(text, sizeof text, "glGetError reported 0x%04X", error);
+      errors_.push_back(GlDebugMessage{GL_DEBUG_TYPE_ERROR, GL_DEBUG_SEVERITY_HIGH, error, text});
+    }
+  }
+  return errors_;
+}
+
+void GlContext::clearErrors() {
+  if (!debugOutput_) {
+    for (int polled = 0; polled < kMostPolledErrors && glGetError() != GL_NO_ERROR; ++polled) {
+    }
+  }
+  errors_.clear();
 }
 
 void GlContext::finish() {

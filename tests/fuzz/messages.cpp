@@ -16,6 +16,8 @@
 
 #include "refhost/core/host.h"
 #include "refhost/engine/render_frame.h"
+#include "refhost/gl/headless_context.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -38,7 +40,8 @@ bool answerAllowed(int32_t message, int32_t result) {
   return result >= 0 && result < 32 && (answers >> result & 1) != 0;
 }
 
-[[noreturn]] void fail(const refhost::Host& host, int32_t message, const std::string& what) {
+[[noreturn]] void fail(const testsupport::InstrumentedHost& host, int32_t message,
+                       const std::string& what) {
   std::fprintf(stderr, "message %d: %s; its host calls:\n", message, what.c_str());
   for (const std::string& call : host.callLog()) std::fprintf(stderr, "  %s\n", call.c_str());
   std::abort();
@@ -73,7 +76,6 @@ Warm warmStates[2];
 class Session {
  public:
   explicit Session(Warm& warm) : warm_(warm), host_(*module) {
-    host_.setCallLogging(true);  // what a failing input made the plug-in call is printed
     host_.shareGl(warm.gl);
     registry_ = warm.registry;
     registries_.push_back(registry_);
@@ -90,7 +92,7 @@ class Session {
     }
   }
 
-  refhost::Host& host() { return host_; }
+  testsupport::InstrumentedHost& host() { return host_; }
   const std::vector<void*>& instances() const { return instances_; }
 
   int32_t send(int32_t message, void* instance) { return send(message, instance, registry_); }
@@ -121,14 +123,14 @@ class Session {
 
  private:
   Warm& warm_;
-  refhost::Host host_;
+  testsupport::InstrumentedHost host_;
   bool grown_ = false;
   void* registry_ = nullptr;
   std::vector<void*> registries_;
   std::vector<void*> instances_;
 };
 
-void configureHost(FuzzedDataProvider& data, refhost::Host& host) {
+void configureHost(FuzzedDataProvider& data, testsupport::InstrumentedHost& host) {
   const int32_t hostIds[] = {0, 3000, 5100, 5200, 5600, 6001, -1};
   host.setHostId(data.PickValueInArray(hostIds));
   // Other modes ask for a target of the built-in template's size, 0 x 0, which a host that
@@ -147,15 +149,15 @@ void configureHost(FuzzedDataProvider& data, refhost::Host& host) {
     layer.is3D = data.ConsumeBool();
     host.addLayer(layer);
   }
-  host.setRefuseSourceFrames(data.ConsumeProbability<float>() < 0.1f);
-  host.setRefuseLayerFrames(data.ConsumeProbability<float>() < 0.1f);
-  host.setFailLayerQueries(data.ConsumeProbability<float>() < 0.1f);
-  host.setFailTimeInfo(data.ConsumeProbability<float>() < 0.1f);
+  host.faults().refuseSourceFrames = data.ConsumeProbability<float>() < 0.1f;
+  host.faults().refuseLayerFrames = data.ConsumeProbability<float>() < 0.1f;
+  host.faults().failLayerQueries = data.ConsumeProbability<float>() < 0.1f;
+  host.faults().failTimeInfo = data.ConsumeProbability<float>() < 0.1f;
   if (data.ConsumeProbability<float>() < 0.05f)
     host.failDeclarationCall(data.ConsumeIntegralInRange(1, 90));
 }
 
-void editParameter(FuzzedDataProvider& data, refhost::Host& host) {
+void editParameter(FuzzedDataProvider& data, testsupport::InstrumentedHost& host) {
   const std::vector<refhost::Param>& params = host.panel().params();
   if (params.empty()) return;
   const refhost::Param& param = params[data.ConsumeIntegralInRange<size_t>(0, params.size() - 1)];
@@ -171,7 +173,7 @@ void editParameter(FuzzedDataProvider& data, refhost::Host& host) {
 
 // Sends one message with records of the kind it takes, filled with hostile values.
 void sendMessage(FuzzedDataProvider& data, Session& session) {
-  refhost::Host& host = session.host();
+  testsupport::InstrumentedHost& host = session.host();
   const int32_t message = data.ConsumeBool() ? data.ConsumeIntegralInRange(0, 14)
                                              : data.ConsumeIntegralInRange(1001, 1014);
   const std::vector<void*>& instances = session.instances();
@@ -258,8 +260,8 @@ extern "C" int LLVMFuzzerInitialize(int* argc, char*** argv) {
   module = new refhost::Module(VELTRANE_FUZZ_MODULE_PATH);
   for (refhost::GlProfile profile : {refhost::GlProfile::Core, refhost::GlProfile::Compatibility}) {
     Warm& warm = warmStates[profile == refhost::GlProfile::Core ? 0 : 1];
-    warm.gl = std::make_shared<refhost::GlContext>(profile);
-    refhost::Host host(*module);
+    warm.gl = refhost::makeHeadlessContext(profile);
+    testsupport::InstrumentedHost host(*module);
     host.shareGl(warm.gl);
     if (host.send(kMessageLoad) != 1 || host.send(kMessagePrepareGl) != 1)
       fail(host, 8, "the plug-in did not start");

@@ -4,6 +4,7 @@
 #include <cmath>
 
 #include "render_fixture.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -18,7 +19,7 @@ const std::string kLayerBlue = "33333333-0000-4000-8000-000000000003";
 
 TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   fixture.addSolidLayer(kLayerGreen, kGreen);
   fixture.addSolidLayer(kLayerBlue, kBlue);
   host.setValue("inputLayer1", ParamValue::ofLayer(kLayerGreen));
@@ -68,7 +69,7 @@ TEST(FrameRender, ThreeLocalCutsAndFourRadialCutsPickTheirInputs) {
 // to the cut. No coverage leaves the picture exactly as it was.
 TEST(FrameRender, BorderCoverageFollowsTheDistanceToTheCut) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   setCut(host, 0, 0.5f, 0.0f, 0.0f);  // x = 0.5: pixel centres at whole distances from it
   host.setValue("borderColor", ParamValue::ofColor(1.0f, 0.0f, 0.0f));
   const Rgba picture{100, 100, 100, 255};
@@ -108,7 +109,7 @@ TEST(FrameRender, WithoutCutsTheOutputIsTheSource) {
 
 TEST(FrameRender, ViewCutRegionsTintsARampOfGreys) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   host.setValue("viewCutRegions", ParamValue::ofInt(1));
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
   setCut(host, 0, 0.0f, 0.0f, 0.0f);
@@ -120,7 +121,7 @@ TEST(FrameRender, ViewCutRegionsTintsARampOfGreys) {
 
 TEST(FrameRender, ShiftedInputsShowTheirFrameOrTransparentBlack) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
   setCut(host, 0, 0.0f, 0.0f, 0.0f);
   const refhost::FrameSource counter = [](int32_t frame, int32_t width, int32_t height,
@@ -141,7 +142,7 @@ TEST(FrameRender, ShiftedInputsShowTheirFrameOrTransparentBlack) {
 
 TEST(FrameRender, InputPlacementMovesAndScalesThePicture) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
   setCut(host, 0, -31.0f, 0.0f, 0.0f);  // nearly the whole frame is input 0
   host.setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
@@ -163,7 +164,7 @@ TEST(FrameRender, InputPlacementMovesAndScalesThePicture) {
 TEST(FrameRender, CoreAndCompatibilityProfilesDrawTheSameImage) {
   auto renderWith = [](refhost::GlProfile profile) {
     RenderFixture fixture(profile);
-    refhost::Host& host = fixture.host();
+    testsupport::InstrumentedHost& host = fixture.host();
     host.setValue("numberOfCuts", ParamValue::ofInt(3));
     setCut(host, 0, 3.0f, -2.0f, 20.0f);
     setCut(host, 1, -10.0f, 5.0f, 100.0f);

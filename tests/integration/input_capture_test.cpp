@@ -3,6 +3,7 @@
 #include <climits>
 
 #include "render_fixture.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -14,16 +15,18 @@ const Rgba kClear{0, 0, 0, 0};
 const std::string kLayer = "22222222-0000-4000-8000-000000000002";
 
 // One vertical cut through the centre: input 1 on the left, input 0 on the right.
-void splitDownTheMiddle(refhost::Host& host) {
+void splitDownTheMiddle(testsupport::InstrumentedHost& host) {
   setCut(host, 0, 0.0f, 0.0f, 0.0f);
   host.setValue("borderWidth", ParamValue::ofFloat(0.0f));
 }
 
-size_t calls(refhost::Host& host, const char* operation) { return host.callsTo(operation).size(); }
+size_t calls(testsupport::InstrumentedHost& host, const char* operation) {
+  return host.callsTo(operation).size();
+}
 
 TEST(InputCapture, OwnSourceIsBorrowedAndFetchedFramesAreGivenBack) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   splitDownTheMiddle(host);
   host.clearCallLog();
   fixture.render(kRed);
@@ -42,7 +45,7 @@ TEST(InputCapture, OwnSourceIsBorrowedAndFetchedFramesAreGivenBack) {
 
 TEST(InputCapture, UndeliverableLayersFallBackAsTheHostAllows) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   splitDownTheMiddle(host);
   fixture.addSolidLayer(kLayer, kGreen);
 
@@ -59,7 +62,7 @@ TEST(InputCapture, UndeliverableLayersFallBackAsTheHostAllows) {
   for (const auto& row : table) {
     SCOPED_TRACE(row.name);
     host.setValue("inputLayer1", ParamValue::ofLayer(row.guid));
-    host.setRefuseLayerFrames(row.refuseFrames);
+    host.faults().refuseLayerFrames = row.refuseFrames;
     const std::vector<uint8_t> pixels = fixture.render(kRed);
     EXPECT_EQ(fixture.pixel(pixels, 8, 18), row.left);
     EXPECT_EQ(fixture.pixel(pixels, 56, 18), kRed);
@@ -68,7 +71,7 @@ TEST(InputCapture, UndeliverableLayersFallBackAsTheHostAllows) {
 
 TEST(InputCapture, LayerFramesOutsideTheLayerAreTransparent) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   splitDownTheMiddle(host);
   fixture.addSolidLayer(kLayer, kGreen, /*firstFrame=*/12, /*frameCount=*/5);
   host.setValue("inputLayer1", ParamValue::ofLayer(kLayer));
@@ -88,7 +91,7 @@ TEST(InputCapture, LayerFramesOutsideTheLayerAreTransparent) {
 
 TEST(InputCapture, LayersAreAlignedOnlyWhenTheirPlacementDiffers) {
   RenderFixture fixture;
-  refhost::Host& host = fixture.host();
+  testsupport::InstrumentedHost& host = fixture.host();
   splitDownTheMiddle(host);
   fixture.addSolidLayer(kLayer, kGreen);
   host.setValue("inputLayer1", ParamValue::ofLayer(kLayer));

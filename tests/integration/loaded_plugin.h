@@ -9,9 +9,10 @@
 
 #include "refhost/core/host.h"
 #include "refhost/core/module.h"
+#include "support/instrumented_host.h"
 
 // Cut i through the frame-space point (x, y), its direction in degrees (0 along +y).
-inline void setCut(refhost::Host& host, int i, float x, float y, float degrees) {
+inline void setCut(testsupport::InstrumentedHost& host, int i, float x, float y, float degrees) {
   host.setValue("cutPosition_" + std::to_string(i), refhost::ParamValue::ofPoint(x, y));
   host.setValue("cutDirection_" + std::to_string(i), refhost::ParamValue::ofFloat(degrees));
 }
@@ -19,8 +20,7 @@ inline void setCut(refhost::Host& host, int i, float x, float y, float degrees) 
 class LoadedPlugin : public ::testing::Test {
  protected:
   void SetUp() override {
-    host_ = std::make_unique<refhost::Host>(module_);
-    host_->setCallLogging(true);
+    host_ = std::make_unique<testsupport::InstrumentedHost>(module_);
     ASSERT_EQ(host_->send(kMessageLoad), 1);
     ASSERT_EQ(host_->send(kMessageDeclareParameters), 1);
     ASSERT_EQ(host_->send(kMessageCreateInstance), 1);
@@ -34,7 +34,7 @@ class LoadedPlugin : public ::testing::Test {
     host_.reset();
   }
 
-  refhost::Host& host() { return *host_; }
+  testsupport::InstrumentedHost& host() { return *host_; }
 
   // Sends a message whose event names a parameter.
   int32_t sendParamEvent(int32_t message, const char* id) {
@@ -46,5 +46,5 @@ class LoadedPlugin : public ::testing::Test {
   }
 
   refhost::Module module_{VELTRANE_MODULE_PATH};
-  std::unique_ptr<refhost::Host> host_;
+  std::unique_ptr<testsupport::InstrumentedHost> host_;
 };

@@ -2,6 +2,7 @@
 // by run depends on the extension list and on the graphics chip; both give the same image.
 #include "refhost/gl/gl_overrides.h"
 #include "render_fixture.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -9,7 +10,7 @@ using refhost::ParamValue;
 
 // Element buffers acquired during one render: one per mesh with restart, one per strip or fan
 // without. One cut has one strip and two cap fans.
-size_t elementBuffers(refhost::Host& host) {
+size_t elementBuffers(testsupport::InstrumentedHost& host) {
   size_t count = 0;
   for (const std::string& line : host.callsTo("AcquireBuffer"))
     if (line.find(" 0x8893 ") != std::string::npos) ++count;
@@ -43,7 +44,7 @@ TEST(MeshDrawPath, RestartFollowsTheExtensionListAndTheChip) {
     SCOPED_TRACE(row.name);
     refhost::ScopedGlOverrides overrides(row.overrides);
     RenderFixture fixture(row.profile);
-    refhost::Host& host = fixture.host();
+    testsupport::InstrumentedHost& host = fixture.host();
     setCut(host, 0, 3.0f, -4.0f, 30.0f);
     host.setValue("borderWidth", ParamValue::ofFloat(5.0f));
     host.setValue("borderColor", ParamValue::ofColor(1.0f, 1.0f, 1.0f));

@@ -2,6 +2,7 @@
 // highlighted, nothing is drawn for a named viewer, and resources and GL state come back after
 // every message.
 #include "render_fixture.h"
+#include "support/instrumented_host.h"
 #include "viewer_events.h"
 
 namespace {
@@ -51,7 +52,7 @@ class Viewer : public ViewerEvents {
   }
 
  private:
-  refhost::Host& host_;
+  testsupport::InstrumentedHost& host_;
   TextureRecord target_{};
 };
 

@@ -1,6 +1,7 @@
 // The parameter panel the module declares, read back from the host: every parameter's id,
 // name, kind, flags, default and range, the group nesting, refusals and the layer labels.
 #include "loaded_plugin.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -116,7 +117,7 @@ TEST(ParameterDeclaration, StopsAtTheFirstRefusedCall) {
   };
   for (const auto& row : table) {
     SCOPED_TRACE(row.refusedCall);
-    refhost::Host host(module);
+    testsupport::InstrumentedHost host(module);
     ASSERT_EQ(host.send(kMessageLoad), 1);
     host.failDeclarationCall(row.refusedCall);
     EXPECT_EQ(host.send(kMessageDeclareParameters), 5);
@@ -136,8 +137,7 @@ TEST(ParameterDeclaration, LayerLabelsFollowTheHostProductCode) {
                {0, false},   {3000, false}, {5101, false}, {-1, false}};
   for (const auto& row : table) {
     SCOPED_TRACE(row.hostId);
-    refhost::Host host(module);
-    host.setCallLogging(true);
+    testsupport::InstrumentedHost host(module);
     host.setHostId(row.hostId);
     ASSERT_EQ(host.send(kMessageLoad), 1);
     ASSERT_EQ(host.send(kMessageDeclareParameters), 1);

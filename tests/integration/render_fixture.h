@@ -15,7 +15,9 @@
 #include "refhost/core/host.h"
 #include "refhost/core/module.h"
 #include "refhost/engine/render_frame.h"
+#include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
+#include "support/instrumented_host.h"
 
 using Rgba = std::array<uint8_t, 4>;
 
@@ -55,9 +57,8 @@ class RenderFixture {
   explicit RenderFixture(refhost::GlProfile profile = refhost::GlProfile::Core,
                          int32_t width = kWidth, int32_t height = kHeight)
       : width_(width), height_(height) {
-    host_ = std::make_unique<refhost::Host>(module_);
-    host_->setCallLogging(true);
-    host_->attachGl(profile);
+    host_ = std::make_unique<testsupport::InstrumentedHost>(module_);
+    host_->attachGl(refhost::makeHeadlessContext(profile));
     host_->setTimeInfo(width, height, 25.0);
     refhost::Layer own;
     own.guid = kOwnLayer;
@@ -78,7 +79,7 @@ class RenderFixture {
     host_.reset();
   }
 
-  refhost::Host& host() { return *host_; }
+  testsupport::InstrumentedHost& host() { return *host_; }
 
   // Adds a layer the size of the frame, placed like the effect's own layer.
   void addSolidLayer(const std::string& guid, Rgba colour, int32_t firstFrame = 0,
@@ -148,5 +149,5 @@ class RenderFixture {
   refhost::Module module_{VELTRANE_MODULE_PATH};
   int32_t width_;
   int32_t height_;
-  std::unique_ptr<refhost::Host> host_;
+  std::unique_ptr<testsupport::InstrumentedHost> host_;
 };

@@ -10,10 +10,11 @@
 
 #include "refhost/core/host.h"
 #include "refhost/engine/render_frame.h"
+#include "support/instrumented_host.h"
 
 class ViewerEvents {
  public:
-  ViewerEvents(refhost::Host& host, int32_t width, int32_t height) : host_(host) {
+  ViewerEvents(testsupport::InstrumentedHost& host, int32_t width, int32_t height) : host_(host) {
     context_.width = width;
     context_.height = height;
     context_.viewScaleX = context_.viewScaleY = context_.uiScale = 1.0;
@@ -55,6 +56,6 @@ class ViewerEvents {
     return send(message, &event);
   }
 
-  refhost::Host& host_;
+  testsupport::InstrumentedHost& host_;
   WispViewerContext context_{};
 };

@@ -10,6 +10,7 @@
 #include <thread>
 
 #include "current_context.h"
+#include "refhost/gl/headless_context.h"
 
 namespace veltrane_mlt {
 namespace {
@@ -62,8 +63,9 @@ class Filter {
 
 TEST(EffectService, GivesBackTheApplicationsContextAfterEveryRender) {
   // The application's context, made as an editor would make one; without GL this fails here.
-  refhost::GlContext application(refhost::GlProfile::Core);
-  application.makeCurrent();
+  std::unique_ptr<refhost::GlContext> application =
+      refhost::makeHeadlessContext(refhost::GlProfile::Core);
+  application->makeCurrent();
   const EGLContext before = eglGetCurrentContext();
   ASSERT_NE(before, EGL_NO_CONTEXT);
   {

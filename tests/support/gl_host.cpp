@@ -3,7 +3,9 @@
 
 #include <cstdlib>
 
+#include "refhost/gl/headless_context.h"
 #include "render/gl_startup.h"
+#include "support/instrumented_host.h"
 
 namespace testsupport {
 
@@ -11,10 +13,9 @@ bool GlHostTest::startHost(refhost::GlProfile profile, int width, int height) {
   // Mesa keeps compiled shaders on disk and, on a hit, skips the compile and its info log; the
   // tests of printed logs need every compile to speak. Read when the driver starts.
   setenv("MESA_SHADER_CACHE_DISABLE", "true", 1);
-  host_ = std::make_unique<refhost::Host>();
-  host_->setCallLogging(true);
+  host_ = std::make_unique<InstrumentedHost>();
   try {
-    host_->attachGl(profile);
+    host_->attachGl(refhost::makeHeadlessContext(profile));
   } catch (const std::exception& e) {
     ADD_FAILURE() << "no OpenGL context: " << e.what();
     return false;

@@ -11,6 +11,7 @@
 
 #include "gl/effect_data.h"
 #include "refhost/core/host.h"
+#include "support/instrumented_host.h"
 
 namespace testsupport {
 
@@ -36,11 +37,11 @@ class GlHostTest : public ::testing::Test {
   // fails a compile on purpose forgets exactly those.
   void forgetCompileErrors(const std::string& compileLog);
 
-  refhost::Host& host() { return *host_; }
+  InstrumentedHost& host() { return *host_; }
   tagWispAPI* api() { return &host_->api(); }
   WispHost* handle() { return host_->handle(); }
 
-  std::unique_ptr<refhost::Host> host_;
+  std::unique_ptr<InstrumentedHost> host_;
   std::unique_ptr<veltrane::EffectData> registry_;
   WispRenderContext context_{};
   GLuint framebuffer_ = 0;

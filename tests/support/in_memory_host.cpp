@@ -8,7 +8,6 @@
 namespace testsupport {
 
 InMemoryHost::InMemoryHost(int32_t hostId) {
-  setCallLogging(true);
   setHostId(hostId);
   veltrane::declareParameters(handle(), &api());
   clearCallLog();

@@ -6,10 +6,11 @@
 #include <string>
 
 #include "refhost/core/host.h"
+#include "support/instrumented_host.h"
 
 namespace testsupport {
 
-class InMemoryHost : public refhost::Host {
+class InMemoryHost : public InstrumentedHost {
  public:
   explicit InMemoryHost(int32_t hostId = 0);
   // Fails the running test for every problem left: an unknown id or a kind mismatch is the

@@ -76,27 +76,26 @@ double processCpuSeconds() {
 }
 
 FrameTiming timeFrame(refhost::Engine& engine) {
-  refhost::Host& host = engine.host();
   refhost::GlContext& gl = engine.gl();
   FrameTiming timing;
   gl.finish();
   auto started = std::chrono::steady_clock::now();
-  refhost::RenderFrame frame(host, engine.frameSettings(), 0);
+  std::unique_ptr<refhost::RenderFrame> frame = engine.prepare(0);
   gl.finish();
   timing.upload = seconds(started);
-  const double fetchedBefore = host.frameDeliverySeconds();
-  const double fetchCpuBefore = host.frameDeliveryCpuSeconds();
+  const double fetchedBefore = engine.frameDeliverySeconds();
+  const double fetchCpuBefore = engine.frameDeliveryCpuSeconds();
   started = std::chrono::steady_clock::now();
   const double cpuBefore = processCpuSeconds();
-  engine.render(frame);
+  engine.render(*frame);
   gl.finish();
   const double total = seconds(started);
   const double cpu = processCpuSeconds() - cpuBefore;
-  timing.fetch = host.frameDeliverySeconds() - fetchedBefore;
+  timing.fetch = engine.frameDeliverySeconds() - fetchedBefore;
   timing.render = total - timing.fetch;
-  timing.renderCpu = cpu - (host.frameDeliveryCpuSeconds() - fetchCpuBefore);
+  timing.renderCpu = cpu - (engine.frameDeliveryCpuSeconds() - fetchCpuBefore);
   started = std::chrono::steady_clock::now();
-  const WispRenderContext& context = frame.context();
+  const WispRenderContext& context = frame->context();
   refhost::readBack(context.output.id, context.width, context.height);
   timing.readback = seconds(started);
   return timing;

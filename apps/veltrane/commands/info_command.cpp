@@ -53,7 +53,7 @@ int runInfo(const std::vector<std::string>& args) {
 
   refhost::EngineOptions engineOptions;
   engineOptions.modulePath = path;
-  engineOptions.gl = false;  // nothing here draws
+  // No context: nothing here draws.
   engineOptions.hostId = hostId;
   refhost::Engine engine(std::move(engineOptions));
   refhost::Registration registration = engine.module().readRegistration();

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cstdio>
 
+#include "refhost/gl/headless_context.h"
 #include "scene/json_fields.h"
 #include "scene/scene_params.h"
 
@@ -54,6 +55,7 @@ std::unique_ptr<refhost::Engine> startScene(const Scene& scene, SceneEngineOptio
   engineOptions.modulePath = options.modulePath;
   engineOptions.profile = options.profile;
   engineOptions.context = std::move(options.context);
+  engineOptions.makeContext = refhost::makeHeadlessContext;
   engineOptions.hostId = options.hostId;
   engineOptions.documentName = scene.file;
   engineOptions.onMessage = std::move(options.onMessage);

@@ -30,8 +30,8 @@ void menuBar(ViewerSession& session, ViewerActions& actions, ChromeLayout& layou
     ImGui::EndMenu();
   }
   if (ImGui::BeginMenu("Edit")) {
-    bool canUndo = !session.host().undoStack().steps().empty();
-    bool canRedo = !session.host().redoStepNames().empty();
+    bool canUndo = !session.engine().undoStepNames().empty();
+    bool canRedo = !session.engine().redoStepNames().empty();
     actions.undo = ImGui::MenuItem("Undo", "Ctrl+Z", false, canUndo) || actions.undo;
     actions.redo = ImGui::MenuItem("Redo", "Ctrl+Shift+Z", false, canRedo) || actions.redo;
     ImGui::EndMenu();
@@ -56,8 +56,8 @@ void menuBar(ViewerSession& session, ViewerActions& actions, ChromeLayout& layou
 // The undo history: the scene as opened, the steps done (the last one current) and, greyed,
 // the steps undone. A click goes back or forward to that step.
 void historyList(ViewerSession& session, ViewerActions& actions) {
-  std::vector<std::string> done = session.host().undoStepNames();
-  std::vector<std::string> undone = session.host().redoStepNames();
+  std::vector<std::string> done = session.engine().undoStepNames();
+  std::vector<std::string> undone = session.engine().redoStepNames();
   int count = static_cast<int>(done.size());
   if (ImGui::Selectable("(as opened)", done.empty())) actions.undoSteps = count;
   for (int i = 0; i < count; ++i) {

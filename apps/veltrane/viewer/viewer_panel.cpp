@@ -155,7 +155,7 @@ void drawParam(ViewerSession& session, const Param& param, const std::vector<Lay
 
 void drawItems(ViewerSession& session, const std::vector<refhost::PanelItem>& items,
                const std::vector<LayerOption>& layers, bool topLevel) {
-  const ParamPanel& panel = session.host().panel();
+  const ParamPanel& panel = session.engine().panel();
   for (const refhost::PanelItem& item : items) {
     auto index = static_cast<std::size_t>(item.index);
     if (!item.isGroup) {
@@ -181,7 +181,7 @@ void drawItems(ViewerSession& session, const std::vector<refhost::PanelItem>& it
 
 void drawParameterPanel(ViewerSession& session, const std::vector<LayerOption>& layers) {
   ImGui::PushItemWidth(ImGui::GetContentRegionAvail().x * 0.55f);
-  drawItems(session, session.host().panel().topLevel(), layers, true);
+  drawItems(session, session.engine().panel().topLevel(), layers, true);
   ImGui::PopItemWidth();
 }
 

@@ -133,12 +133,13 @@ void ViewerSession::applyEdits(const std::string& stepName,
   finishEdit();
   engine_->beginEdit(stepName);
   attempt(stepName, [&] {
+    std::vector<std::pair<std::string, refhost::ParamState>> states;
     for (const veltrane_cli::ParamEdit& edit : edits) {
       refhost::ParamState state;  // these values hold at every frame
       state.value = edit.value;
-      if (!(engine_->param(edit.id).state == state)) engine_->host().editState(edit.id, state);
+      states.emplace_back(edit.id, state);
     }
-    engine_->reportChanges();
+    engine_->edit(states);
   });
   engine_->endEdit();
 }

@@ -39,7 +39,6 @@ class ViewerSession {
   ViewerSession& operator=(const ViewerSession&) = delete;
 
   refhost::Engine& engine() { return *engine_; }
-  refhost::Host& host() { return engine_->host(); }
   const refhost::Composition& composition() const { return scene_.composition; }
 
   int32_t frame() const { return frame_; }

@@ -134,7 +134,7 @@ ViewerWindow::ViewerWindow(const veltrane_cli::Scene& scene, const ViewOptions& 
                                                   [window] { glfwMakeContextCurrent(window); });
   session_ = std::make_unique<ViewerSession>(scene, options.modulePath, options.profile,
                                              std::move(context), options.frame);
-  session_->host().setPopupMenuChooser(
+  session_->engine().setPopupMenuChooser(
       [this](const std::string& items) { return chooseFromMenu(items); });
 
   glfwSetWindowUserPointer(window, this);
@@ -471,8 +471,8 @@ void ViewerWindow::save() {
     return list.empty() ? std::string("none") : list;
   };
   std::printf("saved %s; undo history: %s; undone: %s\n", path.c_str(),
-              quotedList(session_->host().undoStepNames()).c_str(),
-              quotedList(session_->host().redoStepNames()).c_str());
+              quotedList(session_->engine().undoStepNames()).c_str(),
+              quotedList(session_->engine().redoStepNames()).c_str());
   std::fflush(stdout);
 }
 

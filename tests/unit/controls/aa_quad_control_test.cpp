@@ -6,6 +6,7 @@
 
 #include "controls/parameter_accessors.h"
 #include "refhost/core/host.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -68,7 +69,7 @@ TEST(AAQuadControl, PartAndCursorUnderThePointer) {
       {mirrored, 0.0f, 0, {100, 200}, ControlPart::CornerX1Y1, 9},
   };
   for (const auto& c : cases) {
-    refhost::Host host;
+    testsupport::InstrumentedHost host;
     RectParam param{c.rect, {}, 0, 0};
     AAQuadControl control = controlFor(param, c.allowMove);
     EXPECT_EQ(

@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "refhost/core/host.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -43,7 +44,7 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
       {{100.0f, 50.0f}, 1.0f, false, -1},  {{100.0f, 301.0f}, 1.0f, false, -1},
   };
   for (const auto& c : cases) {
-    refhost::Host host;
+    testsupport::InstrumentedHost host;
     PointParam param;
     SplitScreenCutPositionControl control = controlFor(param);
     EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, b, c.pointer,
@@ -57,7 +58,7 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
   }
   // Across a horizontal segment the reach follows the vertical view scale.
   for (const auto& [y, hot] : {std::pair{107.0f, true}, std::pair{108.0f, false}}) {
-    refhost::Host host;
+    testsupport::InstrumentedHost host;
     PointParam param;
     SplitScreenCutPositionControl control = controlFor(param);
     EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, {300.0f, 100.0f}, {200.0f, y},
@@ -66,7 +67,7 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
         << y;
   }
   // A zero-length segment has no inside at all.
-  refhost::Host host;
+  testsupport::InstrumentedHost host;
   PointParam param;
   SplitScreenCutPositionControl control = controlFor(param);
   EXPECT_FALSE(control.test(host.handle(), &host.api(), kFrame, a, a, a, {1, 1}, 0.0f, 0));

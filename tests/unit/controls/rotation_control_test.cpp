@@ -9,6 +9,7 @@
 
 #include "controls/handle_math.h"
 #include "refhost/core/host.h"
+#include "support/instrumented_host.h"
 
 namespace {
 
@@ -44,7 +45,7 @@ genVec2 around(float degrees, float distance, float along = 0.0f) {
           kCentre.y + distance * std::cos(a) - along * std::sin(a)};
 }
 
-int lastCursor(const refhost::Host& host) {
+int lastCursor(const testsupport::InstrumentedHost& host) {
   return host.cursorShapes().empty() ? -1 : host.cursorShapes().back();
 }
 
@@ -54,7 +55,7 @@ TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
     int cursor;
   } cases[] = {{0, 10}, {135, 13}, {315, 17}, {-90, 16}, {-675, 11}, {3600 + 240, 15}};
   for (const auto& c : cases) {
-    refhost::Host host;
+    testsupport::InstrumentedHost host;
     AngleParam param{c.degrees * kDegree, {}};
     RotationControl control = controlFor(param);
     EXPECT_TRUE(control.test(host.handle(), &host.api(), kCentre, 100.0f, around(c.degrees, 100.0f),
@@ -77,7 +78,7 @@ TEST(RotationControl, CursorOctantsTurnHalfWayBetweenDirections) {
 
 TEST(RotationControl, PressedHoverSurvivesButtonUpMovesOnlyOnTheStickyHost) {
   for (const int hostId : {0, 3000}) {
-    refhost::Host host;
+    testsupport::InstrumentedHost host;
     host.setHostId(hostId);
     AngleParam param;
     RotationControl control = controlFor(param);

@@ -8,6 +8,7 @@
 
 #include "refhost/engine.h"
 #include "refhost/engine/composition.h"
+#include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
 
 namespace refhost {
@@ -18,6 +19,7 @@ constexpr int32_t kHeight = 180;
 
 TEST(Preview, HalfSizeScaledUpMatchesTheFullRenderEdgesAside) {
   EngineOptions options;
+  options.makeContext = refhost::makeHeadlessContext;
   options.modulePath = VELTRANE_MODULE_PATH;
   Engine engine(std::move(options));
   engine.setFrameSettings({kWidth, kHeight, 25.0, 1.0f, 10, ""});
@@ -54,7 +56,9 @@ TEST(Preview, HalfSizeScaledUpMatchesTheFullRenderEdgesAside) {
   ASSERT_EQ(preview->context().width, kWidth / 2);
   const RgbaImage small = readBack(preview->context().output.id, kWidth / 2, kHeight / 2);
   const RgbaImage scaledUp = resized(small, kWidth, kHeight);
-  EXPECT_EQ(engine.host().pixelScale(), 1.0) << "the scale ends with the preview";
+  EXPECT_EQ(readBack(engine.render(3)->context().output.id, kWidth, kHeight).pixels,
+            fullPicture.pixels)
+      << "the scale ends with the preview";
 
   // Edges aside (a pixel whose 5x5 neighbourhood in the full render spans more than 40 levels
   // in a channel lies at a border's or a picture's edge, which half as many pixels draw more

@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include "refhost/engine.h"
+#include "refhost/gl/headless_context.h"
 
 namespace refhost {
 namespace {
@@ -12,6 +13,7 @@ constexpr char kLayer[] = "1a7e0000-0000-4000-8000-000000000001";
 
 TEST(ViewerChannel, DragSelectsAndMovesAnInputAsOneUndoStep) {
   EngineOptions options;
+  options.makeContext = refhost::makeHeadlessContext;
   options.modulePath = VELTRANE_MODULE_PATH;
   Engine engine(std::move(options));
   engine.setFrameSettings({64, 36, 25.0, 1.0f, 10, "0e000000-0000-4000-8000-000000000001"});

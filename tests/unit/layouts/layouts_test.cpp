@@ -9,6 +9,7 @@
 #include <map>
 
 #include "refhost/engine.h"
+#include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
 #include "scene/scene_document.h"
 #include "scene/scene_engine.h"
@@ -29,6 +30,7 @@ uint8_t redOf(int input) { return static_cast<uint8_t>(20 * (input + 1)); }
 // The module with nine solid layers, one per input, and no border.
 std::unique_ptr<refhost::Engine> solidLayers() {
   refhost::EngineOptions options;
+  options.makeContext = refhost::makeHeadlessContext;
   options.modulePath = VELTRANE_MODULE_PATH;
   auto engine = std::make_unique<refhost::Engine>(std::move(options));
   engine->setFrameSettings({kWidth, kHeight, 25.0, 1.0f, 1, ""});

@@ -6,6 +6,7 @@
 #include <cmath>
 
 #include "refhost/core/host.h"
+#include "support/instrumented_host.h"
 
 namespace refhost {
 namespace {
@@ -17,7 +18,6 @@ const char* const kLayerB = "aaaaaaaa-bbbb-cccc-dddd-eeeeeeeeeeee";
 class HostPanel : public ::testing::Test {
  protected:
   void SetUp() override {
-    host.setCallLogging(true);
     int32_t second = 1;
     const int32_t results[] = {
         api.AddChoiceParam(h, L"Preset", "c", 98, L"A|B|C", &second, 0),
@@ -46,7 +46,7 @@ class HostPanel : public ::testing::Test {
     return states;
   }
 
-  Host host;
+  testsupport::InstrumentedHost host;
   tagWispAPI& api = host.api();
   WispHost* h = host.handle();
 };

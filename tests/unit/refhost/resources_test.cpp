@@ -138,8 +138,8 @@ TEST_F(HostResources, FramesCarryTheirIndexAndAreTheHosts) {
 
   TextureRecord refused{};
   EXPECT_NE(api()->RenderLayerFrame(handle(), &context, kNoLayer, 7, &refused), 0);
-  host().setRefuseSourceFrames(true);
-  host().setRefuseLayerFrames(true);
+  host().faults().refuseSourceFrames = true;
+  host().faults().refuseLayerFrames = true;
   EXPECT_NE(api()->GetSourceFrame(handle(), &context, 1, &refused), 0);
   EXPECT_NE(api()->RenderLayerFrame(handle(), &context, kClip, 7, &refused), 0);
   EXPECT_EQ(host().outstandingFrames(), 1);
@@ -164,8 +164,8 @@ TEST_F(HostResources, LayerQueriesBoundNamesAndFailOnRequest) {
   EXPECT_EQ(state.type, 4u);
   EXPECT_EQ(state.secondMatrix[15], 1.0f);
 
-  host().setFailLayerQueries(true);
-  host().setFailTimeInfo(true);
+  host().faults().failLayerQueries = true;
+  host().faults().failTimeInfo = true;
   EXPECT_NE(api()->QueryLayerState(handle(), kClip, 4000, &state), 0);
   WispTimeInfo time{};
   EXPECT_NE(api()->GetTimeInfo(handle(), &time), 0);

@@ -78,7 +78,7 @@ TEST_F(ViewerSessionFraming, PresetsAndFittingFrameEachPictureAsSplitDoes) {
   session.editValue("cutDirection_0", refhost::ParamValue::ofFloat(100));
   session.finishEdit();
   session.fitPicturesToRegions();
-  EXPECT_EQ(session.host().undoStepNames().back(), "Fit pictures to regions");
+  EXPECT_EQ(session.engine().undoStepNames().back(), "Fit pictures to regions");
   const ordered_json fitted = paramsOf();
   session.editValue("inputFrameScale1", refhost::ParamValue::ofFloat(100));
   session.finishEdit();

@@ -8,7 +8,7 @@
 #include <stdexcept>
 #include <string>
 
-#include "refhost/gl/gl_context.h"
+#include "refhost/gl/headless_context.h"
 
 namespace refhost {
 namespace {
@@ -70,52 +70,63 @@ PFNWGLCREATECONTEXTATTRIBSARBPROC contextCreator(HDC deviceContext) {
   return creator;
 }
 
+class WglContext : public PlatformContext {
+ public:
+  explicit WglContext(GlProfile profile) {
+    window_ = createHiddenWindow();
+    deviceContext_ = GetDC(window_);
+    try {
+      if (!deviceContext_) throw wglError("GetDC");
+      setPixelFormat(deviceContext_);
+      const int attributes[] = {WGL_CONTEXT_MAJOR_VERSION_ARB,
+                                4,
+                                WGL_CONTEXT_MINOR_VERSION_ARB,
+                                1,
+                                WGL_CONTEXT_PROFILE_MASK_ARB,
+                                profile == GlProfile::Core
+                                    ? WGL_CONTEXT_CORE_PROFILE_BIT_ARB
+                                    : WGL_CONTEXT_COMPATIBILITY_PROFILE_BIT_ARB,
+                                WGL_CONTEXT_FLAGS_ARB,
+                                WGL_CONTEXT_DEBUG_BIT_ARB,
+                                0};
+      context_ = contextCreator(deviceContext_)(deviceContext_, nullptr, attributes);
+      if (!context_) throw wglError("wglCreateContextAttribsARB (OpenGL 4.1)");
+      makeCurrent();
+    } catch (...) {
+      release();
+      throw;
+    }
+  }
+  ~WglContext() override { release(); }
+  WglContext(const WglContext&) = delete;
+  WglContext& operator=(const WglContext&) = delete;
+
+  void makeCurrent() override {
+    if (!wglMakeCurrent(deviceContext_, context_)) throw wglError("wglMakeCurrent");
+  }
+
+ private:
+  void release() {
+    if (context_) {
+      wglMakeCurrent(nullptr, nullptr);
+      wglDeleteContext(context_);
+      context_ = nullptr;
+    }
+    if (deviceContext_) ReleaseDC(window_, deviceContext_);
+    DestroyWindow(window_);
+    deviceContext_ = nullptr;
+    window_ = nullptr;
+  }
+
+  HWND window_ = nullptr;
+  HDC deviceContext_ = nullptr;
+  HGLRC context_ = nullptr;
+};
+
 }  // namespace
 
-void GlContext::createPlatformContext() {
-  HWND window = createHiddenWindow();
-  window_ = window;
-  HDC deviceContext = GetDC(window);
-  display_ = deviceContext;
-  try {
-    if (!deviceContext) throw wglError("GetDC");
-    setPixelFormat(deviceContext);
-    const int attributes[] = {WGL_CONTEXT_MAJOR_VERSION_ARB,
-                              4,
-                              WGL_CONTEXT_MINOR_VERSION_ARB,
-                              1,
-                              WGL_CONTEXT_PROFILE_MASK_ARB,
-                              profile_ == GlProfile::Core
-                                  ? WGL_CONTEXT_CORE_PROFILE_BIT_ARB
-                                  : WGL_CONTEXT_COMPATIBILITY_PROFILE_BIT_ARB,
-                              WGL_CONTEXT_FLAGS_ARB,
-                              WGL_CONTEXT_DEBUG_BIT_ARB,
-                              0};
-    HGLRC context = contextCreator(deviceContext)(deviceContext, nullptr, attributes);
-    if (!context) throw wglError("wglCreateContextAttribsARB (OpenGL 4.1)");
-    context_ = context;
-    makeCurrent();
-  } catch (...) {
-    destroyPlatformContext();
-    throw;
-  }
-}
-
-void GlContext::destroyPlatformContext() {
-  if (context_) {
-    wglMakeCurrent(nullptr, nullptr);
-    wglDeleteContext(static_cast<HGLRC>(context_));
-    context_ = nullptr;
-  }
-  if (display_) ReleaseDC(static_cast<HWND>(window_), static_cast<HDC>(display_));
-  DestroyWindow(static_cast<HWND>(window_));
-  display_ = nullptr;
-  window_ = nullptr;
-}
-
-void GlContext::makePlatformContextCurrent() {
-  if (!wglMakeCurrent(static_cast<HDC>(display_), static_cast<HGLRC>(context_)))
-    throw wglError("wglMakeCurrent");
+std::unique_ptr<GlContext> makeHeadlessContext(GlProfile profile) {
+  return std::make_unique<GlContext>(profile, std::make_unique<WglContext>(profile));
 }
 
 }  // namespace refhost

@@ -6,7 +6,7 @@
 #include <cstdio>
 #include <stdexcept>
 
-#include "refhost/gl/gl_context.h"
+#include "refhost/gl/headless_context.h"
 
 namespace refhost {
 namespace {
@@ -49,44 +49,51 @@ EGLDisplay openDisplay() {
   return display;
 }
 
+class EglContext : public PlatformContext {
+ public:
+  explicit EglContext(GlProfile profile) {
+    display_ = openDisplay();
+    if (display_ == EGL_NO_DISPLAY) throw std::runtime_error(eglErrorText("eglInitialize"));
+    if (!eglBindAPI(EGL_OPENGL_API)) throw std::runtime_error(eglErrorText("eglBindAPI"));
+    const EGLint attributes[] = {EGL_CONTEXT_MAJOR_VERSION,
+                                 4,
+                                 EGL_CONTEXT_MINOR_VERSION,
+                                 1,
+                                 EGL_CONTEXT_OPENGL_PROFILE_MASK,
+                                 profile == GlProfile::Core
+                                     ? EGL_CONTEXT_OPENGL_CORE_PROFILE_BIT
+                                     : EGL_CONTEXT_OPENGL_COMPATIBILITY_PROFILE_BIT,
+                                 EGL_CONTEXT_OPENGL_DEBUG,
+                                 EGL_TRUE,
+                                 EGL_NONE};
+    context_ = eglCreateContext(display_, EGL_NO_CONFIG_KHR, EGL_NO_CONTEXT, attributes);
+    if (context_ == EGL_NO_CONTEXT)
+      throw std::runtime_error(eglErrorText("eglCreateContext (OpenGL 4.1)"));
+    makeCurrent();
+  }
+  ~EglContext() override {
+    eglMakeCurrent(display_, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
+    eglDestroyContext(display_, context_);
+    // The display is shared per process by EGL; terminating it would pull it from under any
+    // other live context, so it is left initialised.
+  }
+  EglContext(const EglContext&) = delete;
+  EglContext& operator=(const EglContext&) = delete;
+
+  void makeCurrent() override {
+    if (!eglMakeCurrent(display_, EGL_NO_SURFACE, EGL_NO_SURFACE, context_))
+      throw std::runtime_error(eglErrorText("eglMakeCurrent"));
+  }
+
+ private:
+  EGLDisplay display_ = EGL_NO_DISPLAY;
+  EGLContext context_ = EGL_NO_CONTEXT;
+};
+
 }  // namespace
 
-void GlContext::createPlatformContext() {
-  EGLDisplay display = openDisplay();
-  if (display == EGL_NO_DISPLAY) throw std::runtime_error(eglErrorText("eglInitialize"));
-  display_ = display;
-  if (!eglBindAPI(EGL_OPENGL_API)) throw std::runtime_error(eglErrorText("eglBindAPI"));
-  const EGLint attributes[] = {EGL_CONTEXT_MAJOR_VERSION,
-                               4,
-                               EGL_CONTEXT_MINOR_VERSION,
-                               1,
-                               EGL_CONTEXT_OPENGL_PROFILE_MASK,
-                               profile_ == GlProfile::Core
-                                   ? EGL_CONTEXT_OPENGL_CORE_PROFILE_BIT
-                                   : EGL_CONTEXT_OPENGL_COMPATIBILITY_PROFILE_BIT,
-                               EGL_CONTEXT_OPENGL_DEBUG,
-                               EGL_TRUE,
-                               EGL_NONE};
-  EGLContext context = eglCreateContext(display, EGL_NO_CONFIG_KHR, EGL_NO_CONTEXT, attributes);
-  if (context == EGL_NO_CONTEXT) {
-    std::string reason = eglErrorText("eglCreateContext (OpenGL 4.1)");
-    eglTerminate(display);
-    throw std::runtime_error(reason);
-  }
-  context_ = context;
-  makeCurrent();
-}
-
-void GlContext::destroyPlatformContext() {
-  eglMakeCurrent(display_, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
-  eglDestroyContext(display_, context_);
-  // The display is shared per process by EGL; terminating it would pull it from under any
-  // other live context, so it is left initialised.
-}
-
-void GlContext::makePlatformContextCurrent() {
-  if (!eglMakeCurrent(display_, EGL_NO_SURFACE, EGL_NO_SURFACE, context_))
-    throw std::runtime_error(eglErrorText("eglMakeCurrent"));
+std::unique_ptr<GlContext> makeHeadlessContext(GlProfile profile) {
+  return std::make_unique<GlContext>(profile, std::make_unique<EglContext>(profile));
 }
 
 }  // namespace refhost
