@@ -93,6 +93,14 @@ struct CallerTextures {
   TextureRecord output{};
 };
 
+// Where the module shows each input in a frame: for every pixel of the composition frame, top
+// row first, the input its region shows, or -1 where no region covers it.
+struct RegionMap {
+  int32_t width = 0;
+  int32_t height = 0;
+  std::vector<int8_t> inputs;
+};
+
 // One message an event sent and what it answered; `param` names the parameter a change report
 // (message 7) was about.
 struct SentMessage {
@@ -208,6 +216,13 @@ class Engine {
   // sizes), so that it shows the full render at a quarter (divisor 2) or a sixteenth (4) of the
   // cost. Divisor 1 is the full render.
   std::unique_ptr<RenderFrame> renderPreview(int32_t frame, int32_t divisor);
+
+  // The regions the module divides frame `frame` into, with the settings given (cut positions,
+  // directions, count, type) standing in for the stored ones: one render of a probe in which
+  // every input shows a picture of its own, nothing stored, reported or made an undo step.
+  // Layouts frame their pictures on it, so the host never works out the partition itself.
+  RegionMap mapRegions(int32_t frame,
+                       const std::vector<std::pair<std::string, ParamValue>>& settings = {});
 
   // Host textures in the engine's context for a caller's frames: RGBA8 pixels (rows from the
   // bottom), or uninitialised storage for null. Given back with deleteTexture.

@@ -192,6 +192,7 @@ class Host {
     streams_.clear();
   }
   const FrameSource& sourceFrames() const { return sourceFrames_; }
+  const std::function<FrameSource()>& sourceStreamOpener() const { return sourceStreamOpener_; }
 
   // ---- Test instruments and problems -----------------------------------------------------
   // The call log and the failures a test hands the host (see instruments.h); both borrowed.

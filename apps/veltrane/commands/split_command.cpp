@@ -112,7 +112,8 @@ int runSplit(const std::vector<std::string>& arguments) {
 
   std::map<std::string, std::string> splitOptions = options;
   if (!frameValues.empty()) splitOptions["--frame"] = frameValues;
-  const SplitScene split = buildSplitScene(splitRequestFrom(parsed.positional, splitOptions));
+  const SplitScene split =
+      buildSplitScene(splitRequestFrom(parsed.positional, splitOptions), pluginPath(options));
   for (const std::string& note : split.notes)
     std::fprintf(stderr, "veltrane split: note: %s\n", note.c_str());
   const std::string saveTo = options.count("--save-scene") ? options["--save-scene"] : "";

@@ -8,6 +8,7 @@
 #include <sstream>
 
 #include "cli/cli_support.h"
+#include "refhost/gl/headless_context.h"
 #include "refhost/media/media_source.h"
 #include "refhost/media/test_patterns.h"
 
@@ -104,71 +105,180 @@ int32_t framesOf(const Clip& clip, double rate) {
   return std::max(1, static_cast<int32_t>(std::ceil(clip.info.duration * rate - 1e-6)));
 }
 
-nlohmann::ordered_json valueJson(const refhost::ParamValue& value, const std::string& id) {
+// A parameter value as a scene file writes it, in the shape its declared kind has.
+nlohmann::ordered_json valueJson(const refhost::Param& declared, const refhost::ParamValue& value) {
   auto number = [](double v) { return std::round(v * 1e4) / 1e4; };  // no float noise in files
-  if (id.rfind("inputLayer", 0) == 0) return std::string(value.layer);
-  if (id == "numberOfCuts" || id == "cutType" || id.rfind("inputFrameShift", 0) == 0)
-    return value.integer;
-  if (id.rfind("cutPosition", 0) == 0 || id.rfind("inputFrameTranslation", 0) == 0)
-    return {number(value.number[0]), number(value.number[1])};
-  return number(value.number[0]);
+  switch (declared.kind) {
+    case refhost::ParamKind::Layer:
+      return std::string(value.layer);
+    case refhost::ParamKind::Int:
+    case refhost::ParamKind::Bool:
+    case refhost::ParamKind::Choice:
+      return value.integer;
+    case refhost::ParamKind::Point:
+      return {number(value.number[0]), number(value.number[1])};
+    case refhost::ParamKind::Color:
+      return {number(value.number[0]), number(value.number[1]), number(value.number[2])};
+    default:
+      return number(value.number[0]);
+  }
 }
 
-}  // namespace
-
-SplitScene buildSplitScene(const SplitRequest& request) {
+std::vector<Clip> readClips(const SplitRequest& request) {
   if (request.clips.empty()) throw UsageError("expects 1 to 9 clips, got none");
   if (request.clips.size() > static_cast<std::size_t>(kMaxClips))
     throw UsageError("expects 1 to 9 clips, got " + std::to_string(request.clips.size()));
   std::vector<Clip> clips;
   for (const std::string& argument : request.clips) clips.push_back(readClip(argument));
+  return clips;
+}
 
-  const std::string layoutName =
-      request.layout.value_or(defaultLayoutFor(static_cast<int32_t>(clips.size())));
-  const std::optional<std::size_t> layout = findLayout(layoutName);
+// The layout named (or the one for the number of clips), checked against the clips and the
+// nudges.
+std::size_t chooseLayout(const SplitRequest& request, std::size_t clips) {
+  const std::string name = request.layout.value_or(defaultLayoutFor(static_cast<int32_t>(clips)));
+  const std::optional<std::size_t> layout = findLayout(name);
   if (!layout)
-    throw UsageError("option '--layout': expected one of " + layoutNames() + ", got '" +
-                     layoutName + "'");
+    throw UsageError("option '--layout': expected one of " + layoutNames() + ", got '" + name +
+                     "'");
   const LayoutInfo& info = layouts()[*layout];
-  if (static_cast<int32_t>(clips.size()) > info.regions)
-    throw UsageError("option '--layout': " + layoutName + " shows " + std::to_string(info.regions) +
-                     " pictures, fewer than the " + std::to_string(clips.size()) + " clips given");
+  if (static_cast<int32_t>(clips) > info.regions)
+    throw UsageError("option '--layout': " + name + " shows " + std::to_string(info.regions) +
+                     " pictures, fewer than the " + std::to_string(clips) + " clips given");
   for (const FrameNudge& nudge : request.nudges)
-    if (nudge.input < 1 || nudge.input > static_cast<int32_t>(clips.size()))
+    if (nudge.input < 1 || nudge.input > static_cast<int32_t>(clips))
       throw UsageError("option '--frame': expected a clip number from 1 to " +
-                       std::to_string(clips.size()) + ", got " + std::to_string(nudge.input));
+                       std::to_string(clips) + ", got " + std::to_string(nudge.input));
+  return *layout;
+}
 
-  SplitScene split;
-  const Clip& first = clips.front();
+struct Frame {
   std::array<int32_t, 2> size = kDefaultSize;
-  if (first.info.width > 0 && first.info.height > 0) size = {first.info.width, first.info.height};
-  if (request.size) size = *request.size;
-  const double rate = request.fps.value_or(
-      first.video && first.info.frameRate > 0 ? first.info.frameRate : kDefaultRate);
+  double rate = kDefaultRate;
+  int32_t duration = 1;
+};
+
+// The composition's size and rate from the first clip (or the options), its length from the
+// clips the request's length rule names.
+Frame compositionOf(const SplitRequest& request, const std::vector<Clip>& clips) {
+  Frame frame;
+  const Clip& first = clips.front();
+  if (first.info.width > 0 && first.info.height > 0)
+    frame.size = {first.info.width, first.info.height};
+  if (request.size) frame.size = *request.size;
+  frame.rate = request.fps.value_or(first.video && first.info.frameRate > 0 ? first.info.frameRate
+                                                                            : kDefaultRate);
   // Stills and generated pictures have no length: they last as long as the composition. A
   // first clip without one leaves the length to the longest video.
   int32_t longest = 0, shortest = 0;
   for (const Clip& clip : clips) {
-    const int32_t frames = framesOf(clip, rate);
+    const int32_t frames = framesOf(clip, frame.rate);
     if (frames == 0) continue;
     longest = std::max(longest, frames);
     shortest = shortest == 0 ? frames : std::min(shortest, frames);
   }
-  int32_t duration = request.length == SplitRequest::Length::Longest    ? longest
-                     : request.length == SplitRequest::Length::Shortest ? shortest
-                                                                        : framesOf(first, rate);
-  if (duration == 0) duration = longest;
-  duration = std::max(duration, 1);  // stills and generated pictures alone: one frame
+  frame.duration = request.length == SplitRequest::Length::Longest    ? longest
+                   : request.length == SplitRequest::Length::Shortest ? shortest
+                                                                      : framesOf(first, frame.rate);
+  if (frame.duration == 0) frame.duration = longest;
+  frame.duration = std::max(frame.duration, 1);  // stills and generated pictures alone: one frame
+  return frame;
+}
 
-  LayoutPlan plan;
+LayoutPlan planFor(const SplitRequest& request, std::size_t layout, const Frame& frame) {
   try {
-    plan = planLayout(*layout, size[0], size[1], request.layoutOptions);
+    return planLayout(layout, frame.size[0], frame.size[1], request.layoutOptions);
   } catch (const std::invalid_argument& refusal) {
     const char* option = request.layoutOptions.gap ? "--gap" : "--radial-centre";
     throw UsageError(std::string("option '") + option + "': " + refusal.what());
   }
+}
+
+// The engine the layout's regions are asked of: the module at the composition's size, with no
+// media (the regions need none).
+std::unique_ptr<refhost::Engine> regionEngine(const std::string& modulePath, const Frame& frame) {
+  refhost::EngineOptions options;
+  options.modulePath = modulePath;
+  options.makeContext = refhost::makeHeadlessContext;
+  auto engine = std::make_unique<refhost::Engine>(std::move(options));
+  refhost::FrameSettings settings;
+  settings.width = frame.size[0];
+  settings.height = frame.size[1];
+  settings.frameRate = frame.rate;
+  engine->setFrameSettings(settings);
+  engine->start();
+  engine->createInstance();
+  return engine;
+}
+
+// The values the layout sets, less those at their declared defaults (an unused cut, an input at
+// the frame's placement), so that the saved scene reads as a person's; the cut type by name.
+nlohmann::ordered_json layoutParams(refhost::Engine& engine, const LayoutPlan& plan,
+                                    const std::vector<std::string>& sources,
+                                    const std::vector<Point>& pictureSizes) {
+  const refhost::EffectVocabulary& roles = engine.vocabulary();
+  const refhost::Param& cutType = roles.declared(refhost::EffectParam::CutType);
+  nlohmann::ordered_json params = nlohmann::ordered_json::object();
+  for (const ParamEdit& edit : layoutEdits(engine, plan, sources, pictureSizes)) {
+    const refhost::Param& declared = roles.declared(edit.id);
+    if (edit.id == cutType.id) {
+      params[edit.id] = cutType.choices.at(static_cast<std::size_t>(edit.value.integer));
+      continue;
+    }
+    nlohmann::ordered_json value = valueJson(declared, edit.value);
+    if (value != valueJson(declared, declared.defaultValue)) params[edit.id] = value;
+  }
+  return params;
+}
+
+// Each nudge moves, scales and turns the framing of every input that shows its clip.
+void applyNudges(nlohmann::ordered_json& params, const std::vector<FrameNudge>& nudges,
+                 const LayoutPlan& plan, std::size_t clips,
+                 const refhost::EffectVocabulary& roles) {
+  using refhost::InputParam;
+  for (const FrameNudge& nudge : nudges) {
+    for (std::size_t k = 0; k < plan.inputs.size(); ++k) {
+      if (k % clips != static_cast<std::size_t>(nudge.input - 1)) continue;
+      const int32_t input = plan.inputs[k];
+      const std::string& translation = roles.id(InputParam::Translation, input);
+      const std::string& scale = roles.id(InputParam::Scale, input);
+      const refhost::ParamValue translationDefault =
+          roles.declared(InputParam::Translation, input).defaultValue;
+      const Point at =
+          params.contains(translation)
+              ? Point{params[translation][0].get<double>(), params[translation][1].get<double>()}
+              : Point{translationDefault.number[0], translationDefault.number[1]};
+      params[translation] = {at[0] + nudge.offset[0], at[1] + nudge.offset[1]};
+      const double framed = params.contains(scale)
+                                ? params[scale].get<double>()
+                                : roles.declared(InputParam::Scale, input).defaultValue.number[0];
+      params[scale] = framed * nudge.scale / 100;
+      if (nudge.rotation != 0) params[roles.id(InputParam::Rotation, input)] = nudge.rotation;
+    }
+  }
+}
+
+void applyBorder(nlohmann::ordered_json& params, const BorderSetting& border,
+                 const refhost::EffectVocabulary& roles) {
+  using refhost::EffectParam;
+  params[roles.id(EffectParam::BorderWidth)] = border.width;
+  params[roles.id(EffectParam::BorderColor)] = {border.colour[0], border.colour[1],
+                                                border.colour[2]};
+  params[roles.id(EffectParam::BorderAlpha)] = border.opacity;
+}
+
+}  // namespace
+
+SplitScene buildSplitScene(const SplitRequest& request, const std::string& modulePath) {
+  const std::vector<Clip> clips = readClips(request);
+  const std::size_t layout = chooseLayout(request, clips.size());
+  const LayoutInfo& info = layouts()[layout];
+  const Frame frame = compositionOf(request, clips);
+  const LayoutPlan plan = planFor(request, layout, frame);
+
+  SplitScene split;
   if (static_cast<int32_t>(clips.size()) < info.regions)
-    split.notes.push_back(layoutName + " shows " + std::to_string(info.regions) +
+    split.notes.push_back(std::string(info.name) + " shows " + std::to_string(info.regions) +
                           " pictures; the " + std::to_string(clips.size()) + " clip" +
                           (clips.size() == 1 ? "" : "s") + " given fill them again in order");
 
@@ -179,62 +289,26 @@ SplitScene buildSplitScene(const SplitRequest& request) {
     const Clip& clip = clips[i];
     // A clip keeps its proportions: its picture's content at scale 100 is the largest of its
     // shape inside the frame.
-    pictureSizes.push_back(contentSize(clip.info.width, clip.info.height, true, size[0], size[1]));
+    pictureSizes.push_back(
+        contentSize(clip.info.width, clip.info.height, true, frame.size[0], frame.size[1]));
     if (i == 0) continue;
     sources.push_back(layerGuid(i));
     layers.push_back({{"guid", layerGuid(i)}, {"name", clip.name}, {"source", clip.source}});
-    if (clip.video || clip.info.width == 0) layers.back()["frameCount"] = duration;
+    if (clip.video || clip.info.width == 0) layers.back()["frameCount"] = frame.duration;
   }
 
-  // The values the layout sets, less those a scene leaves at their declared defaults (an unused
-  // cut, an input at the frame's placement), so that the saved scene reads as a person's.
-  nlohmann::ordered_json params = nlohmann::ordered_json::object();
-  for (const ParamEdit& edit : layoutEdits(plan, size[0], size[1], sources, pictureSizes)) {
-    nlohmann::ordered_json value = valueJson(edit.value, edit.id);
-    const bool zeroPoint = value == nlohmann::ordered_json({0, 0});
-    const bool byDefault = (edit.id.rfind("cutPosition", 0) == 0 && zeroPoint) ||
-                           (edit.id.rfind("inputFrameTranslation", 0) == 0 && zeroPoint) ||
-                           (edit.id.rfind("cutDirection_", 0) == 0 &&
-                            value == (edit.id == "cutDirection_0" ? 225 : 0)) ||
-                           (edit.id.rfind("inputFrameScale", 0) == 0 && value == 100) ||
-                           ((edit.id.rfind("inputFrameRotation", 0) == 0 ||
-                             edit.id.rfind("inputFrameShift", 0) == 0) &&
-                            value == 0) ||
-                           (edit.id.rfind("inputLayer", 0) == 0 && value == refhost::kNoLayer) ||
-                           (edit.id == "numberOfCuts" && value == 1);
-    if (!byDefault) params[edit.id] = value;
-  }
-  params["cutType"] = plan.radial ? "Radial" : "Local";
-  for (const FrameNudge& nudge : request.nudges) {
-    // The clip's input: where the layout puts the clip's place among the sources.
-    for (std::size_t k = 0; k < plan.inputs.size(); ++k) {
-      if (k % clips.size() != static_cast<std::size_t>(nudge.input - 1)) continue;
-      const std::string n = std::to_string(plan.inputs[k]);
-      const std::string translation = "inputFrameTranslation" + n, scale = "inputFrameScale" + n;
-      const Point at = params.contains(translation) ? Point{params[translation][0].get<double>(),
-                                                            params[translation][1].get<double>()}
-                                                    : Point{0, 0};
-      params[translation] = {at[0] + nudge.offset[0], at[1] + nudge.offset[1]};
-      const double framed = params.contains(scale) ? params[scale].get<double>() : 100;
-      params[scale] = framed * nudge.scale / 100;
-      if (nudge.rotation != 0) params["inputFrameRotation" + n] = nudge.rotation;
-    }
-  }
-  if (request.border) {
-    params["borderWidth"] = request.border->width;
-    params["borderColor"] = {request.border->colour[0], request.border->colour[1],
-                             request.border->colour[2]};
-    params["borderAlpha"] = request.border->opacity;
-  }
+  std::unique_ptr<refhost::Engine> engine = regionEngine(modulePath, frame);
+  nlohmann::ordered_json params = layoutParams(*engine, plan, sources, pictureSizes);
+  applyNudges(params, request.nudges, plan, clips.size(), engine->vocabulary());
+  if (request.border) applyBorder(params, *request.border, engine->vocabulary());
 
-  nlohmann::ordered_json source = first.source;
   split.document = {{"description", "veltrane split of " + std::to_string(clips.size()) + " clip" +
-                                        (clips.size() == 1 ? "" : "s") + ", layout " + layoutName},
-                    {"width", size[0]},
-                    {"height", size[1]},
-                    {"fps", rate},
-                    {"duration", duration},
-                    {"source", source},
+                                        (clips.size() == 1 ? "" : "s") + ", layout " + info.name},
+                    {"width", frame.size[0]},
+                    {"height", frame.size[1]},
+                    {"fps", frame.rate},
+                    {"duration", frame.duration},
+                    {"source", clips.front().source},
                     {"layers", layers},
                     {"params", params}};
   return split;

@@ -48,11 +48,12 @@ struct SplitScene {
   std::vector<std::string> notes;   // what the user should know (clips reused)
 };
 
-// Reads each clip to learn its size, rate, length and colour. Throws UsageError naming the
+// Reads each clip to learn its size, rate, length and colour, and asks the module at
+// `modulePath` where its regions lie to frame each picture. Throws UsageError naming the
 // argument and what was expected: a missing or unreadable clip, one without a picture, more
 // than 9 clips, more clips than the layout has regions, an unknown layout (listing the known
 // ones), a --frame index out of range, a gap or centre the layout does not take.
-SplitScene buildSplitScene(const SplitRequest& request);
+SplitScene buildSplitScene(const SplitRequest& request, const std::string& modulePath);
 
 // The options that shape a split, as `split` and `view` take them.
 extern const std::vector<OptionDefinition> kSplitOptions;

@@ -86,7 +86,8 @@ int runView(const std::vector<std::string>& args) {
   if (clips) {
     std::map<std::string, std::string> splitOptions = options;
     if (!frameValues.empty()) splitOptions["--frame"] = frameValues;
-    const SplitScene split = buildSplitScene(splitRequestFrom(parsed.positional, splitOptions));
+    const SplitScene split =
+        buildSplitScene(splitRequestFrom(parsed.positional, splitOptions), view.modulePath);
     for (const std::string& note : split.notes)
       std::fprintf(stderr, "veltrane view: note: %s\n", note.c_str());
     // Ctrl+S writes the split as a scene file here unless --save-as says where.

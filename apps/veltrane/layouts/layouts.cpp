@@ -12,8 +12,6 @@
 namespace veltrane_cli {
 namespace {
 
-constexpr int kCuts = 8;
-constexpr int kInputs = 9;
 constexpr double kDegreesPerRadian = 57.29577951308232;
 constexpr double kPi = 3.14159265358979323846;
 // How far slanted columns and the Z's bands lean from upright and level.
@@ -160,19 +158,43 @@ LayoutPlan planLayout(std::size_t index, double width, double height,
   return plan;
 }
 
-std::vector<RegionShape> planRegions(const LayoutPlan& plan, double width, double height) {
-  return mapRegions(plan.cuts, plan.radial, plan.centre, width, height);
+std::vector<RegionExtent> regionExtents(const refhost::RegionMap& map) {
+  std::vector<RegionExtent> regions;
+  std::vector<int> slot(128, -1);  // the entry of each input seen so far
+  for (int32_t y = 0; y < map.height; ++y) {
+    for (int32_t x = 0; x < map.width; ++x) {
+      const int8_t input = map.inputs[static_cast<std::size_t>(y) * map.width + x];
+      if (input < 0) continue;
+      // The pixel's edges in frame space: rows run from the top, y points up.
+      const double left = x - map.width / 2.0, bottom = map.height / 2.0 - y - 1;
+      if (slot[static_cast<std::size_t>(input)] < 0) {
+        slot[static_cast<std::size_t>(input)] = static_cast<int>(regions.size());
+        regions.push_back({input, 0, {0, 0}, {left, bottom}, {left + 1, bottom + 1}});
+      }
+      RegionExtent& region =
+          regions[static_cast<std::size_t>(slot[static_cast<std::size_t>(input)])];
+      region.area += 1;
+      region.centroid[0] += left + 0.5;
+      region.centroid[1] += bottom + 0.5;
+      region.low = {std::min(region.low[0], left), std::min(region.low[1], bottom)};
+      region.high = {std::max(region.high[0], left + 1), std::max(region.high[1], bottom + 1)};
+    }
+  }
+  for (RegionExtent& region : regions)
+    region.centroid = {region.centroid[0] / region.area, region.centroid[1] / region.area};
+  std::sort(regions.begin(), regions.end(),
+            [](const RegionExtent& a, const RegionExtent& b) { return a.input < b.input; });
+  return regions;
 }
 
-Framing frameOnRegion(const RegionShape& region, Point pictureSize) {
+Framing frameOnRegion(const RegionExtent& region, Point pictureSize) {
   Framing framing;
   framing.translation = region.centroid;
-  double needed = 0;  // the picture's scale as a fraction, from each corner of the region
-  for (const std::vector<Point>& piece : region.pieces) {
-    for (const Point& corner : piece) {
-      needed = std::max(needed, 2 * std::fabs(corner[0] - region.centroid[0]) / pictureSize[0]);
-      needed = std::max(needed, 2 * std::fabs(corner[1] - region.centroid[1]) / pictureSize[1]);
-    }
+  double needed = 0;  // the picture's scale as a fraction, from each side of the region
+  for (int axis = 0; axis < 2; ++axis) {
+    const double reach = std::max(region.centroid[axis] - region.low[axis],
+                                  region.high[axis] - region.centroid[axis]);
+    needed = std::max(needed, 2 * reach / pictureSize[static_cast<std::size_t>(axis)]);
   }
   framing.scale = needed * 100;
   // To a ten-thousandth of a pixel and of a percent, as a scene keeps them, so that a centre on
@@ -190,45 +212,90 @@ Point contentSize(int32_t pictureWidth, int32_t pictureHeight, bool keepsProport
   return {pictureWidth * scale, pictureHeight * scale};
 }
 
-std::vector<ParamEdit> layoutEdits(const LayoutPlan& plan, double width, double height,
+namespace {
+
+refhost::ParamValue pointValue(Point p) {
+  return refhost::ParamValue::ofPoint(static_cast<float>(p[0]), static_cast<float>(p[1]));
+}
+
+void addFraming(std::vector<ParamEdit>& edits, const refhost::EffectVocabulary& roles,
+                int32_t input, const Framing& framing) {
+  using refhost::InputParam;
+  edits.push_back({roles.id(InputParam::Translation, input), pointValue(framing.translation)});
+  edits.push_back({roles.id(InputParam::Scale, input),
+                   refhost::ParamValue::ofFloat(static_cast<float>(framing.scale))});
+  edits.push_back({roles.id(InputParam::Rotation, input),
+                   roles.declared(InputParam::Rotation, input).defaultValue});
+}
+
+}  // namespace
+
+std::vector<ParamEdit> cutEdits(const LayoutPlan& plan, const refhost::EffectVocabulary& roles) {
+  using refhost::CutParam;
+  using refhost::EffectParam;
+  using refhost::ParamValue;
+  std::vector<ParamEdit> edits{
+      {roles.id(EffectParam::NumberOfCuts),
+       ParamValue::ofInt(static_cast<int32_t>(plan.cuts.size()))},
+      {roles.id(EffectParam::CutType),
+       ParamValue::ofInt(
+           roles.choiceOf(plan.radial ? refhost::CutType::Radial : refhost::CutType::Local))},
+      {roles.id(EffectParam::GlobalPosition), pointValue(plan.centre)}};
+  for (int32_t i = 0; i < roles.cuts(); ++i) {
+    const auto cut = static_cast<std::size_t>(i);
+    const bool used = cut < plan.cuts.size();
+    edits.push_back({roles.id(CutParam::Position, i),
+                     used ? pointValue({plan.cuts[cut].x, plan.cuts[cut].y})
+                          : roles.declared(CutParam::Position, i).defaultValue});
+    edits.push_back({roles.id(CutParam::Direction, i),
+                     used ? ParamValue::ofFloat(static_cast<float>(plan.cuts[cut].degrees))
+                          : roles.declared(CutParam::Direction, i).defaultValue});
+  }
+  return edits;
+}
+
+std::vector<ParamEdit> layoutEdits(refhost::Engine& engine, const LayoutPlan& plan,
                                    const std::vector<std::string>& sources,
                                    const std::vector<Point>& pictureSizes) {
-  using refhost::ParamValue;
-  const std::vector<RegionShape> regions = planRegions(plan, width, height);
-  auto point = [](Point p) {
-    return ParamValue::ofPoint(static_cast<float>(p[0]), static_cast<float>(p[1]));
-  };
-  std::vector<ParamEdit> edits{
-      {"numberOfCuts", ParamValue::ofInt(static_cast<int32_t>(plan.cuts.size()))},
-      {"cutType", ParamValue::ofInt(plan.radial ? 1 : 0)},
-      {"cutPosition_global", point(plan.centre)}};
-  for (int i = 0; i < kCuts; ++i) {
-    const bool used = static_cast<std::size_t>(i) < plan.cuts.size();
-    const CutLine cut = used ? plan.cuts[static_cast<std::size_t>(i)] : CutLine{};
-    // An unused cut goes back to its declared default, ready for the next Shift-insert.
-    const float degrees = used ? static_cast<float>(cut.degrees) : (i == 0 ? 225.0f : 0.0f);
-    edits.push_back({"cutPosition_" + std::to_string(i), point({cut.x, cut.y})});
-    edits.push_back({"cutDirection_" + std::to_string(i), ParamValue::ofFloat(degrees)});
-  }
-  for (int j = 0; j < kInputs; ++j) {
-    std::string layer = refhost::kNoLayer;
+  using refhost::InputParam;
+  const refhost::EffectVocabulary& roles = engine.vocabulary();
+  std::vector<ParamEdit> edits = cutEdits(plan, roles);
+  std::vector<std::pair<std::string, refhost::ParamValue>> cuts;
+  for (const ParamEdit& edit : edits) cuts.emplace_back(edit.id, edit.value);
+  const std::vector<RegionExtent> regions = regionExtents(engine.mapRegions(0, cuts));
+  const Point frame{static_cast<double>(engine.frameSettings().width),
+                    static_cast<double>(engine.frameSettings().height)};
+  for (int32_t j = 0; j < roles.inputs(); ++j) {
+    refhost::ParamValue layer = roles.declared(InputParam::Layer, j).defaultValue;
     Framing framing;
+    bool shown = false;
     for (std::size_t k = 0; k < plan.inputs.size(); ++k) {
       if (plan.inputs[k] != j || sources.empty()) continue;
       const std::size_t source = k % sources.size();
-      layer = sources[source];
-      const Point size = source < pictureSizes.size() ? pictureSizes[source] : Point{width, height};
-      for (const RegionShape& region : regions)
-        if (region.input == j) framing = frameOnRegion(region, size);
+      layer = refhost::ParamValue::ofLayer(sources[source]);
+      const Point size = source < pictureSizes.size() ? pictureSizes[source] : frame;
+      for (const RegionExtent& region : regions)
+        if (region.input == j) framing = frameOnRegion(region, size), shown = true;
     }
-    const std::string n = std::to_string(j);
-    edits.push_back({"inputLayer" + n, ParamValue::ofLayer(layer)});
-    edits.push_back({"inputFrameShift" + n, ParamValue::ofInt(0)});
-    edits.push_back({"inputFrameTranslation" + n, point(framing.translation)});
+    edits.push_back({roles.id(InputParam::Layer, j), layer});
     edits.push_back(
-        {"inputFrameScale" + n, ParamValue::ofFloat(static_cast<float>(framing.scale))});
-    edits.push_back({"inputFrameRotation" + n, ParamValue::ofFloat(0)});
+        {roles.id(InputParam::Shift, j), roles.declared(InputParam::Shift, j).defaultValue});
+    if (shown) {
+      addFraming(edits, roles, j, framing);
+    } else {
+      for (InputParam role : {InputParam::Translation, InputParam::Scale, InputParam::Rotation})
+        edits.push_back({roles.id(role, j), roles.declared(role, j).defaultValue});
+    }
   }
+  return edits;
+}
+
+std::vector<ParamEdit> framingEdits(refhost::Engine& engine, int32_t frame,
+                                    const std::function<Point(int32_t input)>& pictureSize) {
+  std::vector<ParamEdit> edits;
+  for (const RegionExtent& region : regionExtents(engine.mapRegions(frame)))
+    addFraming(edits, engine.vocabulary(), region.input,
+               frameOnRegion(region, pictureSize(region.input)));
   return edits;
 }
 

@@ -6,15 +6,25 @@
 
 #include <array>
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <stdexcept>
 #include <string>
 #include <vector>
 
-#include "layouts/region_map.h"
-#include "refhost/core/params.h"
+#include "refhost/engine.h"
 
 namespace veltrane_cli {
+
+using Point = std::array<double, 2>;
+
+// A cut as the parameters hold it: a frame-space position (origin at the centre, y up) and a
+// direction in degrees from +y towards +x.
+struct CutLine {
+  double x = 0;
+  double y = 0;
+  double degrees = 0;
+};
 
 struct LayoutInfo {
   const char* name;      // as `--layout` and the example scenes name it: "diagonal-2"
@@ -57,16 +67,27 @@ struct ParamEdit {
   refhost::ParamValue value;
 };
 
-// Where each input's picture goes: its centre on the centroid of its region, scaled without
+// One input's region as the module shows it (frame space, origin at the centre, y up): the
+// centre of mass of its pixels and the rectangle their edges span.
+struct RegionExtent {
+  int32_t input = 0;
+  double area = 0;  // square pixels
+  Point centroid{0, 0};
+  Point low{0, 0};
+  Point high{0, 0};
+};
+// Every input the map shows, in input order.
+std::vector<RegionExtent> regionExtents(const refhost::RegionMap& map);
+
+// Where an input's picture goes: its centre on the centroid of its region, scaled without
 // stretching to the smallest size that covers the whole region. `pictureSize` is the size of
 // the picture's content at scale 100 in frame pixels (the frame's size for a picture that fills
-// it; less along one side for a picture kept at its own proportions). Inputs whose region is
-// empty keep the frame placement.
+// it; less along one side for a picture kept at its own proportions).
 struct Framing {
   Point translation{0, 0};  // frame pixels
   double scale = 100;       // percent
 };
-Framing frameOnRegion(const RegionShape& region, Point pictureSize);
+Framing frameOnRegion(const RegionExtent& region, Point pictureSize);
 
 // The size of a picture's content at scale 100 in a frame of `width` x `height`: the frame's
 // own for a picture that is stretched to it (or has no size of its own, 0 x 0), else the
@@ -74,15 +95,22 @@ Framing frameOnRegion(const RegionShape& region, Point pictureSize);
 Point contentSize(int32_t pictureWidth, int32_t pictureHeight, bool keepsProportions, double width,
                   double height);
 
-// Every cut and input parameter of the plan (unused cuts and inputs back to their defaults).
-// The inputs the plan shows take `sources` in turn (a layer GUID each, the null GUID for the
-// effect's own input), cycling when there are fewer. Each shown input is framed on its region
-// for its picture's content size (`pictureSizes`, one per source; missing ones fill the frame).
-std::vector<ParamEdit> layoutEdits(const LayoutPlan& plan, double width, double height,
+// The plan's cut parameters: count, type, centre and every cut (the ones it does not use back
+// to their declared defaults, ready for the next Shift-insert).
+std::vector<ParamEdit> cutEdits(const LayoutPlan& plan, const refhost::EffectVocabulary& roles);
+
+// Every cut and input parameter of the plan. The inputs the plan shows take `sources` in turn
+// (a layer GUID each, the null GUID for the effect's own input), cycling when there are fewer,
+// each framed on its region as the engine's module divides the frame, for its picture's
+// content size (`pictureSizes`, one per source; missing ones fill the frame). Inputs the plan
+// does not show go back to their defaults.
+std::vector<ParamEdit> layoutEdits(refhost::Engine& engine, const LayoutPlan& plan,
                                    const std::vector<std::string>& sources,
                                    const std::vector<Point>& pictureSizes = {});
 
-// The regions of a plan as the effect divides the frame.
-std::vector<RegionShape> planRegions(const LayoutPlan& plan, double width, double height);
+// The translation, scale and rotation of every input shown at `frame` with the cuts as they
+// are, each picture framed on its region; `pictureSize` gives an input's content size.
+std::vector<ParamEdit> framingEdits(refhost::Engine& engine, int32_t frame,
+                                    const std::function<Point(int32_t input)>& pictureSize);
 
 }  // namespace veltrane_cli

@@ -164,36 +164,17 @@ void ViewerSession::applyPreset(std::size_t index) {
   const veltrane_cli::LayoutPlan plan =
       veltrane_cli::planLayout(index, composition.width, composition.height);
   applyEdits(std::string("Preset ") + veltrane_cli::layouts().at(index).menuName,
-             veltrane_cli::layoutEdits(plan, composition.width, composition.height, sources,
-                                       pictureSizes));
+             veltrane_cli::layoutEdits(*engine_, plan, sources, pictureSizes));
 }
 
 void ViewerSession::fitPicturesToRegions() {
-  const refhost::Composition& composition = scene_.composition;
-  veltrane_cli::LayoutPlan plan;
-  plan.radial = engine_->valueAt("cutType", frame_).integer == 1;
-  const refhost::ParamValue centre = engine_->valueAt("cutPosition_global", frame_);
-  plan.centre = {centre.number[0], centre.number[1]};
-  const int32_t cuts = std::clamp(engine_->valueAt("numberOfCuts", frame_).integer, 0, 8);
-  for (int32_t i = 0; i < cuts; ++i) {
-    const refhost::ParamValue at = engine_->valueAt("cutPosition_" + std::to_string(i), frame_);
-    const float degrees = engine_->valueAt("cutDirection_" + std::to_string(i), frame_).number[0];
-    plan.cuts.push_back({at.number[0], at.number[1], degrees});
-  }
-  std::vector<veltrane_cli::ParamEdit> edits;
-  for (const veltrane_cli::RegionShape& region :
-       veltrane_cli::planRegions(plan, composition.width, composition.height)) {
-    const std::string n = std::to_string(region.input);
-    const veltrane_cli::Framing framing = veltrane_cli::frameOnRegion(
-        region, pictureSizeOf(std::string(engine_->valueAt("inputLayer" + n, frame_).layer)));
-    edits.push_back({"inputFrameTranslation" + n,
-                     refhost::ParamValue::ofPoint(static_cast<float>(framing.translation[0]),
-                                                  static_cast<float>(framing.translation[1]))});
-    edits.push_back(
-        {"inputFrameScale" + n, refhost::ParamValue::ofFloat(static_cast<float>(framing.scale))});
-    edits.push_back({"inputFrameRotation" + n, refhost::ParamValue::ofFloat(0)});
-  }
-  applyEdits("Fit pictures to regions", edits);
+  const refhost::EffectVocabulary& roles = engine_->vocabulary();
+  applyEdits("Fit pictures to regions",
+             veltrane_cli::framingEdits(*engine_, frame_, [&](int32_t input) {
+               const refhost::ParamValue layer =
+                   engine_->valueAt(roles.id(refhost::InputParam::Layer, input), frame_);
+               return pictureSizeOf(std::string(layer.layer));
+             }));
 }
 
 bool ViewerSession::undo() {

@@ -75,7 +75,8 @@ TEST(DocumentedExamples, EveryLayoutsPresetSceneIsWhatSplitMakes) {
     request.size = std::array<int32_t, 2>{640, 360};
     request.fps = 25;
     request.border = veltrane_cli::BorderSetting{4, {1, 1, 1}, 1};
-    const json fresh = json::parse(veltrane_cli::buildSplitScene(request).document.dump());
+    const json fresh =
+        json::parse(veltrane_cli::buildSplitScene(request, VELTRANE_MODULE_PATH).document.dump());
     EXPECT_EQ(saved, fresh) << "run scripts/examples to make the presets anew";
   }
   std::sort(presets.begin(), presets.end());

@@ -48,7 +48,7 @@ class ViewerSessionFraming : public ::testing::Test {
     veltrane_cli::SplitRequest request;
     request.clips = {wide_, tall_, wide_};
     request.layout = layout;
-    return veltrane_cli::buildSplitScene(request);
+    return veltrane_cli::buildSplitScene(request, VELTRANE_MODULE_PATH);
   }
 
   testsupport::ScratchDirectory folder_;
