@@ -140,7 +140,8 @@ int run(const std::vector<std::string>& args) {
     engineOptions.profile = glProfile(options);
     std::unique_ptr<refhost::Engine> engine = startScene(scene, std::move(engineOptions));
     for (int cuts : cutCounts) {
-      applySceneParams(*engine, benchParams(size, cuts, false), scene.file, scene.layerGuids());
+      applySceneParams(*engine, benchParams(engine->vocabulary(), size, cuts, false), scene.file,
+                       scene.layerGuids());
       Row row;
       row.size = size;
       row.cuts = cuts;

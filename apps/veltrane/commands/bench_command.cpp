@@ -113,8 +113,8 @@ int runBench(const std::vector<std::string>& args) {
     version = engine->gl().versionString();
     for (int cuts : cutCounts) {
       for (const std::string& inputs : inputKinds) {
-        applySceneParams(*engine, benchParams(size, cuts, inputs == "layers"), scene.file,
-                         scene.layerGuids());
+        applySceneParams(*engine, benchParams(engine->vocabulary(), size, cuts, inputs == "layers"),
+                         scene.file, scene.layerGuids());
         for (int i = 0; i < warmup; ++i) timeFrame(*engine);
         std::vector<FrameTiming> runs;
         for (int i = 0; i < repeat; ++i) runs.push_back(timeFrame(*engine));

@@ -14,7 +14,8 @@
 namespace veltrane_cli {
 namespace {
 
-constexpr int kInputs = 9;
+// One layer for each input the effect can have.
+constexpr int kLayers = 9;
 
 std::string layerGuid(int input) {
   char text[40];
@@ -35,7 +36,7 @@ Scene benchScene(BenchSize size) {
   composition.width = size.width;
   composition.height = size.height;
   composition.source = refhost::MediaSpec::ofPattern(refhost::Pattern::Bars);
-  for (int input = 0; input < kInputs; ++input) {
+  for (int input = 0; input < kLayers; ++input) {
     refhost::CompositionLayer entry;
     entry.layer.guid = layerGuid(input);
     entry.layer.name = "Input " + std::to_string(input);
@@ -56,16 +57,22 @@ std::array<float, 2> benchCutPosition(BenchSize size, int i) {
 
 float benchCutDirection(int i) { return static_cast<float>(10 + 37 * i); }
 
-nlohmann::ordered_json benchParams(BenchSize size, int cuts, bool layers) {
+nlohmann::ordered_json benchParams(const refhost::EffectVocabulary& roles, BenchSize size, int cuts,
+                                   bool layers) {
+  using refhost::CutParam;
+  using refhost::EffectParam;
   nlohmann::ordered_json params = {
-      {"numberOfCuts", cuts}, {"cutType", "Local"}, {"borderWidth", kBenchBorderWidth}};
-  for (int i = 0; i < 8; ++i) {
+      {roles.id(EffectParam::NumberOfCuts), cuts},
+      {roles.id(EffectParam::CutType), roles.choiceOf(refhost::CutType::Local)},
+      {roles.id(EffectParam::BorderWidth), kBenchBorderWidth}};
+  for (int i = 0; i < roles.cuts(); ++i) {
     std::array<float, 2> position = benchCutPosition(size, i);
-    params["cutPosition_" + std::to_string(i)] = {position[0], position[1]};
-    params["cutDirection_" + std::to_string(i)] = benchCutDirection(i);
+    params[roles.id(CutParam::Position, i)] = {position[0], position[1]};
+    params[roles.id(CutParam::Direction, i)] = benchCutDirection(i);
   }
-  for (int input = 0; input < kInputs; ++input)
-    params["inputLayer" + std::to_string(input)] = layers ? layerGuid(input) : refhost::kNoLayer;
+  for (int input = 0; input < roles.inputs(); ++input)
+    params[roles.id(refhost::InputParam::Layer, input)] =
+        layers ? layerGuid(input) : refhost::kNoLayer;
   return params;
 }
 

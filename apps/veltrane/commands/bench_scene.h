@@ -27,7 +27,8 @@ float benchCutDirection(int i);
 constexpr float kBenchBorderWidth = 4;
 
 // The first `cuts` cuts with a border; every input the own source, or each a layer of its own.
-nlohmann::ordered_json benchParams(BenchSize size, int cuts, bool layers);
+nlohmann::ordered_json benchParams(const refhost::EffectVocabulary& roles, BenchSize size, int cuts,
+                                   bool layers);
 
 // Seconds of one frame's stages.
 struct FrameTiming {

@@ -29,17 +29,20 @@ std::vector<ParamSetting> checkedSettings(const refhost::Engine& engine,
 
 // A Radial layout shows inputs 1 to 8 only: a scene that sets input 0 in one has made a mistake
 // the render would hide, so it is named once on stderr.
-void noteUnusedInputZero(const std::vector<ParamSetting>& settings, const std::string& file) {
+void noteUnusedInputZero(const refhost::EffectVocabulary& roles,
+                         const std::vector<ParamSetting>& settings, const std::string& file) {
   bool radial = false;
   std::string inputZero;
   for (const ParamSetting& setting : settings) {
-    if (setting.id == "cutType") {
-      radial = setting.value.integer == 1;
-      for (const auto& key : setting.keys) radial = radial || key.second.integer == 1;
+    if (setting.id == roles.id(refhost::EffectParam::CutType)) {
+      auto isRadial = [&](const refhost::ParamValue& value) {
+        return roles.cutTypeOf(value.integer) == refhost::CutType::Radial;
+      };
+      radial = isRadial(setting.value);
+      for (const auto& key : setting.keys) radial = radial || isRadial(key.second);
     }
-    const std::size_t digit = setting.id.size() - 1;
-    if (setting.id.rfind("input", 0) == 0 && setting.id[digit] == '0' && inputZero.empty())
-      inputZero = setting.id;
+    const auto input = roles.inputOf(setting.id);
+    if (input && input->second == 0 && inputZero.empty()) inputZero = setting.id;
   }
   if (radial && !inputZero.empty())
     std::fprintf(stderr,
@@ -70,7 +73,7 @@ std::unique_ptr<refhost::Engine> startScene(const Scene& scene, SceneEngineOptio
   // scene stops before any GL work.
   std::vector<ParamSetting> settings =
       checkedSettings(*engine, scene.params, scene.file, scene.layerGuids());
-  noteUnusedInputZero(settings, scene.file);
+  noteUnusedInputZero(engine->vocabulary(), settings, scene.file);
   engine->createInstance();
   applyParamSettings(*engine, settings);
   return engine;
