@@ -17,7 +17,7 @@ extern "C" {
 #include <stdexcept>
 #include <vector>
 
-#include "refhost/media/av_error.h"
+#include "refhost/media/ffmpeg_utilities.h"
 
 namespace refhost {
 namespace {

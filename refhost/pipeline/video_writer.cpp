@@ -17,14 +17,10 @@ extern "C" {
 #include <cstring>
 #include <stdexcept>
 
+#include "refhost/media/ffmpeg_utilities.h"
+
 namespace refhost {
 namespace {
-
-std::string errorText(int code) {
-  char buffer[AV_ERROR_MAX_STRING_SIZE] = {};
-  av_strerror(code, buffer, sizeof buffer);
-  return buffer;
-}
 
 // FFmpeg's muxers are named as the containers' file extensions, but for Matroska's.
 const char* muxerName(VideoContainer container) {
@@ -45,10 +41,13 @@ const std::vector<uint16_t>& sixteenBitsOfHalf() {
   return table;
 }
 
-// The matrices swscale converts with, numbered as H.273 numbers them.
+// The matrices swscale converts with.
 bool swscaleHasMatrix(int32_t matrix) {
-  return matrix == 1 || matrix == 4 || matrix == 5 || matrix == 6 || matrix == 7 || matrix == 9 ||
-         matrix == 10;
+  using C = ColourDescription;
+  for (int32_t known : {C::kMatrixBt709, C::kMatrixFcc, C::kMatrixBt470bg, C::kMatrixSmpte170m,
+                        C::kMatrixSmpte240m, C::kMatrixBt2020, C::kMatrixBt2020Constant})
+    if (matrix == known) return true;
+  return false;
 }
 
 }  // namespace
@@ -98,7 +97,7 @@ struct VideoWriter::Encoder {
 
   [[noreturn]] void fail(const std::string& what, int code = 0) const {
     throw std::runtime_error(shownName + ": cannot write video: " + what +
-                             (code ? " (" + errorText(code) + ")" : ""));
+                             (code ? " (" + avErrorText(code) + ")" : ""));
   }
 
   void addNote(const std::string& text) { note += (note.empty() ? "" : "; ") + text; }
@@ -293,8 +292,6 @@ VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int3
   encoder_->path = path;
   encoder_->shownName = shownName.empty() ? path : shownName;
   encoder_->settings = encoding;
-  // The libraries' progress chatter would bury the command line's own output.
-  av_log_set_level(AV_LOG_ERROR);
   encoder_->width = width;
   encoder_->height = height;
   if (width <= 0 || height <= 0) encoder_->fail("a video needs a frame of at least 1x1");
