@@ -24,6 +24,9 @@ namespace {
 // Pictures above this many bytes are large: their scratch copy is given back after each frame,
 // and they are converted in one of the slots below.
 constexpr std::size_t kStoredKeptUpTo = std::size_t{16} << 20;
+// The scaler's vector code writes whole registers, up to this many bytes past the end of a row
+// whose width is no multiple of theirs; the buffers it writes end with that much room.
+constexpr std::size_t kScalerOverrun = 256;
 
 // Half floats of v / white for every 16-bit value v.
 std::vector<uint16_t> halvesBelow(uint16_t white) {
@@ -148,8 +151,9 @@ std::vector<uint8_t> FrameConverter::glRows(const AVFrame* frame, int32_t width,
   if (large) largeConversions().take();
   std::vector<uint8_t> rows;
   try {
+    rows.resize(bytes + kScalerOverrun);
+    if (bytes > 0) convert(frame, width, height, format, rows.data());
     rows.resize(bytes);
-    if (!rows.empty()) convert(frame, width, height, format, rows.data());
   } catch (...) {
     if (large) largeConversions().giveBack();
     throw;
@@ -194,7 +198,7 @@ void FrameConverter::convert(const AVFrame* frame, int32_t width, int32_t height
       sws_scale(scaler, frame->data, frame->linesize, 0, frame->height, planes, strides);
       return;
     }
-    stored_.resize(4 * pixels);
+    stored_.resize(4 * pixels + kScalerOverrun);
     uint8_t* planes[4] = {stored_.data()};
     int strides[4] = {4 * storedWidth};
     sws_scale(scaler, frame->data, frame->linesize, 0, frame->height, planes, strides);
@@ -211,9 +215,11 @@ void FrameConverter::convert(const AVFrame* frame, int32_t width, int32_t height
   const bool alpha = decodedPixels && (decodedPixels->flags & AV_PIX_FMT_FLAG_ALPHA);
   SwsContext* scaler = scalerFor(sixteenBits_, frame, storedWidth, storedHeight,
                                  alpha ? AV_PIX_FMT_GBRAP16LE : AV_PIX_FMT_GBRP16LE);
-  stored_.resize(2 * pixels * (alpha ? 4 : 3));
-  uint8_t* planes[4] = {stored_.data(), stored_.data() + 2 * pixels, stored_.data() + 4 * pixels,
-                        alpha ? stored_.data() + 6 * pixels : nullptr};
+  // Each plane followed by room for the scaler's overrun, which would land in the next.
+  const std::size_t plane = 2 * pixels + kScalerOverrun;
+  stored_.resize(plane * (alpha ? 4 : 3));
+  uint8_t* planes[4] = {stored_.data(), stored_.data() + plane, stored_.data() + 2 * plane,
+                        alpha ? stored_.data() + 3 * plane : nullptr};
   const int stride = 2 * storedWidth;
   int strides[4] = {stride, stride, stride, alpha ? stride : 0};
   sws_scale(scaler, frame->data, frame->linesize, 0, frame->height, planes, strides);
