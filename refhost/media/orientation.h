@@ -28,6 +28,13 @@ struct Orientation {
 // is no right angle.
 Orientation orientationOf(const AVStream* video);
 
+// The orientation of a photo's EXIF orientation tag, 1 (as stored) to 8; upright for any
+// other value.
+Orientation orientationOfExif(int tag);
+
+// The picture turned as the orientation says, top row first.
+RgbaImage upright(const RgbaImage& stored, const Orientation& orientation);
+
 // The size a picture stored at storedWidth x storedHeight is shown at: turned, then its width
 // scaled by the sample aspect ratio (sarNumerator / sarDenominator, ignored unless both are
 // positive) at its height, as players size their window.

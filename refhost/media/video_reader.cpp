@@ -1,5 +1,6 @@
 // FFmpeg demuxing, decoding and seeking for VideoReader: frames chosen by their presentation
-// time and handed to the conversion at the stream's colour, depth and display size.
+// time, damaged ones counted and concealed, and handed to the conversion at the stream's
+// colour, depth and display size.
 #include "refhost/media/video_reader.h"
 
 extern "C" {
@@ -25,25 +26,37 @@ namespace {
 
 // Asking for a frame at most this far ahead of the last one decodes on instead of seeking.
 constexpr int32_t kDecodeAheadLimit = 48;
-// Times asked this little before a frame's presentation count as that frame: a composition's
-// n / rate lands a rounding error short of the same instant in the stream's time base.
-constexpr double kTimeSlack = 1e-6;
+
+// What the decoder says of a picture it could not decode whole.
+std::string damageOf(int flags) {
+  std::string found;
+  auto add = [&](const char* what) { found += (found.empty() ? "" : ", ") + std::string(what); };
+  if (flags & FF_DECODE_ERROR_INVALID_BITSTREAM) add("invalid data");
+  if (flags & FF_DECODE_ERROR_MISSING_REFERENCE) add("a missing reference frame");
+  if (flags & FF_DECODE_ERROR_DECODE_SLICES) add("slices that did not decode");
+  if (flags & FF_DECODE_ERROR_CONCEALMENT_ACTIVE) add("errors the decoder concealed");
+  return found.empty() ? "damaged data" : found;
+}
 
 }  // namespace
 
 struct VideoReader::Decoder {
   std::string path;
+  std::shared_ptr<DamagedFrames> damage;
   AVFormatContext* format = nullptr;
   AVCodecContext* codec = nullptr;
   AVPacket* packet = nullptr;
   AVFrame* decoded = nullptr;  // scratch for avcodec_receive_frame
-  AVFrame* current = nullptr;  // the last frame decoded
+  AVFrame* current = nullptr;  // the frame shown
+  AVFrame* next = nullptr;     // a frame decoded past the one asked for, held back for later
   int stream = -1;
   AVRational timeBase{1, 25};
   // Every frame's presentation time in the stream's time base, in presentation order.
   std::vector<int64_t> times;
   int32_t currentIndex = -1;    // index of `current`; -1 when none since the last seek
+  int32_t nextIndex = -1;       // index of `next`; -1 when it holds none
   int32_t firstSinceSeek = -1;  // index of the first frame decoded since the last seek
+  int32_t lastDecoded = -1;     // the latest frame decoded since the last seek
   Orientation orientation;
   std::unique_ptr<FrameConverter> converter;  // made once the stream's colour is known
   MediaInfo info;
@@ -51,6 +64,7 @@ struct VideoReader::Decoder {
   bool ended = false;     // the decoder gave everything it had
 
   ~Decoder() {
+    av_frame_free(&next);
     av_frame_free(&current);
     av_frame_free(&decoded);
     av_packet_free(&packet);
@@ -58,12 +72,22 @@ struct VideoReader::Decoder {
     avformat_close_input(&format);
   }
 
-  [[noreturn]] void fail(const std::string& what, int code = 0) const {
+  // The library's own words for what went wrong, after the code's text when there is one.
+  static std::string reasonFor(int code) {
     std::string reason = code ? avErrorText(code) : "";
     const std::string detail = lastLibraryError();
     if (!detail.empty()) reason += (reason.empty() ? "" : ": ") + detail;
+    return reason;
+  }
+
+  [[noreturn]] void fail(const std::string& what, int code = 0) const {
+    const std::string reason = reasonFor(code);
     throw std::runtime_error(path + ": cannot decode video: " + what +
                              (reason.empty() ? "" : " (" + reason + ")"));
+  }
+
+  void damaged(int32_t frame, const std::string& reason) const {
+    if (damage) damage->record(frame, reason);
   }
 
   void open() {
@@ -82,28 +106,30 @@ struct VideoReader::Decoder {
     if (!refusal.empty()) throw std::runtime_error(path + ": " + refusal);
 
     // Threads as the machine has cores, so that decoding keeps up with the render instead of
-    // running on the caller's thread alone. Each frame thread holds pictures of its own besides
-    // the reference pictures, so frame threads (at most four) are for pictures up to about
-    // 1080p 4:2:2 at 10 bits; larger ones, nine of which may be open for one render, decode with
-    // slice threads (wavefronts in HEVC), which hold no extra pictures.
+    // running on the caller's thread alone: slice threads (wavefronts in HEVC), which hold no
+    // extra pictures. Frame threads would hand each picture out before its decoder knew whether
+    // it had to conceal damage in it (the picture's error flags never reach the caller), and
+    // damaged frames are counted by those flags.
     const int decodedBytes =
         av_image_get_buffer_size(codec->pix_fmt, codec->width, codec->height, 1);
-    constexpr int kFrameThreadsUpTo = 8 << 20;
-    if (decodedBytes > 0 && decodedBytes <= kFrameThreadsUpTo) {
-      codec->thread_count = static_cast<int>(std::min(std::thread::hardware_concurrency() + 1, 5u));
-      codec->thread_type = FF_THREAD_FRAME | FF_THREAD_SLICE;
-    } else {
-      codec->thread_count = 0;
-      codec->thread_type = FF_THREAD_SLICE;
-    }
+    constexpr int kSmallPictureUpTo = 8 << 20;
+    codec->thread_count =
+        decodedBytes > 0 && decodedBytes <= kSmallPictureUpTo
+            ? static_cast<int>(std::min(std::thread::hardware_concurrency() + 1, 5u))
+            : 0;
+    codec->thread_type = FF_THREAD_SLICE;
     if ((result = avcodec_open2(codec, decoderCodec, nullptr)) < 0) fail("decoder refused", result);
     packet = av_packet_alloc();
     decoded = av_frame_alloc();
     current = av_frame_alloc();
-    if (!packet || !decoded || !current) fail("out of memory");
+    next = av_frame_alloc();
+    if (!packet || !decoded || !current || !next) fail("out of memory");
     timeBase = video->time_base;
     if (timeBase.num <= 0 || timeBase.den <= 0) fail("the stream has no time base");
+    info.video = true;
     info.hasAudio = av_find_best_stream(format, AVMEDIA_TYPE_AUDIO, -1, -1, nullptr, 0) >= 0;
+    const AVRational nominal = av_guess_frame_rate(format, video, nullptr);
+    info.frameRate = snappedToCommonRate({nominal.num, nominal.den});
     // Only the picture is read from here on; the demuxer skips the rest of the file's streams.
     for (unsigned i = 0; i < format->nb_streams; ++i)
       if (static_cast<int>(i) != stream) format->streams[i]->discard = AVDISCARD_ALL;
@@ -142,6 +168,9 @@ struct VideoReader::Decoder {
     }
     info.duration =
         static_cast<double>(times.back() + last - times.front()) * timeBase.num / timeBase.den;
+    if (!info.frameRate.valid() && info.duration > 0)
+      info.frameRate = snappedToCommonRate(
+          {std::llround(static_cast<double>(times.size()) * 1000 / info.duration), 1000});
   }
 
   // The display size: upright, and at square pixels as players size their window.
@@ -152,20 +181,16 @@ struct VideoReader::Decoder {
         displaySize(codec->width, codec->height, orientation, sar.num, sar.den);
     info.width = size[0];
     info.height = size[1];
-    if (video->avg_frame_rate.num > 0 && video->avg_frame_rate.den > 0)
-      info.frameRate = av_q2d(video->avg_frame_rate);
-    else if (info.duration > 0)
-      info.frameRate = static_cast<double>(times.size()) / info.duration;
-    else if (video->r_frame_rate.num > 0 && video->r_frame_rate.den > 0)
-      info.frameRate = av_q2d(video->r_frame_rate);
   }
 
-  // The frame shown at `seconds` from the first frame's presentation.
-  int32_t frameShownAt(double seconds) const {
-    if (!(seconds > 0)) return 0;
-    const double ticks = std::floor((seconds + kTimeSlack) * timeBase.den / timeBase.num);
-    if (ticks >= static_cast<double>(times.back() - times.front())) return lastFrame();
-    const int64_t time = times.front() + static_cast<int64_t>(ticks);
+  // The frame shown at composition frame `frame` of a composition at `rate`, counted exactly in
+  // the stream's time base from its first frame.
+  int32_t frameShownAt(int64_t frame, FrameRate rate) const {
+    if (frame <= 0 || !rate.valid()) return 0;
+    const int64_t ticks = av_rescale_rnd(frame * rate.denominator, timeBase.den,
+                                         rate.numerator * timeBase.num, AV_ROUND_DOWN);
+    if (ticks >= times.back() - times.front()) return lastFrame();
+    const int64_t time = times.front() + ticks;
     return std::max<int32_t>(
         static_cast<int32_t>(std::upper_bound(times.begin(), times.end(), time) - times.begin()) -
             1,
@@ -174,29 +199,38 @@ struct VideoReader::Decoder {
 
   int32_t lastFrame() const { return static_cast<int32_t>(times.size()) - 1; }
 
-  // The frame's index, or -1 for a picture presented before the first frame (the lead-in an
-  // edit list cuts, should the decoder hand it out).
-  int32_t indexOf(const AVFrame* frame) const {
-    int64_t timestamp = frame->best_effort_timestamp;
-    if (timestamp == AV_NOPTS_VALUE) timestamp = frame->pts;
-    if (timestamp == AV_NOPTS_VALUE) return currentIndex + 1;
+  // The index of the frame presented at the time, or -1 for a picture presented before the
+  // first frame (the lead-in an edit list cuts, should the decoder hand it out).
+  int32_t indexAt(int64_t timestamp) const {
     const auto after = std::upper_bound(times.begin(), times.end(), timestamp);
     return static_cast<int32_t>(after - times.begin()) - 1;
   }
 
-  void seek(int32_t from, int32_t index) {
-    int result = av_seek_frame(format, stream, times[from], AVSEEK_FLAG_BACKWARD);
+  int32_t indexOf(const AVFrame* frame) const {
+    int64_t timestamp = frame->best_effort_timestamp;
+    if (timestamp == AV_NOPTS_VALUE) timestamp = frame->pts;
+    if (timestamp == AV_NOPTS_VALUE) return lastDecoded + 1;
+    return indexAt(timestamp);
+  }
+
+  // Seeks to frame `from`, or with `fileStart` to the first byte of the file.
+  void seek(int32_t from, int32_t index, bool fileStart = false) {
+    const int result = fileStart ? av_seek_frame(format, stream, 0, AVSEEK_FLAG_BYTE)
+                                 : av_seek_frame(format, stream, times[from], AVSEEK_FLAG_BACKWARD);
     if (result < 0) fail("frame " + std::to_string(index) + ": the seek failed", result);
     avcodec_flush_buffers(codec);
+    av_frame_unref(next);
     currentIndex = -1;
+    nextIndex = -1;
     firstSinceSeek = -1;
+    lastDecoded = -1;
     draining = false;
     ended = false;
   }
 
-  // Feeds the decoder one packet of the stream, or tells it the stream has ended. `index` is
-  // the frame being decoded towards, for messages.
-  void feed(int32_t index) {
+  // Feeds the decoder one packet of the stream, or tells it the stream has ended. A packet the
+  // decoder refuses is a damaged frame: the decoder goes on with the next.
+  void feed() {
     while (!draining) {
       int result = av_read_frame(format, packet);
       if (result < 0) {
@@ -204,39 +238,64 @@ struct VideoReader::Decoder {
         avcodec_send_packet(codec, nullptr);
         return;
       }
-      bool ours = packet->stream_index == stream;
-      if (ours) result = avcodec_send_packet(codec, packet);
-      av_packet_unref(packet);
+      const bool ours = packet->stream_index == stream;
       if (ours) {
+        const int64_t time = packet->pts != AV_NOPTS_VALUE ? packet->pts : packet->dts;
+        if (packet->flags & AV_PKT_FLAG_CORRUPT)
+          damaged(indexAt(time), "the file says its data is corrupt");
+        result = avcodec_send_packet(codec, packet);
+        if (result == AVERROR(ENOMEM)) fail("out of memory", result);
         if (result < 0 && result != AVERROR(EAGAIN))
-          fail("frame " + std::to_string(index) + ": its data is damaged or cut short", result);
-        return;
+          damaged(std::max(indexAt(time), 0), reasonFor(result));
       }
+      av_packet_unref(packet);
+      if (ours) return;
     }
   }
 
-  // Decodes on until the frame at `index` (or the first after it) is current; at the end of
-  // the stream the last frame stays current.
+  // Takes in a frame the decoder gave, towards frame `index`: counts it when the decoder found
+  // it damaged, and makes it current unless it lies past the frame asked for while an earlier
+  // one is at hand (a frame between them did not decode): then it waits in `next`.
+  void accept(int32_t index) {
+    const int32_t decodedIndex = indexOf(decoded);
+    if (decodedIndex < 0) {
+      av_frame_unref(decoded);
+      return;
+    }
+    if (decoded->decode_error_flags || (decoded->flags & AV_FRAME_FLAG_CORRUPT))
+      damaged(decodedIndex, damageOf(decoded->decode_error_flags));
+    lastDecoded = std::max(lastDecoded, decodedIndex);
+    AVFrame* into = currentIndex >= 0 && decodedIndex > index ? next : current;
+    av_frame_unref(into);
+    av_frame_move_ref(into, decoded);
+    (into == next ? nextIndex : currentIndex) = decodedIndex;
+    if (firstSinceSeek < 0) firstSinceSeek = decodedIndex;
+  }
+
+  // Decodes on until the frame at `index` is current, or the latest before it when the frame
+  // at `index` never comes; at the end of the stream the last frame stays current.
   void decodeOnTo(int32_t index) {
-    while (!ended) {
-      int result = avcodec_receive_frame(codec, decoded);
-      if (result == 0) {
-        const int32_t decodedIndex = indexOf(decoded);
-        if (decodedIndex < 0) {
-          av_frame_unref(decoded);
-          continue;
-        }
+    for (;;) {
+      if (nextIndex >= 0) {
+        if (nextIndex > index) return;
         av_frame_unref(current);
-        av_frame_move_ref(current, decoded);
-        currentIndex = decodedIndex;
-        if (firstSinceSeek < 0) firstSinceSeek = currentIndex;
-        if (currentIndex >= index) return;
+        av_frame_move_ref(current, next);
+        currentIndex = nextIndex;
+        nextIndex = -1;
+      }
+      if (currentIndex >= index || ended) return;
+      const int result = avcodec_receive_frame(codec, decoded);
+      if (result == 0) {
+        accept(index);
       } else if (result == AVERROR(EAGAIN)) {
-        feed(index);
+        feed();
       } else if (result == AVERROR_EOF) {
         ended = true;
+      } else if (result == AVERROR(ENOMEM)) {
+        fail("out of memory", result);
       } else {
-        fail("frame " + std::to_string(index) + ": decoding failed", result);
+        damaged(lastDecoded + 1, reasonFor(result));
+        feed();
       }
     }
   }
@@ -245,24 +304,34 @@ struct VideoReader::Decoder {
     index = std::clamp(index, 0, lastFrame());
     if (index == currentIndex) return;
     if (currentIndex >= 0 && index > currentIndex && index - currentIndex <= kDecodeAheadLimit &&
-        !ended) {
+        (!ended || nextIndex >= 0)) {
       decodeOnTo(index);
     } else {
       // A seek lands on a key frame at or before the time as the demuxer counts it, which with
-      // reordered frames can still be after the frame asked: then it starts further back.
+      // reordered frames can still be after the frame asked, or past the key frame the frames
+      // after it need (nothing decodes): then it starts further back.
+      auto landed = [&] { return firstSinceSeek >= 0 && firstSinceSeek <= index; };
       for (int64_t back = 0;; back = back ? back * 4 : 16) {
         const auto from = static_cast<int32_t>(std::max<int64_t>(index - back, 0));
         seek(from, index);
         decodeOnTo(index);
-        if (firstSinceSeek <= index || from == 0) break;
+        if (landed() || from == 0) break;
+      }
+      // Demuxers that search by decoding time (MPEG-TS) land past the first key frame when
+      // asked for its presentation time: the file's start is the way back to it.
+      if (!landed() && !(format->iformat->flags & AVFMT_NO_BYTE_SEEK)) {
+        seek(0, index, true);
+        decodeOnTo(index);
       }
     }
     if (currentIndex < 0) fail("frame " + std::to_string(index) + ": no picture decodes");
   }
 };
 
-VideoReader::VideoReader(const std::string& path) : decoder_(std::make_unique<Decoder>()) {
+VideoReader::VideoReader(const std::string& path, std::shared_ptr<DamagedFrames> damage)
+    : decoder_(std::make_unique<Decoder>()) {
   decoder_->path = path;
+  decoder_->damage = std::move(damage);
   clearLibraryError();
   decoder_->open();
   decoder_->converter =
@@ -273,10 +342,10 @@ VideoReader::~VideoReader() = default;
 
 const MediaInfo& VideoReader::info() const { return decoder_->info; }
 
-std::vector<uint8_t> VideoReader::glRowsAt(double seconds, int32_t width, int32_t height,
-                                           PixelFormat format) {
+std::vector<uint8_t> VideoReader::glRowsAt(int64_t frame, FrameRate rate, int32_t width,
+                                           int32_t height, PixelFormat format) {
   clearLibraryError();
-  decoder_->show(decoder_->frameShownAt(seconds));
+  decoder_->show(decoder_->frameShownAt(frame, rate));
   try {
     return decoder_->converter->glRows(decoder_->current, width, height, format);
   } catch (const std::bad_alloc&) {
@@ -286,9 +355,10 @@ std::vector<uint8_t> VideoReader::glRowsAt(double seconds, int32_t width, int32_
   }
 }
 
-RgbaImage VideoReader::frameAt(double seconds, int32_t width, int32_t height, PixelFormat format) {
+RgbaImage VideoReader::frameAt(int64_t frame, FrameRate rate, int32_t width, int32_t height,
+                               PixelFormat format) {
   RgbaImage picture(width, height, format);
-  picture.pixels = flipRows(glRowsAt(seconds, width, height, format), width, height);
+  picture.pixels = flipRows(glRowsAt(frame, rate, width, height, format), width, height);
   return picture;
 }
 

@@ -17,6 +17,7 @@ extern "C" {
 #include <cstring>
 #include <stdexcept>
 
+#include "refhost/media/audio_track.h"
 #include "refhost/media/ffmpeg_utilities.h"
 
 namespace refhost {
@@ -142,7 +143,7 @@ struct VideoWriter::Encoder {
     codec->color_range = colour.fullRange ? AVCOL_RANGE_JPEG : AVCOL_RANGE_MPEG;
   }
 
-  void open(VideoContainer container, double frameRate, const AudioClip& audioClip) {
+  void open(VideoContainer container, FrameRate frameRate, const std::vector<AudioClip>& sound) {
     if (auto refusal = refusalOf(settings, container))
       throw std::invalid_argument(shownName + ": cannot write video: " + refusal->reason);
     if (!swscaleHasMatrix(settings.colour.matrix))
@@ -175,7 +176,8 @@ struct VideoWriter::Encoder {
     av_pix_fmt_get_chroma_sub_sample(codec->pix_fmt, &chromaShiftX, &chromaShiftY);
     codec->width = chromaShiftX ? (width + 1) & ~1 : width;
     codec->height = chromaShiftY ? (height + 1) & ~1 : height;
-    AVRational rate = av_d2q(frameRate > 0 ? frameRate : 25.0, 1001000);
+    const FrameRate exact = reduced(frameRate.valid() ? frameRate : FrameRate{25, 1});
+    const AVRational rate{static_cast<int>(exact.numerator), static_cast<int>(exact.denominator)};
     codec->time_base = av_inv_q(rate);
     codec->framerate = rate;
     // The encoder's own keyframe interval, and as many threads as it wants: the settings the
@@ -196,7 +198,7 @@ struct VideoWriter::Encoder {
       fail("codec data", result);
     stream->time_base = codec->time_base;
     stream->avg_frame_rate = rate;
-    if (!audioClip.path.empty()) audio = AudioTrack::open(audioClip, format);
+    if (!sound.empty()) audio = AudioTrack::open(sound, format);
 
     if ((result = avio_open(&format->pb, path.c_str(), AVIO_FLAG_WRITE)) < 0)
       fail("cannot create the file", result);
@@ -286,8 +288,8 @@ struct VideoWriter::Encoder {
 };
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int32_t width,
-                         int32_t height, double frameRate, const VideoEncoding& encoding,
-                         const std::string& shownName, const AudioClip& audio)
+                         int32_t height, FrameRate frameRate, const VideoEncoding& encoding,
+                         const std::string& shownName, const std::vector<AudioClip>& audio)
     : encoder_(std::make_unique<Encoder>()) {
   encoder_->path = path;
   encoder_->shownName = shownName.empty() ? path : shownName;
