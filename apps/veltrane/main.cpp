@@ -9,6 +9,7 @@
 #include "cli/cli_support.h"
 #include "cli/stop_signals.h"
 #include "commands/commands.h"
+#include "refhost/media/ffmpeg_utilities.h"
 
 namespace {
 
@@ -69,6 +70,9 @@ int main(int argc, char** argv) {
     return 2;
   }
   std::vector<std::string> rest(args.begin() + 1, args.end());
+  // This program owns standard error: FFmpeg's messages go into the one line of a failure
+  // instead of around it.
+  refhost::keepLibraryErrorsForMessages();
   try {
     return chosen->run(rest);
   } catch (const veltrane_cli::UsageError& error) {

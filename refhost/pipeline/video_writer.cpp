@@ -17,14 +17,11 @@ extern "C" {
 #include <cstring>
 #include <stdexcept>
 
+#include "refhost/media/audio_track.h"
+#include "refhost/media/ffmpeg_utilities.h"
+
 namespace refhost {
 namespace {
-
-std::string errorText(int code) {
-  char buffer[AV_ERROR_MAX_STRING_SIZE] = {};
-  av_strerror(code, buffer, sizeof buffer);
-  return buffer;
-}
 
 // FFmpeg's muxers are named as the containers' file extensions, but for Matroska's.
 const char* muxerName(VideoContainer container) {
@@ -45,10 +42,13 @@ const std::vector<uint16_t>& sixteenBitsOfHalf() {
   return table;
 }
 
-// The matrices swscale converts with, numbered as H.273 numbers them.
+// The matrices swscale converts with.
 bool swscaleHasMatrix(int32_t matrix) {
-  return matrix == 1 || matrix == 4 || matrix == 5 || matrix == 6 || matrix == 7 || matrix == 9 ||
-         matrix == 10;
+  using C = ColourDescription;
+  for (int32_t known : {C::kMatrixBt709, C::kMatrixFcc, C::kMatrixBt470bg, C::kMatrixSmpte170m,
+                        C::kMatrixSmpte240m, C::kMatrixBt2020, C::kMatrixBt2020Constant})
+    if (matrix == known) return true;
+  return false;
 }
 
 }  // namespace
@@ -98,7 +98,7 @@ struct VideoWriter::Encoder {
 
   [[noreturn]] void fail(const std::string& what, int code = 0) const {
     throw std::runtime_error(shownName + ": cannot write video: " + what +
-                             (code ? " (" + errorText(code) + ")" : ""));
+                             (code ? " (" + avErrorText(code) + ")" : ""));
   }
 
   void addNote(const std::string& text) { note += (note.empty() ? "" : "; ") + text; }
@@ -143,7 +143,7 @@ struct VideoWriter::Encoder {
     codec->color_range = colour.fullRange ? AVCOL_RANGE_JPEG : AVCOL_RANGE_MPEG;
   }
 
-  void open(VideoContainer container, double frameRate, const AudioClip& audioClip) {
+  void open(VideoContainer container, FrameRate frameRate, const std::vector<AudioClip>& sound) {
     if (auto refusal = refusalOf(settings, container))
       throw std::invalid_argument(shownName + ": cannot write video: " + refusal->reason);
     if (!swscaleHasMatrix(settings.colour.matrix))
@@ -176,7 +176,8 @@ struct VideoWriter::Encoder {
     av_pix_fmt_get_chroma_sub_sample(codec->pix_fmt, &chromaShiftX, &chromaShiftY);
     codec->width = chromaShiftX ? (width + 1) & ~1 : width;
     codec->height = chromaShiftY ? (height + 1) & ~1 : height;
-    AVRational rate = av_d2q(frameRate > 0 ? frameRate : 25.0, 1001000);
+    const FrameRate exact = reduced(frameRate.valid() ? frameRate : FrameRate{25, 1});
+    const AVRational rate{static_cast<int>(exact.numerator), static_cast<int>(exact.denominator)};
     codec->time_base = av_inv_q(rate);
     codec->framerate = rate;
     // The encoder's own keyframe interval, and as many threads as it wants: the settings the
@@ -197,7 +198,7 @@ struct VideoWriter::Encoder {
       fail("codec data", result);
     stream->time_base = codec->time_base;
     stream->avg_frame_rate = rate;
-    if (!audioClip.path.empty()) audio = AudioTrack::open(audioClip, format);
+    if (!sound.empty()) audio = AudioTrack::open(sound, format);
 
     if ((result = avio_open(&format->pb, path.c_str(), AVIO_FLAG_WRITE)) < 0)
       fail("cannot create the file", result);
@@ -287,14 +288,12 @@ struct VideoWriter::Encoder {
 };
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int32_t width,
-                         int32_t height, double frameRate, const VideoEncoding& encoding,
-                         const std::string& shownName, const AudioClip& audio)
+                         int32_t height, FrameRate frameRate, const VideoEncoding& encoding,
+                         const std::string& shownName, const std::vector<AudioClip>& audio)
     : encoder_(std::make_unique<Encoder>()) {
   encoder_->path = path;
   encoder_->shownName = shownName.empty() ? path : shownName;
   encoder_->settings = encoding;
-  // The libraries' progress chatter would bury the command line's own output.
-  av_log_set_level(AV_LOG_ERROR);
   encoder_->width = width;
   encoder_->height = height;
   if (width <= 0 || height <= 0) encoder_->fail("a video needs a frame of at least 1x1");

@@ -13,8 +13,9 @@ namespace {
 const char kRenderHelp[] =
     "Usage: veltrane render SCENE.json -o OUT [--frame N | --frames A-B]\n"
     "                       [--codec C] [--crf N] [--preset P] [--bit-depth B]\n"
-    "                       [--audio-from FILE | --audio-from layer NAME | --no-audio]\n"
-    "                       [--quiet] [--profile core|compat] [--plugin PATH]\n"
+    "                       [--audio-from N|FILE | --audio-from layer NAME | --audio mix|N,M\n"
+    "                       | --no-audio] [--strict] [--quiet] [--profile core|compat]\n"
+    "                       [--plugin PATH]\n"
     "\n"
     "Loads the plug-in into the reference host with a headless GL context, sets up the scene\n"
     "(composition, layers, media, parameter values; see docs/scene-format.md), renders the\n"
@@ -29,7 +30,10 @@ const char kRenderExamples[] =
     "  veltrane render docs/examples/demo.json -o out.png --frame 40\n"
     "  10-bit HEVC of frames 0 to 99 with the sound of another recording:\n"
     "  veltrane render scene.json -o out.mp4 --frames 0-99 --codec h265 --bit-depth 10 \\\n"
-    "      --crf 18 --audio-from take2.wav\n";
+    "      --crf 18 --audio-from take2.wav\n"
+    "  The sound of the scene's own source and of its second layer mixed, failing on any\n"
+    "  damaged frame:\n"
+    "  veltrane render scene.json -o out.mp4 --audio 1,3 --strict\n";
 
 }  // namespace
 

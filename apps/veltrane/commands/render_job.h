@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "cli/cli_support.h"
+#include "commands/render_sound.h"
 #include "scene/scene_document.h"
 
 namespace veltrane_cli {
@@ -16,23 +17,16 @@ namespace veltrane_cli {
 extern const std::vector<OptionDefinition> kRenderOutputOptions;
 extern const char kRenderOutputHelp[];
 
-// Takes "--audio-from FILE" and "--audio-from layer NAME" out of the arguments (the layer form
-// is two words) and keeps them for renderScene; call before parsing the rest.
-struct AudioFrom {
-  enum class Kind { None, File, Layer };
-  Kind kind = Kind::None;
-  std::string name;
-};
-AudioFrom takeAudioFrom(std::vector<std::string>& args);
-
 // The output's name from -o/--output; UsageError when it is missing, given twice or not an
 // output kind.
 std::string outputName(const std::map<std::string, std::string>& options);
 
 // Checks the output options against the output and the scene, then renders the scene's frames
 // (all, or --frame N / --frames A-B) into the output: a still, a sequence or a video with its
-// codec, quality, bit depth and sound. Prints "wrote ..." and returns the exit status.
-// `command` names the command in notes ("render", "split").
+// codec, quality, bit depth and sound. Prints "wrote ..." and returns the exit status; a note
+// says why a video is silent, a warning which clips had damaged frames, concealed (with
+// --strict a damaged frame fails the job instead). `command` names the command in notes
+// ("render", "split").
 int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
                 const AudioFrom& audioFrom, const std::string& command);
 
