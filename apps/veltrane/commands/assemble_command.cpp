@@ -44,7 +44,12 @@ void checkChunks(const FarmPlan& plan) {
     std::error_code error;
     if (!std::filesystem::is_regular_file(chunk.file, error))
       throw std::runtime_error(name + " is missing" + rerun(plan, i));
-    const refhost::PieceHeader header = refhost::readPieceHeader(chunk.file);
+    refhost::PieceHeader header;
+    try {
+      header = refhost::readPieceHeader(chunk.file);
+    } catch (const std::runtime_error& error) {
+      throw std::runtime_error(name + " is damaged: " + error.what() + rerun(plan, i));
+    }
     auto tag = [&](const char* key) {
       auto found = header.tags.find(key);
       return found == header.tags.end() ? std::string() : found->second;

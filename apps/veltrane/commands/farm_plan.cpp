@@ -29,7 +29,10 @@ std::string foundPath(const std::string& stored, const fs::path& planFolder) {
   return (planFolder / stored).lexically_normal().generic_string();
 }
 
-fs::path folderOf(const std::string& planFile) { return fs::path(planFile).parent_path(); }
+fs::path folderOf(const std::string& planFile) {
+  const fs::path folder = fs::path(planFile).parent_path();
+  return folder.empty() ? fs::path(".") : folder;
+}
 
 nlohmann::ordered_json rangeJson(const FrameRange& range) { return {range.first, range.last}; }
 
