@@ -1,8 +1,8 @@
-// A job divided into chunks and joined again: plans cut the frames as asked; chunks rendered
-// apart and assembled equal a single render of the job (frame for frame with FFV1, within the
-// codec's loss with H.264 and H.265; timestamps and sound alike), with time shifts and a layer
-// that cross the chunks' boundaries and a chunk of one frame; a chunk that does not fit is
-// refused in one line with nothing written, and rendering it again gives the clean result.
+// A job divided into chunks and joined again: chunks rendered apart and assembled equal a single
+// render of the job (frame for frame with FFV1, within the codec's loss with H.264 and H.265;
+// timestamps and sound alike), with time shifts and a layer that cross the chunks' boundaries
+// and a chunk of one frame; a chunk that does not fit is refused in one line with nothing
+// written, and rendering it again gives the clean result.
 #include <gtest/gtest.h>
 #include <signal.h>
 
@@ -10,35 +10,11 @@
 #include <functional>
 
 #include "cli_runner.h"
-#include "commands/farm_plan.h"
 #include "support/child_process.h"
 
 namespace {
 
 namespace fs = std::filesystem;
-using veltrane_cli::FrameRange;
-
-TEST(FarmPlan, ChunksCoverTheFramesInOrder) {
-  struct Case {
-    FrameRange frames;
-    int32_t count;   // --chunks, or 0 for
-    int32_t length;  // --chunk-frames
-    std::vector<std::pair<int32_t, int32_t>> expected;
-  };
-  const Case cases[] = {{{0, 9}, 3, 0, {{0, 3}, {4, 6}, {7, 9}}},
-                        {{5, 5}, 1, 0, {{5, 5}}},
-                        {{0, 9}, 0, 4, {{0, 3}, {4, 7}, {8, 9}}},
-                        {{3, 41}, 0, 19, {{3, 21}, {22, 40}, {41, 41}}}};
-  for (const Case& c : cases) {
-    std::vector<std::pair<int32_t, int32_t>> got;
-    for (const FrameRange& range : c.count ? veltrane_cli::chunksOf(c.frames, c.count)
-                                           : veltrane_cli::chunksOfLength(c.frames, c.length))
-      got.emplace_back(range.first, range.last);
-    EXPECT_EQ(got, c.expected) << c.frames.first << "-" << c.frames.last;
-  }
-  EXPECT_THROW(veltrane_cli::chunksOf({0, 2}, 4), veltrane_cli::UsageError);
-  EXPECT_THROW(veltrane_cli::chunksOfLength({0, 2}, 0), veltrane_cli::UsageError);
-}
 
 // A folder with two clips of smooth moving pictures made by FFmpeg (which CRF 18 keeps well above
 // 45 dB), the first with a tone, and a scene of 60 frames that shows the first clip 7 frames back
