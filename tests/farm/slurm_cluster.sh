@@ -30,6 +30,7 @@ stop_daemons() {
   rm -rf "$scratch"
 }
 trap stop_daemons EXIT
+trap "exit 1" TERM INT HUP
 
 # started NAME PIDFILE: the daemon's process id once its pid file holds it.
 started() {

@@ -137,10 +137,9 @@ int runPlan(const std::vector<std::string>& arguments) {
     std::printf("%s render --plan %s --chunk %zu --quiet%s\n", program.c_str(),
                 shellWord(plan.file).c_str(), i, plugin.c_str());
   std::fprintf(stderr,
-               "veltrane plan: wrote %s (%zu chunks of frames %d-%d, %s); when every chunk is "
-               "rendered: %s assemble %s\n",
-               plan.file.c_str(), plan.chunks.size(), plan.frames.first, plan.frames.last,
-               plan.settingsText().c_str(), program.c_str(), shellWord(plan.file).c_str());
+               "veltrane plan: wrote %s (%s); when every chunk is rendered: %s assemble %s\n",
+               plan.file.c_str(), plan.settingsText().c_str(), program.c_str(),
+               shellWord(plan.file).c_str());
   return 0;
 }
 
