@@ -151,7 +151,9 @@ void copyPiece(std::size_t index, const PieceToJoin& piece, const std::string& p
     }
     packet->pts = inFrames(packet->pts, stream.time_base, joined.frameTime());
     packet->dts = inFrames(packet->dts, stream.time_base, joined.frameTime());
-    packet->duration = inFrames(packet->duration, stream.time_base, joined.frameTime());
+    // Every frame of a rendered video lasts one frame, as the writer wrote it; containers that
+    // keep no duration for some packets (Matroska) leave it to be said again.
+    packet->duration = 1;
     const int64_t place = packet->pts - piece.firstFrame;
     if (packet->pts == AV_NOPTS_VALUE || place < 0 || place >= piece.frameCount ||
         seen[static_cast<std::size_t>(place)])
@@ -195,7 +197,13 @@ void joinPieces(const std::vector<PieceToJoin>& pieces, const JoinedVideo& outpu
   Input first = openPiece(pieces.front().path);
   const AVCodecParameters& parameters =
       *first->streams[videoStreamOf(*first, pieces.front().path)]->codecpar;
+  // Pieces are compared by what their headers say; the joined stream's parameters are completed
+  // from the first piece's pictures, as some muxers need what only they tell (MP4's VP9 record
+  // wants the profile and the sampling).
   const std::string parametersOfFirst = parametersText(parameters);
+  const int result = avformat_find_stream_info(first.get(), nullptr);
+  if (result < 0)
+    throw PieceMismatch(0, pieces.front().path + ": cannot be read (" + avErrorText(result) + ")");
   JoinedFile joined(output, parameters);
   first.reset();
   int64_t lastDecode = std::numeric_limits<int64_t>::min();
