@@ -3,6 +3,8 @@
 // again, with the sound of the whole job added once.
 #include <cstdio>
 #include <filesystem>
+#include <map>
+#include <stdexcept>
 
 #include "cli/cli_support.h"
 #include "cli/stop_signals.h"

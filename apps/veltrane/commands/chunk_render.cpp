@@ -3,6 +3,9 @@
 // tagged with the plan's scene, settings and the chunk's frames.
 #include "commands/chunk_render.h"
 
+#include <map>
+#include <stdexcept>
+
 #include "commands/farm_plan.h"
 #include "scene/scene_document.h"
 

@@ -1,9 +1,13 @@
 // The plan of a farm job: its chunks, its file and the names of its parts.
 #include "commands/farm_plan.h"
 
+#include <algorithm>
+#include <cstdio>
 #include <filesystem>
 #include <fstream>
+#include <limits>
 #include <nlohmann/json.hpp>
+#include <stdexcept>
 
 #include "scene/json_fields.h"
 #include "scene/json_file.h"

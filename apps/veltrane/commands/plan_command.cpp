@@ -1,6 +1,7 @@
 // `veltrane plan`: divides a render job into chunks that machines of a render farm render apart,
 // writes the plan beside the final video and prints one command a chunk.
 #include <cstdio>
+#include <filesystem>
 
 #include "cli/cli_support.h"
 #include "commands/commands.h"
