@@ -30,6 +30,10 @@ const Command kCommands[] = {
      &veltrane_cli::runSoak},
     {"view", "open a scene in a window: picture, handles, parameter panel, timeline, undo",
      &veltrane_cli::runView},
+    {"plan", "divide a render into chunks that machines of a render farm render apart",
+     &veltrane_cli::runPlan},
+    {"assemble", "join the rendered chunks of a plan into the final video",
+     &veltrane_cli::runAssemble},
 };
 
 void printUsage(std::FILE* out) {

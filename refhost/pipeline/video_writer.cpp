@@ -23,11 +23,6 @@ extern "C" {
 namespace refhost {
 namespace {
 
-// FFmpeg's muxers are named as the containers' file extensions, but for Matroska's.
-const char* muxerName(VideoContainer container) {
-  return container == VideoContainer::Mkv ? "matroska" : containerExtension(container);
-}
-
 // Half floats to 16 bits a channel, clamped to 0 to 1 and rounded, one lookup a sample.
 const std::vector<uint16_t>& sixteenBitsOfHalf() {
   static const std::vector<uint16_t> table = [] {
@@ -52,6 +47,16 @@ bool swscaleHasMatrix(int32_t matrix) {
 }
 
 }  // namespace
+
+// FFmpeg's muxers are named as the containers' file extensions, but for Matroska's.
+const char* muxerName(VideoContainer container) {
+  return container == VideoContainer::Mkv ? "matroska" : containerExtension(container);
+}
+
+// Apple's players take HEVC in MP4 and QuickTime files only under this tag.
+uint32_t videoCodecTag(const std::string& coding, VideoContainer container) {
+  return coding == "hevc" && container != VideoContainer::Mkv ? MKTAG('h', 'v', 'c', '1') : 0;
+}
 
 bool containerHolds(VideoContainer container, const std::string& codec) {
   // The QuickTime muxer shares MP4's table of codecs, so it answers yes for VP9 and AV1, then
@@ -184,9 +189,8 @@ struct VideoWriter::Encoder {
     // ffmpeg command line uses, so files and speed compare with its.
     codec->thread_count = 0;
     tagColour();
-    // Apple's players take HEVC in MP4 and QuickTime files only under this tag.
-    if (info.coding == "hevc" && container != VideoContainer::Mkv)
-      codec->codec_tag = MKTAG('h', 'v', 'c', '1');
+    codec->codec_tag = videoCodecTag(info.coding, container);
+    if (settings.piece) makeJoinable(*settings.piece);
     if (format->oformat->flags & AVFMT_GLOBALHEADER) codec->flags |= AV_CODEC_FLAG_GLOBAL_HEADER;
     // SVT-AV1 prints its whole configuration to stderr unless its log level says otherwise.
     if (codecName == "libsvtav1") setenv("SVT_LOG", "1", 0);
@@ -202,8 +206,12 @@ struct VideoWriter::Encoder {
 
     if ((result = avio_open(&format->pb, path.c_str(), AVIO_FLAG_WRITE)) < 0)
       fail("cannot create the file", result);
-    if ((result = avformat_write_header(format, nullptr)) < 0)
-      fail("cannot write the header", result);
+    // QuickTime files keep tags of their own only when asked to.
+    AVDictionary* headerOptions = nullptr;
+    if (settings.piece) av_dict_set(&headerOptions, "movflags", "+use_metadata_tags", 0);
+    result = avformat_write_header(format, &headerOptions);
+    av_dict_free(&headerOptions);
+    if (result < 0) fail("cannot write the header", result);
     headerWritten = true;
 
     frame->format = codec->pix_fmt;
@@ -215,6 +223,17 @@ struct VideoWriter::Encoder {
     frame->color_trc = codec->color_trc;
     frame->color_range = codec->color_range;
     if ((result = av_frame_get_buffer(frame, 0)) < 0) fail("out of memory", result);
+  }
+
+  // A piece of a longer video (see JoinablePiece): GOPs of the same length in every piece and
+  // closed, so that none refers to a frame of another piece, and timestamps that go on from
+  // the pieces before it.
+  void makeJoinable(const JoinablePiece& piece) {
+    if (piece.gopLength > 0) codec->gop_size = piece.gopLength;
+    codec->flags |= AV_CODEC_FLAG_CLOSED_GOP;
+    nextPts = piece.firstFrame;
+    for (const auto& [key, value] : piece.tags)
+      av_dict_set(&format->metadata, key.c_str(), value.c_str(), 0);
   }
 
   // A conversion from the RGB format to the encoder's format, with the matrix and range asked

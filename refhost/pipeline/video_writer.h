@@ -14,6 +14,12 @@
 
 namespace refhost {
 
+// FFmpeg's muxer for the container, and the tag a video stream of the coding (FFmpeg's name of
+// it, "hevc") is filed under in the container (0: the muxer's own choice). The joiner of
+// pieces writes its streams as the writer does.
+const char* muxerName(VideoContainer container);
+uint32_t videoCodecTag(const std::string& coding, VideoContainer container);
+
 class VideoWriter {
  public:
   // Opens the file for frames of the size at the rate, its time base exactly one frame,

@@ -46,12 +46,6 @@ int imageWriters() {
   return static_cast<int>(std::clamp(std::thread::hardware_concurrency(), 1u, 4u));
 }
 
-struct FrameRange {
-  int32_t first = 0;
-  int32_t last = 0;
-  int32_t count() const { return last - first + 1; }
-};
-
 FrameRange parseRange(const std::string& text) {
   std::string::size_type dash = text.find('-', 1);
   if (dash == std::string::npos) {  // one frame, as --frame N
@@ -251,9 +245,10 @@ std::string outputName(const std::map<std::string, std::string>& options) {
   return options.count("-o") ? options.at("-o") : options.at("--output");
 }
 
-int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
-                const AudioFrom& audioFrom, const std::string& command) {
-  refhost::OutputTarget target;
+RenderJob chooseRenderJob(const Scene& scene, const std::map<std::string, std::string>& options,
+                          const AudioFrom& audioFrom) {
+  RenderJob job;
+  refhost::OutputTarget& target = job.target;
   try {
     target = refhost::parseOutputTarget(outputName(options));
   } catch (const std::invalid_argument& error) {
@@ -264,22 +259,37 @@ int renderScene(const Scene& scene, const std::map<std::string, std::string>& op
   } else {
     chooseImageDepth(options, target);
   }
+  glProfile(options);  // checked with the other options, before anything is read
+  job.frames = chooseFrames(options, target, scene);
+  // The colour a video is converted to and tagged with is the composition's: the scene's own
+  // choice, else its video source's, else BT.709 (see refhost::defaultColour).
+  target.video.colour = scene.composition.colour;
+  const refhost::FrameRate rate = scene.composition.frameRate;
+  job.sound = chooseSound(
+      audioFrom, options, scene, target.kind == refhost::OutputKind::Video ? "" : imageKind(target),
+      static_cast<double>(job.frames.first) * rate.denominator / rate.numerator,
+      static_cast<double>(job.frames.count()) * rate.denominator / rate.numerator);
+  job.strict = options.count("--strict") > 0;
+  return job;
+}
+
+int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
+                const AudioFrom& audioFrom, const std::string& command) {
+  return runRenderJob(scene, chooseRenderJob(scene, options, audioFrom), options, command);
+}
+
+int runRenderJob(const Scene& scene, const RenderJob& job,
+                 const std::map<std::string, std::string>& options, const std::string& command) {
+  const refhost::OutputTarget& target = job.target;
+  const FrameRange& frames = job.frames;
   refhost::GlProfile profile = glProfile(options);
   std::string module = pluginPath(options);
 
   noteStopSignals();
   keepFrameMemory();
-  FrameRange frames = chooseFrames(options, target, scene);
   const refhost::Composition& composition = scene.composition;
-  // The colour a video is converted to and tagged with is the composition's: the scene's own
-  // choice, else its video source's, else BT.709 (see refhost::defaultColour).
-  target.video.colour = composition.colour;
-  const refhost::FrameRate rate = composition.frameRate;
-  const SoundChoice sound = chooseSound(
-      audioFrom, options, scene, target.kind == refhost::OutputKind::Video ? "" : imageKind(target),
-      static_cast<double>(frames.first) * rate.denominator / rate.numerator,
-      static_cast<double>(frames.count()) * rate.denominator / rate.numerator);
-  const bool strict = options.count("--strict") > 0;
+  const SoundChoice& sound = job.sound;
+  const bool strict = job.strict;
   if (strict) refuseDamage(scene);  // stills are read with the scene
   // A missing folder for the output is made (and taken away again if the render fails).
   std::string folder = std::filesystem::path(target.path).parent_path().string();
