@@ -147,6 +147,7 @@ void writePlan(const FarmPlan& plan) {
   if (plan.audioFrom.kind == AudioFrom::Kind::File)
     audioFrom = {{"file", storedPath(plan.audioFrom.name, folder)}};
   if (plan.audioFrom.kind == AudioFrom::Kind::Layer) audioFrom = {{"layer", plan.audioFrom.name}};
+  if (plan.audioFrom.kind == AudioFrom::Kind::Clip) audioFrom = {{"clip", plan.audioFrom.clip}};
   const nlohmann::ordered_json document = {
       {"veltranePlan", kPlanFormat},
       {"scene", {{"file", storedPath(plan.scene, folder)}, {"checksum", plan.sceneChecksum}}},
@@ -193,10 +194,13 @@ FarmPlan readPlan(const std::string& path) {
   }
   const JsonField audioFrom = top.member("audioFrom");
   if (audioFrom.present() && !audioFrom.json().is_null()) {
-    audioFrom.requireObject({"file", "layer"});
+    audioFrom.requireObject({"file", "layer", "clip"});
     if (audioFrom.member("file").present())
       plan.audioFrom = {AudioFrom::Kind::File,
                         foundPath(audioFrom.member("file").fileName("a sound file"), folder)};
+    else if (audioFrom.member("clip").present())
+      plan.audioFrom = {AudioFrom::Kind::Clip, "",
+                        audioFrom.member("clip").integerIn(1, std::numeric_limits<int32_t>::max())};
     else
       plan.audioFrom = {AudioFrom::Kind::Layer, audioFrom.member("layer").string("a layer's name")};
   }
