@@ -9,9 +9,6 @@ namespace {
 
 using refhost::ParamValue;
 
-constexpr uint32_t kShift = 65505;
-constexpr uint32_t kEscape = 65307;
-
 class ViewerGestures : public LoadedPlugin {
  protected:
   void SetUp() override {
@@ -35,7 +32,10 @@ class ViewerGestures : public LoadedPlugin {
     for (const refhost::Param& param : host().panel().params()) states.push_back(param.state);
     return states;
   }
-  int32_t lastCursor() { return host().cursorShapes().empty() ? -1 : host().cursorShapes().back(); }
+  CursorShape lastCursor() {
+    return static_cast<CursorShape>(host().cursorShapes().empty() ? -1
+                                                                  : host().cursorShapes().back());
+  }
 
   std::unique_ptr<ViewerEvents> viewer_;
 };
@@ -93,9 +93,9 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
   resize(1920, 1080);
   host().setValue("numberOfCuts", ParamValue::ofInt(7));
   for (int i = 0; i < 7; ++i) setCut(i, -750.0f + 200.0f * static_cast<float>(i), 0.0f, 0.0f);
-  EXPECT_EQ(viewer().key(1007, kShift), 0);
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyLeftShift), 0);
   EXPECT_EQ(viewer().move(1810, 100, false), 0);
-  EXPECT_EQ(lastCursor(), 19);
+  EXPECT_EQ(lastCursor(), CursorShape::InsertCut);
 
   ASSERT_EQ(viewer().press(1810, 100), 1);
   EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 8);
@@ -111,7 +111,7 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
   // Eight cuts: Shift no longer inserts; the press takes the region under the pointer, the
   // part of the rightmost strip above the new horizontal cut.
   EXPECT_EQ(viewer().move(1810, 800, false), 1);
-  EXPECT_EQ(lastCursor(), 3);
+  EXPECT_EQ(lastCursor(), CursorShape::Move);
   host().clearCallLog();
   ASSERT_EQ(viewer().press(1810, 800), 1);
   viewer().release(1810, 800);
@@ -119,7 +119,7 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
   // The plug-in brackets the press as a move; moving nothing, it leaves the host no step.
   EXPECT_EQ(host().callsTo("BeginUndo").back(), "BeginUndo \"Moved Split Screen Input 8\"");
   EXPECT_EQ(host().undoStepNames().back(), "Inserting Cut");
-  EXPECT_EQ(viewer().key(1008, kShift), 0);
+  EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyLeftShift), 0);
 }
 
 TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
@@ -127,7 +127,7 @@ TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
   setRadial(2);
   setCut(0, 0.0f, 0.0f, 0.0f);
   setCut(1, 0.0f, 0.0f, 90.0f);
-  viewer().key(1007, kShift);
+  viewer().key(kMessageKeyDown, kKeyLeftShift);
   ASSERT_EQ(viewer().press(960 - 300, 540 - 300), 1);  // down and left of the centre
   EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 3);
   EXPECT_NEAR(number("cutDirection_2")[0], -135.0f, 1e-3f);
@@ -194,21 +194,22 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
 
 TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
   setCut(0, 0.0f, 0.0f, 0.0f);
-  EXPECT_EQ(viewer().key(1007, kEscape), 0);  // nothing selected: the key is not taken
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape),
+            0);  // nothing selected: the key is not taken
   viewer().press(120, 20);
   viewer().release(120, 20);
   EXPECT_EQ(host().send(kMessagePointerOverSelection),
             1);  // pointer over the selected input's region
-  EXPECT_EQ(viewer().key(1007, kEscape), 1);
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 1);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 1);  // key down changes nothing
-  EXPECT_EQ(viewer().key(1008, kEscape), 1);
+  EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyEscape), 1);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
-  EXPECT_EQ(viewer().key(1008, kEscape), 0);
+  EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyEscape), 0);
   viewer().drag(120, 20, 200, 20);  // released outside the frame: over no input
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
 
   // A host that keeps a pressed control's hover drops the selection after every release.
-  host().setHostId(3000);
+  host().setHostId(kHostProductTouch);
   viewer().press(120, 20);
   viewer().release(120, 20);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
@@ -218,13 +219,13 @@ TEST_F(ViewerGestures, ReleaseWithoutPressClosesNoStep) {
   setCut(0, 0.0f, 0.0f, 0.0f);
   EXPECT_EQ(viewer().release(120, 20), 1);   // over a region
   EXPECT_EQ(viewer().release(-50, -50), 0);  // outside the frame
-  viewer().key(1007, kShift);
+  viewer().key(kMessageKeyDown, kKeyLeftShift);
   EXPECT_EQ(viewer().release(120, 20), 0) << "Shift with room for a cut: no region";
   EXPECT_TRUE(host().callsTo("EndUndo").empty());
   EXPECT_TRUE(host().undoStepNames().empty());
 }
 
-// Message 1014 copies another instance's interaction state into this one.
+// Copy instance copies another instance's interaction state into this one.
 TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   host().setValue("numberOfCuts", ParamValue::ofInt(3));
   setCut(0, -40.0f, 0.0f, 0.0f);
@@ -232,21 +233,21 @@ TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   setCut(2, 40.0f, 0.0f, 0.0f);
   viewer().press(140, 10);  // right of every cut: input 3's region
   viewer().release(140, 10);
-  viewer().key(1007, kShift);
+  viewer().key(kMessageKeyDown, kKeyLeftShift);
   void* const source = host().api().instanceData;
 
   host().api().instanceData = nullptr;
   ASSERT_EQ(host().send(kMessageCreateInstance), 1);
   void* const copy = host().api().instanceData;
-  EXPECT_EQ(viewer().key(1007, kEscape), 0);  // a fresh record has no selection
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 0);  // a fresh record has no selection
   host().setRenderContext(source);
   EXPECT_EQ(host().send(kMessageCopyInstance), 0);
   host().setRenderContext(nullptr);
   EXPECT_EQ(host().api().instanceData, copy);
-  EXPECT_EQ(viewer().key(1007, kEscape), 1);  // input 3 is selected here now
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 1);  // input 3 is selected here now
   host().clearViewerRecords();
   viewer().move(150, 80, false);  // Shift is down here too: the insert cursor
-  EXPECT_EQ(lastCursor(), 19);
+  EXPECT_EQ(lastCursor(), CursorShape::InsertCut);
 
   EXPECT_EQ(host().send(kMessageDestroyInstance), 1);
   host().api().instanceData = source;

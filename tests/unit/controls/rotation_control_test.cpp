@@ -44,15 +44,17 @@ genVec2 around(float degrees, float distance, float along = 0.0f) {
           kCentre.y + distance * std::cos(a) - along * std::sin(a)};
 }
 
-int lastCursor(const refhost::Host& host) {
-  return host.cursorShapes().empty() ? -1 : host.cursorShapes().back();
+CursorShape lastCursor(const refhost::Host& host) {
+  return static_cast<CursorShape>(host.cursorShapes().empty() ? -1 : host.cursorShapes().back());
 }
 
 TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
   const struct {
     float degrees;
-    int cursor;
-  } cases[] = {{0, 10}, {135, 13}, {315, 17}, {-90, 16}, {-675, 11}, {3600 + 240, 15}};
+    CursorShape cursor;
+  } cases[] = {{0, CursorShape::Rotate0},     {135, CursorShape::Rotate135},
+               {315, CursorShape::Rotate315}, {-90, CursorShape::Rotate270},
+               {-675, CursorShape::Rotate45}, {3600 + 240, CursorShape::Rotate225}};
   for (const auto& c : cases) {
     refhost::Host host;
     AngleParam param{c.degrees * kDegree, {}};
@@ -76,7 +78,7 @@ TEST(RotationControl, CursorOctantsTurnHalfWayBetweenDirections) {
 }
 
 TEST(RotationControl, PressedHoverSurvivesButtonUpMovesOnlyOnTheStickyHost) {
-  for (const int hostId : {0, 3000}) {
+  for (const int hostId : {0, static_cast<int>(kHostProductTouch)}) {
     refhost::Host host;
     host.setHostId(hostId);
     AngleParam param;
@@ -89,7 +91,7 @@ TEST(RotationControl, PressedHoverSurvivesButtonUpMovesOnlyOnTheStickyHost) {
     host.clearViewerRecords();
     EXPECT_FALSE(control.test(host.handle(), &host.api(), kCentre, 100.0f, around(90.0f, 300.0f),
                               kUnitScale, 1.0f, 0.0f, 0));
-    const bool sticky = hostId == 3000;
+    const bool sticky = hostId == kHostProductTouch;
     EXPECT_EQ(control.hot, sticky ? 1 : 0) << hostId;
     EXPECT_EQ(control.grabPointerAngle == anchor, sticky) << hostId;
     EXPECT_EQ(host.redrawCount(), sticky ? 0 : 1) << hostId;
