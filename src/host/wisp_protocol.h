@@ -109,24 +109,24 @@ enum WispResult : int32_t {
 };
 
 // A short name of each result; null for a number that is none.
+struct WispResultName {
+  WispResult result;
+  const char* name;
+};
+inline constexpr WispResultName kWispResultNames[] = {{kResultNotDone, "not done"},
+                                                      {kResultDone, "done"},
+                                                      {kResultNotHandled, "not handled"},
+                                                      {kResultException, "exception"}};
 constexpr const char* wispResultName(int32_t result) {
-  switch (static_cast<WispResult>(result)) {
-    case kResultNotDone:
-      return "not done";
-    case kResultDone:
-      return "done";
-    case kResultNotHandled:
-      return "not handled";
-    case kResultException:
-      return "exception";
-  }
+  for (const auto& entry : kWispResultNames)
+    if (entry.result == result) return entry.name;
   return nullptr;
 }
 
 // Bits of the flags a parameter is declared with. The host interprets them; the plug-in only
 // chooses them.
 enum WispParamFlag : int32_t {
-  kParamFlagsNone = 0,
+  kParamFlagsNone = 0,           // a plain parameter: one value, not animated
   kParamFlagAnimated = 1,        // the host keeps keyframes for it
   kParamFlagNotInUse = 2,        // unused with the default settings: shown disabled at first
   kParamFlagWholeTurns = 4,      // an angle counted in whole turns, never wrapped at 360
@@ -144,33 +144,33 @@ constexpr int32_t kParamFlagsRotation = kParamFlagDirectionDial | kParamFlagWhol
 // The cursor shapes SetCursor shows. Resize cursors name the axis they move along and rotate
 // cursors the octant of the handle, both with 0 degrees pointing along +y.
 enum class CursorShape : int32_t {
-  Default = 0,
-  Move = 3,
-  Resize0 = 6,  // along 0/180 degrees
-  Resize45 = 7,
-  Resize90 = 8,
-  Resize135 = 9,
-  Rotate0 = 10,
-  Rotate45 = 11,
-  Rotate90 = 12,
-  Rotate135 = 13,
-  Rotate180 = 14,
-  Rotate225 = 15,
-  Rotate270 = 16,
-  Rotate315 = 17,
-  InsertCut = 19,
+  Default = 0,     // the viewer's own arrow
+  Move = 3,        // a region's picture follows the pointer
+  Resize0 = 6,     // resize along 0/180 degrees
+  Resize45 = 7,    // resize along 45/225 degrees
+  Resize90 = 8,    // resize along 90/270 degrees
+  Resize135 = 9,   // resize along 135/315 degrees
+  Rotate0 = 10,    // rotate, handle in the octant around 0 degrees
+  Rotate45 = 11,   // ... around 45 degrees
+  Rotate90 = 12,   // ... around 90 degrees
+  Rotate135 = 13,  // ... around 135 degrees
+  Rotate180 = 14,  // ... around 180 degrees
+  Rotate225 = 15,  // ... around 225 degrees
+  Rotate270 = 16,  // ... around 270 degrees
+  Rotate315 = 17,  // ... around 315 degrees
+  InsertCut = 19,  // a press inserts a cut
 };
 
 // Layer types, as the layer state record and the layer list give them.
 enum WispLayerType : uint32_t {
   kLayerTypeFootage = 0,  // video or still media, placed in the composition
   kLayerTypeTitle = 1,    // text; its second matrix places the text box
-  kLayerTypeAudio = 2,
-  kLayerTypeCamera = 3,
-  kLayerTypeEffect = 4,  // the picture of an effect, like the layer this one is applied to
-  kLayerTypeLight = 5,
-  kLayerTypeNested = 6,  // a nested composition
-  kLayerTypeModel = 7,   // a 3D model; its second matrix places the object
+  kLayerTypeAudio = 2,    // sound only
+  kLayerTypeCamera = 3,   // the composition's point of view
+  kLayerTypeEffect = 4,   // the picture of an effect, like the layer this one is applied to
+  kLayerTypeLight = 5,    // lights 3D layers, shows nothing itself
+  kLayerTypeNested = 6,   // a nested composition
+  kLayerTypeModel = 7,    // a 3D model; its second matrix places the object
 };
 
 // Sets of layer types as bit masks over the type number.
@@ -206,6 +206,6 @@ enum WispHostProduct : int32_t {
 
 // X11 keysyms of the keys the plug-in reacts to (key down and key up).
 enum WispKey : uint32_t {
-  kKeyLeftShift = 65505,
-  kKeyEscape = 65307,
+  kKeyLeftShift = 65505,  // held, a press inserts a cut
+  kKeyEscape = 65307,     // drops the input selection
 };

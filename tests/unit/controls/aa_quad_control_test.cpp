@@ -43,29 +43,29 @@ TEST(AAQuadControl, PartAndCursorUnderThePointer) {
     uint8_t allowMove;
     genVec2 pointer;
     ControlPart part;
-    CursorShape cursor;
+    int cursor;
   } cases[] = {
-      {upright, 0.0f, 0, {100, 100}, ControlPart::CornerX0Y0, CursorShape::Resize45},
-      {upright, 0.0f, 0, {300, 100}, ControlPart::CornerX1Y0, CursorShape::Resize135},
-      {upright, 0.0f, 0, {102, 198}, ControlPart::CornerX0Y1, CursorShape::Resize135},
-      {upright, 0.0f, 0, {302, 202}, ControlPart::CornerX1Y1, CursorShape::Resize45},
-      {upright, 0.0f, 0, {200, 100}, ControlPart::EdgeY0, CursorShape::Resize0},
-      {upright, 0.0f, 0, {200, 196}, ControlPart::EdgeY1, CursorShape::Resize0},
-      {upright, 0.0f, 0, {97, 150}, ControlPart::EdgeX0, CursorShape::Resize90},
-      {upright, 0.0f, 0, {300, 150}, ControlPart::EdgeX1, CursorShape::Resize90},
-      {upright, 0.0f, 0, {200, 105}, ControlPart::None, CursorShape::Default},
-      {upright, 0.0f, 0, {200, 150}, ControlPart::None, CursorShape::Default},
-      {upright, 0.0f, 1, {200, 150}, ControlPart::Inside, CursorShape::Move},
-      {upright, 0.0f, 1, {50, 50}, ControlPart::None, CursorShape::Default},
-      {upright, 0.0f, 1, {350, 150}, ControlPart::None, CursorShape::Default},
+      {upright, 0.0f, 0, {100, 100}, ControlPart::CornerX0Y0, 7},
+      {upright, 0.0f, 0, {300, 100}, ControlPart::CornerX1Y0, 9},
+      {upright, 0.0f, 0, {102, 198}, ControlPart::CornerX0Y1, 9},
+      {upright, 0.0f, 0, {302, 202}, ControlPart::CornerX1Y1, 7},
+      {upright, 0.0f, 0, {200, 100}, ControlPart::EdgeY0, 6},
+      {upright, 0.0f, 0, {200, 196}, ControlPart::EdgeY1, 6},
+      {upright, 0.0f, 0, {97, 150}, ControlPart::EdgeX0, 8},
+      {upright, 0.0f, 0, {300, 150}, ControlPart::EdgeX1, 8},
+      {upright, 0.0f, 0, {200, 105}, ControlPart::None, 0},
+      {upright, 0.0f, 0, {200, 150}, ControlPart::None, 0},
+      {upright, 0.0f, 1, {200, 150}, ControlPart::Inside, 3},
+      {upright, 0.0f, 1, {50, 50}, ControlPart::None, 0},
+      {upright, 0.0f, 1, {350, 150}, ControlPart::None, 0},
       // A quarter turn carries the x1 edge's middle below the centre (200, 150).
-      {upright, kQuarterTurn, 0, {200, 50}, ControlPart::EdgeX1, CursorShape::Resize0},
-      {upright, kQuarterTurn, 0, {250, 150}, ControlPart::EdgeY1, CursorShape::Resize90},
-      {upright, kQuarterTurn, 0, {150, 50}, ControlPart::CornerX1Y0, CursorShape::Resize45},
-      {upright, -kQuarterTurn, 0, {150, 50}, ControlPart::CornerX0Y1, CursorShape::Resize45},
+      {upright, kQuarterTurn, 0, {200, 50}, ControlPart::EdgeX1, 6},
+      {upright, kQuarterTurn, 0, {250, 150}, ControlPart::EdgeY1, 8},
+      {upright, kQuarterTurn, 0, {150, 50}, ControlPart::CornerX1Y0, 7},
+      {upright, -kQuarterTurn, 0, {150, 50}, ControlPart::CornerX0Y1, 7},
       // Mirrored in x: its x0 edge is on the right and the diagonals swap.
-      {mirrored, 0.0f, 0, {300, 100}, ControlPart::CornerX0Y0, CursorShape::Resize135},
-      {mirrored, 0.0f, 0, {100, 200}, ControlPart::CornerX1Y1, CursorShape::Resize135},
+      {mirrored, 0.0f, 0, {300, 100}, ControlPart::CornerX0Y0, 9},
+      {mirrored, 0.0f, 0, {100, 200}, ControlPart::CornerX1Y1, 9},
   };
   for (const auto& c : cases) {
     refhost::Host host;
@@ -75,8 +75,9 @@ TEST(AAQuadControl, PartAndCursorUnderThePointer) {
         control.test(host.handle(), &host.api(), kFrame, c.pointer, {1, 1}, 0.0f, 0, c.rotation),
         c.part != ControlPart::None);
     EXPECT_EQ(control.part, c.part) << c.pointer.x << "," << c.pointer.y << " @" << c.rotation;
-    EXPECT_EQ(control.cursor, c.cursor) << c.pointer.x << "," << c.pointer.y << " @" << c.rotation;
-    EXPECT_EQ(host.cursorShapes(), std::vector<int32_t>{static_cast<int32_t>(c.cursor)});
+    EXPECT_EQ(static_cast<int>(control.cursor), c.cursor)
+        << c.pointer.x << "," << c.pointer.y << " @" << c.rotation;
+    EXPECT_EQ(host.cursorShapes(), std::vector<int32_t>{c.cursor});
     EXPECT_EQ(host.redrawCount(), c.part != ControlPart::None ? 1 : 0) << "the part changed";
   }
 }

@@ -4,7 +4,6 @@
 
 #include <gtest/gtest.h>
 
-#include <optional>
 #include <utility>
 #include <vector>
 
@@ -28,23 +27,20 @@ SplitScreenCutPositionControl controlFor(PointParam& param) {
 const genVec2 kFrame{1920.0f, 1080.0f};
 
 TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
-  // Along a vertical segment the handle drags across it: the resize cursor along x.
-  constexpr CursorShape kAlong = CursorShape::Resize90;
-  constexpr CursorShape kOff = CursorShape::Default;
   const genVec2 a{100.0f, 100.0f};
   const genVec2 b{100.0f, 300.0f};
   const struct {
     genVec2 pointer;
     float viewScale;
     bool hot;
-    std::optional<CursorShape> cursor;  // none: no cursor call at all
+    int cursor;  // -1: no cursor call at all
   } cases[] = {
-      {{100.0f, 200.0f}, 1.0f, true, kAlong}, {{114.9f, 200.0f}, 1.0f, true, kAlong},
-      {{115.0f, 200.0f}, 1.0f, false, kOff},  {{85.5f, 150.0f}, 1.0f, true, kAlong},
-      {{107.0f, 200.0f}, 2.0f, true, kAlong}, {{108.0f, 200.0f}, 2.0f, false, kOff},
-      {{105.0f, 100.5f}, 1.0f, true, kAlong}, {{105.0f, 100.0f}, 1.0f, false, {}},  // t = 0
-      {{100.0f, 300.0f}, 1.0f, false, {}},                                          // t = 1
-      {{100.0f, 50.0f}, 1.0f, false, {}},     {{100.0f, 301.0f}, 1.0f, false, {}},
+      {{100.0f, 200.0f}, 1.0f, true, 8},   {{114.9f, 200.0f}, 1.0f, true, 8},
+      {{115.0f, 200.0f}, 1.0f, false, 0},  {{85.5f, 150.0f}, 1.0f, true, 8},
+      {{107.0f, 200.0f}, 2.0f, true, 8},   {{108.0f, 200.0f}, 2.0f, false, 0},
+      {{105.0f, 100.5f}, 1.0f, true, 8},   {{105.0f, 100.0f}, 1.0f, false, -1},  // t = 0
+      {{100.0f, 300.0f}, 1.0f, false, -1},                                       // t = 1
+      {{100.0f, 50.0f}, 1.0f, false, -1},  {{100.0f, 301.0f}, 1.0f, false, -1},
   };
   for (const auto& c : cases) {
     refhost::Host host;
@@ -56,7 +52,7 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
         << c.pointer.x << "," << c.pointer.y;
     EXPECT_EQ(control.hot, c.hot ? 1 : 0);
     const std::vector<int32_t> cursors =
-        c.cursor ? std::vector{static_cast<int32_t>(*c.cursor)} : std::vector<int32_t>{};
+        c.cursor < 0 ? std::vector<int32_t>{} : std::vector{c.cursor};
     EXPECT_EQ(host.cursorShapes(), cursors) << c.pointer.x << "," << c.pointer.y;
   }
   // Across a horizontal segment the reach follows the vertical view scale.
