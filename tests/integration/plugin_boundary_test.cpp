@@ -76,6 +76,7 @@ TEST_F(LoadedPlugin, MessageResultTable) {
       {kMessagePointerEntered, kResultNotDone},
       {kMessagePointerLeft, kResultNotDone},
       {kMessageDoubleClick, kResultNotDone},
+      {kMessagePointerPress, kResultNotDone},  // no pointer event to read
       {kMessagePointerOverSelection, kResultNotDone},
   };
   for (const auto& row : table) {

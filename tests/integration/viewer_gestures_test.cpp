@@ -47,7 +47,7 @@ TEST_F(ViewerGestures, DraggingACutLineMovesItParallelToItself) {
   EXPECT_EQ(number("cutPosition_0")[1], 25.0f) << "the position jumps onto the pressed point";
   viewer().move(95, 65, true);
   viewer().move(110, 60, true);
-  viewer().release(110, 60);
+  EXPECT_EQ(viewer().release(110, 60), 1);
   EXPECT_EQ(number("cutPosition_0")[0], 30.0f);
   EXPECT_EQ(number("cutPosition_0")[1], 15.0f);
   EXPECT_TRUE(host().callsTo("SetAngleParam").empty()) << "the direction is left alone";
@@ -67,7 +67,7 @@ TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
     const float theta = (90.0f + 15.0f * static_cast<float>(step)) * 3.1415927f / 180.0f;
     viewer().move(cx + 40.0f * std::sin(theta), cy + 40.0f * std::cos(theta), true);
   }
-  viewer().release(cx + radius, cy);
+  EXPECT_EQ(viewer().release(cx + radius, cy), 1);
   EXPECT_NEAR(number("cutDirection_0")[0], 720.0f, 0.5f);
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Split Screen Cut 1 Direction"}));
 }
@@ -141,6 +141,12 @@ TEST_F(ViewerGestures, DraggingARegionMovesItsInput) {
   EXPECT_EQ(number("inputFrameTranslation0")[0], 10.0f);
   EXPECT_EQ(number("inputFrameTranslation0")[1], 10.0f);
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Moved Split Screen Input 0"}));
+  // Radial sectors count from input 1: the quarter between the cuts up and right is input 2's.
+  setRadial(2);
+  setCut(1, 0.0f, 0.0f, 90.0f);
+  viewer().drag(120, 70, 125, 75);
+  EXPECT_EQ(number("inputFrameTranslation2")[0], 5.0f);
+  EXPECT_EQ(host().undoStepNames().back(), "Moved Split Screen Input 2");
 }
 
 TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
@@ -152,6 +158,7 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
   // Rectangle (40, 22.5)-(120, 67.5); drag its (x1, y1) corner out to (140, 77.5).
   viewer().move(120, 67, false);
   viewer().drag(120, 67, 140, 77);
+  EXPECT_EQ(viewer().release(-50, -50), 0) << "the drag's release left nothing pressed";
   EXPECT_NEAR(host().valueAt("inputFrameScale0", 0).number[0], 62.5f, 1e-3f);
   EXPECT_NEAR(number("inputFrameTranslation0")[0], 10.0f, 1e-3f);   // x0 stays at 40
   EXPECT_NEAR(number("inputFrameTranslation0")[1], 5.625f, 1e-3f);  // y0 stays at 22.5
