@@ -1,6 +1,5 @@
 // The protocol's name tables: every message and result has a readable name of its own, the
-// tables name nothing else, numbers outside them still print readably, and the layer type sets
-// split the known types as the records rely on.
+// tables name nothing else, and numbers outside them still print readably.
 #include "host/wisp_protocol.h"
 
 #include <gtest/gtest.h>
@@ -37,19 +36,6 @@ TEST(WispProtocol, MessagesAndResultsHaveNamesOfTheirOwn) {
     EXPECT_EQ(wispMessageText(unknown), "unknown message " + std::to_string(unknown));
   EXPECT_EQ(namedNumbers(wispResultName),
             (std::set<int32_t>{kResultNotDone, kResultDone, kResultNotHandled, kResultException}));
-}
-
-// Picture-carrying and picture-less types split the known types; the flattened types and those
-// with a second matrix carry pictures; numbers beyond the mask are never members.
-TEST(WispProtocol, LayerTypeSetsSplitTheKnownTypes) {
-  for (uint32_t type = kLayerTypeFootage; type <= kLayerTypeModel; ++type) {
-    const bool withImage = layerTypeIn(type, kLayerTypesWithImage);
-    EXPECT_NE(withImage, layerTypeIn(type, kLayerTypesWithoutImage)) << type;
-    EXPECT_TRUE(withImage ||
-                !layerTypeIn(type, kLayerTypesFlattened | kLayerTypesWithSecondMatrix));
-  }
-  EXPECT_FALSE(layerTypeIn(kLayerTypeFootage, kLayerTypesFlattened)) << "footage keeps its place";
-  for (const uint32_t outside : {32u, 33u, 0xFFFFFFFFu}) EXPECT_FALSE(layerTypeIn(outside, ~0u));
 }
 
 }  // namespace
