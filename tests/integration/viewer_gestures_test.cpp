@@ -137,16 +137,18 @@ TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
 
 TEST_F(ViewerGestures, DraggingARegionMovesItsInput) {
   setCut(0, 0.0f, 0.0f, 0.0f);
+  EXPECT_EQ(viewer().move(120, 20, false), 1) << "the pointer rests over input 0's region";
   viewer().drag(120, 20, 130, 30);
   EXPECT_EQ(number("inputFrameTranslation0")[0], 10.0f);
   EXPECT_EQ(number("inputFrameTranslation0")[1], 10.0f);
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Moved Split Screen Input 0"}));
-  // Radial sectors count from input 1: the quarter between the cuts up and right is input 2's.
+  // Radial sectors count from input 1: with cuts up and right, the three quarters from the
+  // right round to the top are input 1's.
   setRadial(2);
   setCut(1, 0.0f, 0.0f, 90.0f);
-  viewer().drag(120, 70, 125, 75);
-  EXPECT_EQ(number("inputFrameTranslation2")[0], 5.0f);
-  EXPECT_EQ(host().undoStepNames().back(), "Moved Split Screen Input 2");
+  viewer().drag(40, 20, 45, 25);
+  EXPECT_EQ(number("inputFrameTranslation1")[0], 5.0f);
+  EXPECT_EQ(host().undoStepNames().back(), "Moved Split Screen Input 1");
 }
 
 TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
