@@ -204,6 +204,13 @@ enum WispHostProduct : int32_t {
   kHostProductCompositorPreview = 6001,
 };
 
+// The host record's textureFormatMode: what the textures the plug-in asks for are modelled on.
+// Any other mode gets a built-in RGBA format of no size.
+enum WispTextureFormatMode : uint32_t {
+  kTextureFormatLikeOutput = 0,  // the output texture's size, format and pixel type
+  kTextureFormatLikeSecond = 2,  // those of the render context's second texture
+};
+
 // X11 keysyms of the keys the plug-in reacts to (key down and key up).
 enum WispKey : uint32_t {
   kKeyLeftShift = 65505,  // held, a press inserts a cut

@@ -150,7 +150,8 @@ void configureHost(FuzzedDataProvider& data, refhost::Host& host) {
   host.setHostId(data.PickValueInArray(hostIds));
   // Other modes ask for a target of the built-in template's size, 0 x 0, which a host that
   // allocates exactly the sizes asked (as this one does) cannot draw into.
-  host.setTextureFormatMode(data.ConsumeBool() ? 0 : 2);
+  host.setTextureFormatMode(data.ConsumeBool() ? kTextureFormatLikeOutput
+                                               : kTextureFormatLikeSecond);
   host.setTimeInfo(hostileInt(data, 0, 96), hostileInt(data, 0, 96), hostileFloat(data));
   for (int i = data.ConsumeIntegralInRange(0, 3); i > 0; --i) {
     refhost::Layer layer;
