@@ -1,7 +1,6 @@
-// Generated pictures keep the promises the tests that use them rely on: opaque at any size,
-// bars of distinct colours side by side, a checker of alternating squares, gradients that rise
-// steadily, a counter whose code block reads back its frame; and frame sources hand GL its rows
-// bottom first (a moving source's upright frames are read back through the render context).
+// Generated pictures keep the promises the tests that use them rely on, at every size, and the
+// counter's code block reads back its frame; frame sources hand GL its rows bottom first (a
+// moving source's upright frames are read back through the render context).
 #include "refhost/media/test_patterns.h"
 
 #include <gtest/gtest.h>
@@ -18,59 +17,33 @@
 namespace refhost {
 namespace {
 
-const std::pair<int32_t, int32_t> kSizes[] = {{1, 1}, {7, 3}, {64, 36}, {71, 40}, {320, 180}};
-
-TEST(TestPatterns, EveryPatternIsOpaqueAtTheSizeAskedFor) {
-  for (const std::string& name : patternNames()) {
-    EXPECT_EQ(patternName(*patternFromName(name)), name);
-    for (const auto& [width, height] : kSizes) {
+// At every size: every pattern opaque; the bars seven distinct colours in full-height columns
+// of even width, so a region showing them can be told by its colour; the checker two greys
+// alternating square by square from a light corner; the gradient red rising to the right and
+// green upwards, never falling back, over the whole range, blue holding.
+TEST(TestPatterns, PicturesKeepTheirShapeAtEverySize) {
+  for (const auto& [width, height] : {std::pair{1, 1}, {7, 3}, {64, 36}, {71, 40}, {320, 180}}) {
+    SCOPED_TRACE(std::to_string(width) + "x" + std::to_string(height));
+    for (const std::string& name : patternNames()) {
       const RgbaImage image = generatePattern(*patternFromName(name), 3, width, height);
       ASSERT_EQ(image.pixels.size(), static_cast<size_t>(width * height * 4)) << name;
       for (size_t alpha = 3; alpha < image.pixels.size(); alpha += 4)
-        ASSERT_EQ(image.pixels[alpha], 255) << name << " " << width << "x" << height;
+        ASSERT_EQ(image.pixels[alpha], 255) << name;
     }
-  }
-  EXPECT_FALSE(patternFromName("Bars").has_value());
-  EXPECT_EQ(solidColour({0.5f, 0, 1, 1}, 2, 2).pixel(1, 1), (Rgba8{128, 0, 255, 255}));
-  EXPECT_EQ(solidColour({-1, 2, 0.2f, 0}, 1, 1).pixel(0, 0), (Rgba8{0, 255, 51, 0}));
-}
-
-// Seven bars of distinct colours, each filling its columns top to bottom, widths at most one
-// pixel apart, so a region showing the bars can be told by its colour.
-TEST(TestPatterns, BarsAreSevenDistinctColoursInColumnsOfEvenWidth) {
-  for (const int32_t width : {7, 70, 71, 320}) {
-    const RgbaImage image = generatePattern(Pattern::Bars, 0, width, 10);
-    std::vector<std::pair<Rgba8, int32_t>> bars;  // colour and width, left to right
-    for (int32_t x = 0; x < width; ++x) {
-      for (int32_t y = 1; y < 10; ++y) ASSERT_EQ(image.pixel(x, y), image.pixel(x, 0)) << x;
-      if (bars.empty() || bars.back().first != image.pixel(x, 0))
-        bars.push_back({image.pixel(x, 0), 0});
-      ++bars.back().second;
-    }
-    ASSERT_EQ(bars.size(), 7u) << width;
-    std::set<Rgba8> colours;
-    for (const auto& [colour, columns] : bars) {
-      colours.insert(colour);
-      EXPECT_LE(std::abs(columns - width / 7), 1) << width;
-    }
-    EXPECT_EQ(colours.size(), 7u) << "no colour comes back further right";
-  }
-}
-
-// The checker: two greys alternating square by square from a light top-left corner. The
-// gradient: red rising to the right and green upwards, never falling back, each over the whole
-// range, blue holding.
-TEST(TestPatterns, CheckerAlternatesAndGradientsRiseOverTheWholeRange) {
-  for (const auto& [width, height] : kSizes) {
-    SCOPED_TRACE(std::to_string(width) + "x" + std::to_string(height));
+    const RgbaImage bars = generatePattern(Pattern::Bars, 0, width, height);
     const RgbaImage checker = generatePattern(Pattern::Checker, 0, width, height);
+    const RgbaImage gradient = generatePattern(Pattern::Gradient, 0, width, height);
+    std::vector<std::pair<Rgba8, int32_t>> columns;  // each bar's colour and width
     const Rgba8 light = checker.pixel(0, 0);
     int32_t cell = 1;
     while (cell < width && checker.pixel(cell, 0) == light) ++cell;
-    const RgbaImage gradient = generatePattern(Pattern::Gradient, 0, width, height);
-    for (int32_t y = 0; y < height; ++y) {
-      for (int32_t x = 0; x < width; ++x) {
+    for (int32_t x = 0; x < width; ++x) {
+      if (columns.empty() || columns.back().first != bars.pixel(x, 0))
+        columns.push_back({bars.pixel(x, 0), 0});
+      ++columns.back().second;
+      for (int32_t y = 0; y < height; ++y) {
         const Rgba8 square = checker.pixel(x, y), ramp = gradient.pixel(x, y);
+        ASSERT_EQ(bars.pixel(x, y), bars.pixel(x, 0)) << x << "," << y;
         ASSERT_TRUE(square[0] == square[1] && square[1] == square[2]) << "grey";
         ASSERT_EQ(square == light, (x / cell + y / cell) % 2 == 0) << x << "," << y;
         ASSERT_EQ(ramp[2], gradient.pixel(0, 0)[2]);
@@ -78,6 +51,13 @@ TEST(TestPatterns, CheckerAlternatesAndGradientsRiseOverTheWholeRange) {
         ASSERT_LE(ramp[1], gradient.pixel(x, std::max(y - 1, 0))[1]) << "rows count from the top";
       }
     }
+    std::set<Rgba8> colours;
+    for (const auto& [colour, count] : columns) {
+      colours.insert(colour);
+      EXPECT_LE(std::abs(count - width / 7), 1);
+    }
+    EXPECT_EQ(colours.size(), static_cast<size_t>(std::min(width, 7)));
+    EXPECT_EQ(columns.size(), colours.size()) << "no colour comes back further right";
     EXPECT_TRUE(width <= cell || checker.pixel(cell, 0)[0] < light[0]) << "the other is darker";
     if (width > 1 && height > 1) {
       EXPECT_EQ(gradient.pixel(0, height - 1), (Rgba8{0, 0, gradient.pixel(0, 0)[2], 255}));
@@ -85,6 +65,11 @@ TEST(TestPatterns, CheckerAlternatesAndGradientsRiseOverTheWholeRange) {
       EXPECT_EQ(gradient.pixel(0, 0)[1], 255);
     }
   }
+  for (const std::string& name : patternNames())
+    EXPECT_EQ(patternName(*patternFromName(name)), name);
+  EXPECT_FALSE(patternFromName("Bars").has_value());
+  EXPECT_EQ(solidColour({0.5f, 0, 1, 1}, 2, 2).pixel(1, 1), (Rgba8{128, 0, 255, 255}));
+  EXPECT_EQ(solidColour({-1, 2, 0.2f, 0}, 1, 1).pixel(0, 0), (Rgba8{0, 255, 51, 0}));
 }
 
 TEST(TestPatterns, CounterShowsItsFrameInCodeAndDigits) {
