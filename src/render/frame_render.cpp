@@ -141,11 +141,9 @@ FrameGeometry readFrameGeometry(WispHost* host, tagWispAPI* api, const WispRende
   return FrameGeometry{std::move(regions), clipCutSegments(cuts, frameSize)};
 }
 
-// The region pass: the source copied into the composition (the picture wherever no region
-// draws), then every region with its input. Returns the centring matrix the copy moved to the
-// frame centre, which the later passes place their geometry with.
-CentringMatrix composeRegions(WispHost* host, tagWispAPI* api, const RegionList& regions,
-                              const RenderTarget& composition) {
+// The source copied into the composition: the picture wherever no region draws. Returns the
+// centring matrix moved to the frame centre, which every later draw places its geometry with.
+CentringMatrix copySource(WispHost* host, tagWispAPI* api, const RenderTarget& composition) {
   const EffectData& registry = *static_cast<const EffectData*>(api->pluginData);
   const WispRenderContext& context = *static_cast<const WispRenderContext*>(api->renderContext);
   CentringMatrix centring;
@@ -160,8 +158,14 @@ CentringMatrix composeRegions(WispHost* host, tagWispAPI* api, const RegionList&
   setSampling(registry, InputSampling{});
   const TexturedQuad frameQuad = makeFrameQuad(context);
   drawTexturedVertices(api, host, frameQuad.data(), 4, GL_TRIANGLE_STRIP);
-
   setMatrix(registry, shader_ids::kModelViewMatrix, centring.values, true);
+  return centring;
+}
+
+// The region pass: the source, then every region with its input's picture.
+CentringMatrix composeRegions(WispHost* host, tagWispAPI* api, const RegionList& regions,
+                              const RenderTarget& composition) {
+  const CentringMatrix centring = copySource(host, api, composition);
   drawRegions(regions, host, api, centring, composition);
   return centring;
 }
