@@ -243,13 +243,13 @@ class Engine {
   ViewerOutcome pointerMove(int32_t x, int32_t y, bool held);
   ViewerOutcome pointerRelease(int32_t x, int32_t y);
   ViewerOutcome key(uint32_t keysym, bool down);
-  // The host's layer action: asks whether the pointer is over the selected input (1012) and
-  // if so lets the plug-in show its layer menu (1013), answered by the popup answers.
+  // The host's layer action: asks whether the pointer is over the selected input and if so
+  // lets the plug-in show its layer menu (pick layer), answered by the popup answers.
   ViewerOutcome openLayerMenu();
   // The host's undo and redo as viewer events: `steps` steps (fewer when there are fewer).
   ViewerOutcome undoSteps(int32_t steps);
   ViewerOutcome redoSteps(int32_t steps);
-  // Message 1003 drawing into the texture of the given size (colour attachment 0 of the host's
+  // Draw overlay into the texture of the given size (colour attachment 0 of the host's
   // framebuffer, the whole texture as viewport).
   void drawOverlay(uint32_t texture, int32_t width, int32_t height);
   ViewerState viewerState();

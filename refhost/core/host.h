@@ -41,7 +41,7 @@ Matrix4 identityMatrix();
 struct Layer {
   std::string guid;  // 36-character GUID text
   std::string name;
-  int32_t kind = 0;  // layer type; 0, 1, 4, 6 and 7 carry images
+  int32_t kind = kLayerTypeFootage;  // WispLayerType
   int32_t firstFrame = 0;
   int32_t frameCount = 1;
   int32_t width = 1920;
@@ -94,9 +94,9 @@ class Host {
 
   // ---- Messages --------------------------------------------------------------------------
   // Calls Notify and returns its answer. With GL attached the context is made current for
-  // messages 0, 1, 8 and the drawing messages (10, 1003); before drawing the host binds its
-  // framebuffer. After the message, fetched frames not given back are reclaimed and the
-  // resource balance is recorded. Throws std::logic_error without a module.
+  // load, unload, prepare GL and the drawing messages (render, draw overlay); before drawing
+  // the host binds its framebuffer. After the message, fetched frames not given back are
+  // reclaimed and the resource balance is recorded. Throws std::logic_error without a module.
   int32_t send(int32_t message);
   static bool isDrawingMessage(int32_t message) {
     return message == kMessageRender || message == kMessageDrawOverlay;

@@ -28,9 +28,8 @@ int32_t Host::declare(Param param) {
     problem("declaration without an id");
     return 1;
   }
-  // This host reads the flag bit 0x2 as "not in use yet": such a parameter starts disabled
-  // until SetParamEnabled says otherwise.
-  param.enabled = (param.flags & 2) == 0;
+  // A parameter declared not in use starts disabled until SetParamEnabled says otherwise.
+  param.enabled = (param.flags & kParamFlagNotInUse) == 0;
   param.state.value = param.defaultValue;
   std::string id = param.id;
   if (!panel_.add(std::move(param))) {

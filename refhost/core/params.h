@@ -95,8 +95,8 @@ struct Param {
   std::vector<std::string> choices;  // choice, split at '|'
   uint8_t extra = 0;                 // angle: the extra byte, passed on unread
   int group = -1;                    // index into ParamPanel::groups(), -1 at top level
-  // Usable in the panel. The host reads the declared flag bit 0x2 as "not in use yet", so such
-  // a parameter starts disabled; SetParamEnabled decides from then on.
+  // Usable in the panel. A parameter declared with kParamFlagNotInUse starts disabled;
+  // SetParamEnabled decides from then on.
   bool enabled = true;
   ParamState state;
 

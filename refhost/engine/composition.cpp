@@ -104,7 +104,7 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
   Layer own;
   own.guid = composition.ownLayerGuid;
   own.name = composition.ownLayerName;
-  own.kind = 0;
+  own.kind = kLayerTypeFootage;
   own.firstFrame = 0;
   own.frameCount = composition.duration;
   own.width = composition.width;

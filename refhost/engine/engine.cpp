@@ -108,7 +108,7 @@ int32_t Engine::send(int32_t message, void* context, void* event,
   host_->clearMessageHistory();
   host_->clearFrameRequests();
   collectViewerRecords();
-  const std::string what = "message " + std::to_string(message);
+  const std::string what = wispMessageText(message);
   bool accepted = expected.size() == 0;
   for (int32_t value : expected) accepted = accepted || value == result;
   if (!accepted)

@@ -60,8 +60,8 @@ class RenderFrame {
   bool ownsSourceAndOutput_ = true;
 };
 
-// The viewer context of messages 1003 to 1006: no name, the frame size, the scales, the time
-// and the same pixel projection as the render.
+// The viewer context of the overlay and pointer messages: no name, the frame size, the scales,
+// the time and the same pixel projection as the render.
 WispViewerContext makeViewerContext(int32_t width, int32_t height, double viewScaleX,
                                     double viewScaleY, double uiScale, int32_t time);
 

@@ -1,8 +1,8 @@
 // The host's executable defines glGetString, glGetIntegerv and glewInit and exports them, so a
 // loaded plug-in binds to these rather than to the driver's; each forwards to the next
 // definition in the lookup order (the driver, GLEW) unless an override applies. The indexed
-// extension query is a GLEW function pointer, shared with the plug-in through libGLEW, and is
-// replaced after each glewInit.
+// extension query and the shader compile are GLEW function pointers, shared with the plug-in
+// through libGLEW, and are replaced after each glewInit.
 #include "refhost/gl/gl_overrides.h"
 
 #include <GL/glew.h>
@@ -20,6 +20,7 @@ struct State {
   GlOverrides overrides;
   std::vector<std::string> extensions;  // the visible indexed list while active
   PFNGLGETSTRINGIPROC driverGetStringi = nullptr;
+  PFNGLCOMPILESHADERPROC driverCompileShader = nullptr;
 };
 
 State& state() {
@@ -72,6 +73,23 @@ void wireExtensionList(State& s) {
   if (s.driverGetStringi) glGetStringi = s.active ? overriddenGetStringi : s.driverGetStringi;
 }
 
+// Leaves the shader uncompiled, so its compile status stays false as after a compile error.
+void GLAPIENTRY refusedCompileShader(GLuint) {}
+
+// Points GLEW's shader compile at the refusing one while refusals are asked for.
+void wireShaderCompiler(State& s) {
+  if (glCompileShader && glCompileShader != refusedCompileShader)
+    s.driverCompileShader = glCompileShader;
+  if (s.driverCompileShader)
+    glCompileShader =
+        s.active && s.overrides.refuseShaderCompiles ? refusedCompileShader : s.driverCompileShader;
+}
+
+void wireEntryPoints(State& s) {
+  wireExtensionList(s);
+  wireShaderCompiler(s);
+}
+
 }  // namespace
 
 void setGlOverrides(const GlOverrides& overrides) {
@@ -79,7 +97,7 @@ void setGlOverrides(const GlOverrides& overrides) {
   std::lock_guard<std::mutex> lock(s.mutex);
   s.overrides = overrides;
   s.active = true;
-  wireExtensionList(s);
+  wireEntryPoints(s);
 }
 
 void clearGlOverrides() {
@@ -87,7 +105,7 @@ void clearGlOverrides() {
   std::lock_guard<std::mutex> lock(s.mutex);
   s.overrides = GlOverrides{};
   s.active = false;
-  wireExtensionList(s);
+  wireEntryPoints(s);
 }
 
 }  // namespace refhost
@@ -119,8 +137,10 @@ GLenum GLEWAPIENTRY glewInit() {
   const GLenum result = driverGlewInit();
   refhost::State& s = refhost::state();
   std::lock_guard<std::mutex> lock(s.mutex);
-  s.driverGetStringi = nullptr;  // GLEW has just reloaded its pointer from the driver
-  refhost::wireExtensionList(s);
+  // GLEW has just reloaded its pointers from the driver.
+  s.driverGetStringi = nullptr;
+  s.driverCompileShader = nullptr;
+  refhost::wireEntryPoints(s);
   return result;
 }
 

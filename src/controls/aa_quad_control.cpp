@@ -147,7 +147,7 @@ bool AAQuadControl::hoverTest(WispHost* host, tagWispAPI* api, genVec2 frameSize
   api->SetCursor(host, static_cast<int32_t>(chosenCursor));
 
   const bool onPart = choice.part != ControlPart::None;
-  if (pressed && button <= 0.5f && api->GetHostId(host) == kStickyHoverHostId) return onPart;
+  if (pressed && button <= 0.5f && api->GetHostId(host) == kHostProductTouch) return onPart;
   cursor = chosenCursor;
   grabOffset = subtract(choice.feature, p);
   if (choice.part != part) {

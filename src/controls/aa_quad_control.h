@@ -6,6 +6,7 @@
 
 #include "controls/accessors.h"
 #include "controls/control_constants.h"
+#include "host/wisp_protocol.h"
 
 namespace veltrane {
 

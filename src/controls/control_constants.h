@@ -1,5 +1,5 @@
-// Fixed numbers of the on-screen controls: handle placement modes, rectangle parts, the host's
-// cursor shapes and the host whose viewer keeps a pressed control's hover state.
+// Fixed numbers of the on-screen controls: handle placement modes, rectangle parts and the edges
+// a rectangle drag moves. The host's cursor shapes and product codes are in wisp_protocol.h.
 #pragma once
 
 #include <cstdint>
@@ -34,24 +34,5 @@ enum RectEdgeBit : char {
   kEdgeBitY1 = 4,
   kEdgeBitX0 = 8,
 };
-
-// Cursor numbers the host understands. Resize cursors name the axis they move along and
-// rotate cursors the octant of the handle, both with 0 degrees pointing along +y.
-enum class CursorShape : int32_t {
-  Default = 0,
-  Move = 3,
-  Resize0 = 6,  // along 0/180 degrees
-  Resize45 = 7,
-  Resize90 = 8,
-  Resize135 = 9,
-  Rotate0 = 10,  // first of eight, one per octant
-  Rotate315 = 17,
-  InsertCut = 19,
-};
-
-// Host product code of the viewer that keeps hover state through button-up moves of a
-// pressed control, draws every rotation handle highlighted, hides the move arrows and drops
-// the input selection after each release.
-constexpr int32_t kStickyHoverHostId = 3000;
 
 }  // namespace veltrane

@@ -47,7 +47,7 @@ bool SplitScreenCutPositionControl::hoverTest(WispHost* host, tagWispAPI* api, g
   lastPointer = pointer;
   const genVec2 value = getter(host, api, time, frameSize, index);
   const bool keepPressedHover =
-      pressed && button <= 0.5f && api->GetHostId(host) == kStickyHoverHostId;
+      pressed && button <= 0.5f && api->GetHostId(host) == kHostProductTouch;
 
   // Only the open segment counts; a zero-length one gives no t and is never hit.
   const genVec2 along = subtract(segmentEnd, segmentStart);

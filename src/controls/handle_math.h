@@ -5,6 +5,7 @@
 #include "common/glsl_types.h"
 #include "controls/control_constants.h"
 #include "geometry/angles.h"
+#include "host/wisp_protocol.h"
 
 namespace veltrane {
 namespace handle_math {

@@ -1,4 +1,4 @@
-// Message 1003: the on-screen handles drawn over the viewer. Each handle is one quad whose
+// Draw overlay: the on-screen handles drawn over the viewer. Each handle is one quad whose
 // fragment program draws its lines analytically, so handles look the same at every zoom. At
 // most one handle is highlighted per draw: the first hot one in draw order.
 #include "controls/overlay_drawing.h"
@@ -40,7 +40,7 @@ struct OverlayDraw {
   const WispViewerContext& context;
   EffectInstance& instance;
   ViewerMeasures view;
-  bool stickyHover;  // host code 3000: no hover arrows, every rotation handle highlighted
+  bool stickyHover;  // the touch host: no hover arrows, every rotation handle highlighted
   bool anyHot = false;
 
   GLint location(const char* name) const { return registry.uniformLocation(name); }
@@ -277,7 +277,7 @@ int drawOverlay(WispHost* host, tagWispAPI* api) {
                    *context,
                    *instance,
                    viewerMeasuresOf(*context),
-                   api->GetHostId(host) == kStickyHoverHostId};
+                   api->GetHostId(host) == kHostProductTouch};
   const CutLayout layout = readCutLayout(host, api, draw.view.time);
 
   if (!layout.radial)

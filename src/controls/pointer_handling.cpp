@@ -107,7 +107,7 @@ bool shiftInserts(const PointerScene& scene) {
 }
 
 bool stickyHoverHost(const PointerScene& scene) {
-  return scene.api->GetHostId(scene.host) == kStickyHoverHostId;
+  return scene.api->GetHostId(scene.host) == kHostProductTouch;
 }
 
 void setCursor(const PointerScene& scene, CursorShape cursor) {

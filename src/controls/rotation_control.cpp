@@ -57,7 +57,7 @@ bool RotationControl::hoverTest(WispHost* host, tagWispAPI* api, genVec2 centre,
   const float angle = getter(host, api, time);
   const genVec2 d = subtract(pointer, centre);
   const bool keepPressedHover =
-      pressed && button <= 0.5f && api->GetHostId(host) == kStickyHoverHostId;
+      pressed && button <= 0.5f && api->GetHostId(host) == kHostProductTouch;
 
   const HandleGeometry geometry = handleGeometry(radius, viewScale, uiScale);
   if (!geometry.fits) {

@@ -1,5 +1,5 @@
-// The menu lists the layers that carry an image. Layers of kind 4 are offered only from the
-// own layer onwards in host order; choosing the own layer stores the null GUID, which shows the
+// The menu lists the layers that carry an image. Effect layers are offered only from the own
+// layer onwards in host order; choosing the own layer stores the null GUID, which shows the
 // effect's own source. The choice is stored without an undo step of its own.
 #include "effect/layer_picker.h"
 
@@ -17,8 +17,9 @@ namespace {
 
 constexpr int kLayerNameBufferSize = 256;
 
-bool kindCarriesNoImage(int32_t kind) { return kind == 2 || kind == 3 || kind == 5; }
-constexpr int32_t kKindListedAfterOwnLayer = 4;
+bool kindCarriesNoImage(int32_t kind) {
+  return layerTypeIn(static_cast<uint32_t>(kind), kLayerTypesWithoutImage);
+}
 
 }  // namespace
 
@@ -52,7 +53,7 @@ int pickLayerForSelectedInput(WispHost* host, tagWispAPI* api) {
     if (isOwnLayer) ownLayerSeen = true;
     if (std::strcmp(guid, kNullLayerGuid) == 0) continue;
     if (kindCarriesNoImage(kind)) continue;
-    if (kind == kKindListedAfterOwnLayer && !ownLayerSeen) continue;
+    if (kind == kLayerTypeEffect && !ownLayerSeen) continue;
     guids.emplace_back(isOwnLayer ? kNullLayerGuid : guid);
     names.emplace_back(name);
   }

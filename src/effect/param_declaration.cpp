@@ -1,6 +1,6 @@
-// The parameter panel: 69 parameters in 20 groups. Flag bit 2 marks the parameters not in use
-// with the default layout (one Local cut, inputs 0 and 1); 16 and 20 are added to the cut
-// directions and input rotations.
+// The parameter panel: 69 parameters in 20 groups. The not-in-use flag marks the parameters the
+// default layout (one Local cut, inputs 0 and 1) leaves unused; cut directions and input
+// rotations add their angle flags.
 #include "effect/param_declaration.h"
 
 #include <string>
@@ -11,14 +11,20 @@
 namespace veltrane {
 namespace {
 
-constexpr int32_t kPresetFlags = 98;
-constexpr int32_t kGlobalPositionFlags = 1027;
-constexpr int32_t kDirectionFlagExtra = 16;
-constexpr int32_t kRotationFlagExtra = 20;
+// The preset is a placeholder for the host's own presets; the global position is used only by
+// Radial cuts, which the default layout does not have.
+constexpr int32_t kPresetFlags = kParamFlagHostPresets | kParamFlagNotSaved | kParamFlagNotInUse;
+constexpr int32_t kGlobalPositionFlags =
+    kParamFlagHostHandle | kParamFlagNotInUse | kParamFlagAnimated;
 constexpr float kFirstCutDirectionDegrees = 225.0f;
 
-int32_t cutFlags(int cutIndex) { return cutIndex == 0 ? 1 : 3; }
-int32_t inputFlags(int inputIndex) { return inputIndex <= 1 ? 1 : 3; }
+// The default layout uses the first cut and the two inputs on either side of it.
+int32_t cutFlags(int cutIndex) {
+  return cutIndex == 0 ? kParamFlagAnimated : kParamFlagAnimated | kParamFlagNotInUse;
+}
+int32_t inputFlags(int inputIndex) {
+  return inputIndex <= 1 ? kParamFlagAnimated : kParamFlagAnimated | kParamFlagNotInUse;
+}
 
 // Every host call is checked at once: the first refusal stops the declaration.
 void check(int32_t result) {
@@ -42,11 +48,12 @@ class Declarer {
   void declareCuts() {
     check(api_->BeginParamGroup(host_, L"Cuts"));
     const int32_t cutTypeDefault = 0;
-    check(api_->AddChoiceParam(host_, L"Cut Type", param::kCutType, 0, L"Local|Radial",
-                               &cutTypeDefault, 0));
-    check(
-        api_->AddIntParam(host_, L"Number of Cuts", L"", param::kNumberOfCuts, 0, 1, kMaxCuts, 1));
-    check(api_->AddBoolParam(host_, L"View Cut Regions", param::kViewCutRegions, 1, 0));
+    check(api_->AddChoiceParam(host_, L"Cut Type", param::kCutType, kParamFlagsNone,
+                               L"Local|Radial", &cutTypeDefault, 0));
+    check(api_->AddIntParam(host_, L"Number of Cuts", L"", param::kNumberOfCuts, kParamFlagsNone, 1,
+                            kMaxCuts, 1));
+    check(api_->AddBoolParam(host_, L"View Cut Regions", param::kViewCutRegions, kParamFlagAnimated,
+                             0));
     check(api_->AddPointParam(host_, L"Position", param::kCutPositionGlobal, kGlobalPositionFlags,
                               0.0f, 0.0f));
     for (int i = 0; i < kMaxCuts; ++i) {
@@ -56,7 +63,7 @@ class Declarer {
       check(api_->AddPointParam(host_, L"Position", position.c_str(), cutFlags(i), 0.0f, 0.0f));
       const std::string direction = cutParamId(param::kCutDirectionPrefix, i);
       check(api_->AddAngleParam(host_, L"Direction", direction.c_str(),
-                                cutFlags(i) + kDirectionFlagExtra, 1,
+                                cutFlags(i) | kParamFlagsDirection, 1,
                                 i == 0 ? kFirstCutDirectionDegrees : 0.0f));
       check(api_->EndParamGroup(host_));
     }
@@ -82,8 +89,8 @@ class Declarer {
       check(api_->AddFloatParam(host_, L"Scale", L"%", scale.c_str(), flags, 1.0f, 1000.0f, 100.0f,
                                 1));
       const std::string rotation = inputParamId(param::kInputFrameRotationPrefix, j);
-      check(api_->AddAngleParam(host_, L"Rotation", rotation.c_str(), flags + kRotationFlagExtra, 1,
-                                0.0f));
+      check(api_->AddAngleParam(host_, L"Rotation", rotation.c_str(), flags | kParamFlagsRotation,
+                                1, 0.0f));
       check(api_->EndParamGroup(host_));
     }
     check(api_->EndParamGroup(host_));
@@ -91,10 +98,12 @@ class Declarer {
 
   void declareBorder() {
     check(api_->BeginParamGroup(host_, L"Border"));
-    check(
-        api_->AddFloatParam(host_, L"Width", L"px", param::kBorderWidth, 1, 0.0f, 200.0f, 2.0f, 1));
-    check(api_->AddColorParam(host_, L"Color", param::kBorderColor, 1, 0.0f, 0.0f, 0.0f));
-    check(api_->AddFloatParam(host_, L"Alpha", L"", param::kBorderAlpha, 1, 0.0f, 1.0f, 1.0f, 2));
+    check(api_->AddFloatParam(host_, L"Width", L"px", param::kBorderWidth, kParamFlagAnimated, 0.0f,
+                              200.0f, 2.0f, 1));
+    check(api_->AddColorParam(host_, L"Color", param::kBorderColor, kParamFlagAnimated, 0.0f, 0.0f,
+                              0.0f));
+    check(api_->AddFloatParam(host_, L"Alpha", L"", param::kBorderAlpha, kParamFlagAnimated, 0.0f,
+                              1.0f, 1.0f, 2));
     check(api_->EndParamGroup(host_));
   }
 
@@ -105,7 +114,8 @@ class Declarer {
 }  // namespace
 
 bool hostNumbersLayerLabels(int32_t hostId) {
-  return hostId == 5100 || hostId == 5200 || hostId == 5600 || hostId == 6001;
+  return hostId == kHostProductCompositor || hostId == kHostProductCompositorPro ||
+         hostId == kHostProductRenderNode || hostId == kHostProductCompositorPreview;
 }
 
 int declareParameters(WispHost* host, tagWispAPI* api) {

@@ -19,9 +19,9 @@ TextureRecord chooseTemplate(const tagWispAPI& api) {
   const auto* context = static_cast<const WispRenderContext*>(api.renderContext);
   if (context == nullptr) return defaultTemplate();
   switch (api.textureFormatMode) {
-    case 0:
+    case kTextureFormatLikeOutput:
       return context->output;
-    case 2:
+    case kTextureFormatLikeSecond:
       return context->second;
     default:
       return defaultTemplate();

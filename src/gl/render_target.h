@@ -29,8 +29,9 @@ struct RenderTarget {
 };
 
 // Allocates a texture of the template's image size; the template is the render context's output
-// texture (textureFormatMode 0), its second texture (mode 2) or a built-in RGBA default (any
-// other mode, or no render context). `floatFormat` turns an RGBA template into RGBA16F.
+// or second texture as textureFormatMode says (WispTextureFormatMode), or a built-in RGBA
+// default (any other mode, or no render context). `floatFormat` turns an RGBA template into
+// RGBA16F.
 RenderTarget createRenderTarget(WispHost* host, tagWispAPI* api, bool floatFormat);
 
 // Gives an owned texture back to the host once; afterwards the target is empty and borrowed.

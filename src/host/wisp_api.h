@@ -1,52 +1,14 @@
 // The host interface: the record of operations and data a host hands the plug-in with every
-// message, and the fixed-layout records the two sides exchange.
+// message, and the fixed-layout records the two sides exchange. The numbers that travel in
+// them are named in wisp_protocol.h.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 
+#include "host/wisp_protocol.h"
+
 extern "C" {
-
-// The message numbers the host sends through Notify, named once for both sides.
-enum WispMessage : int32_t {
-  kMessageLoad = 0,
-  kMessageUnload = 1,
-  kMessageDeclareParameters = 2,
-  kMessageCreateInstance = 3,
-  kMessageDestroyInstance = 4,
-  kMessageParameterChanged = 7,
-  kMessagePrepareGl = 8,
-  kMessageRender = 10,
-  kMessageRequestFrames = 12,
-  kMessageParameterReport13 = 13,
-  kMessageParameterReport14 = 14,
-  kMessageAcknowledged1001 = 1001,
-  kMessageAcknowledged1002 = 1002,
-  kMessageDrawOverlay = 1003,
-  kMessagePointerMove = 1004,
-  kMessagePointerPress = 1005,
-  kMessagePointerRelease = 1006,
-  kMessageKeyDown = 1007,
-  kMessageKeyUp = 1008,
-  kMessageAcknowledged1009 = 1009,
-  kMessageAcknowledged1010 = 1010,
-  kMessageAcknowledged1011 = 1011,
-  kMessagePointerOverSelection = 1012,
-  kMessagePickLayer = 1013,
-  kMessageCopyInstance = 1014,
-};
-
-// Notify's answers beyond a handler's own 0 and 1.
-enum WispResult : int32_t {
-  kResultNotHandled = 2,  // a message number the plug-in does not know
-  kResultException = 5,   // one of the plug-in's exceptions reached Notify
-};
-
-// X11 keysyms of the keys the plug-in reacts to (messages 1007 and 1008).
-enum WispKey : uint32_t {
-  kKeyLeftShift = 65505,
-  kKeyEscape = 65307,
-};
 
 // Opaque host handle, passed back as the first argument of every host operation.
 typedef struct WispHost WispHost;
@@ -73,7 +35,7 @@ struct TextureRecord {
 // business; the bytes between them are the host's.
 struct LayerState {
   uint8_t hostReserved0[0x28];
-  uint32_t type;       // 0x28
+  uint32_t type;       // 0x28, WispLayerType
   int32_t firstFrame;  // 0x2C
   uint8_t hostReserved1[4];
   int32_t frameCount;  // 0x34
@@ -109,7 +71,7 @@ struct WispViewRecord {
   int32_t timeMs;
 };
 
-// renderContext for the render (10) and frame-request (12) messages.
+// renderContext for the render and request-frames messages.
 struct WispRenderContext {
   TextureRecord source;
   TextureRecord output;
@@ -132,7 +94,7 @@ struct WispRenderContext {
   int32_t layerTimeMs;  // time at which the own layer's state is asked
 };
 
-// renderContext for the viewer messages (1003 to 1006).
+// renderContext for the viewer messages: draw overlay and the three pointer messages.
 struct WispViewerContext {
   const char* name;  // null or empty for the main viewer
   int32_t width;
@@ -144,24 +106,24 @@ struct WispViewerContext {
   float projection[16];
 };
 
-// renderContext for the layer picker (1013): the own layer's GUID text comes first.
+// renderContext for pick layer: the own layer's GUID text comes first.
 struct WispLayerPickerContext {
   const char* ownLayerGuid;
 };
 
-// event for messages 7, 13, 14.
+// event for parameter changed and the two parameter edit messages.
 struct WispParamEvent {
   const char* id;
 };
 
-// event for messages 1004 to 1006: corner-space pointer position and button (> 0.5 held).
+// event for the pointer messages: corner-space pointer position and button (> 0.5 held).
 struct WispPointerEvent {
   int32_t x;
   int32_t y;
   double button;
 };
 
-// event for messages 1007 and 1008 (X11 keysym numbering).
+// event for key down and key up (X11 keysym numbering, WispKey).
 struct WispKeyEvent {
   uint32_t keyCode;
 };

@@ -24,7 +24,7 @@ void destroyEffectData(void* effectData) { delete static_cast<EffectData*>(effec
 // Any exception or machine fault while destroying the registry answers 2; the slot is cleared
 // either way, since a half-destroyed registry cannot be destroyed again.
 int32_t unloadPlugin(tagWispAPI* api) {
-  int32_t result = 1;
+  int32_t result = kResultDone;
   if (api->pluginData) {
     try {
       if (!runCatchingMachineFaults(destroyEffectData, api->pluginData)) result = kResultNotHandled;
@@ -50,17 +50,17 @@ int32_t handle(WispHost* host, tagWispAPI* api, int32_t message) {
   switch (message) {
     case kMessageLoad:
       api->pluginData = static_cast<EffectData*>(new EffectData());
-      return 1;
+      return kResultDone;
     case kMessageUnload:
       return unloadPlugin(api);
     case kMessageDeclareParameters:
       return declareParameters(host, api);
     case kMessageCreateInstance:
       createInstance(api);
-      return 1;
+      return kResultDone;
     case kMessageDestroyInstance:
       destroyInstance(api);
-      return 1;
+      return kResultDone;
     case kMessageParameterChanged:
       return onParameterChanged(host, api, eventParameterId(api));
     case kMessagePrepareGl:
@@ -69,11 +69,11 @@ int32_t handle(WispHost* host, tagWispAPI* api, int32_t message) {
       return renderFrame(host, api);
     case kMessageRequestFrames:
       return requestFrames(host, api);
-    case kMessageParameterReport13:
-    case kMessageParameterReport14:
-    case kMessageAcknowledged1001:
-    case kMessageAcknowledged1002:
-      return 1;
+    case kMessageParameterEditBegan:
+    case kMessageParameterEditEnded:
+    case kMessageViewerOpened:
+    case kMessageViewerClosed:
+      return kResultDone;
     case kMessageDrawOverlay:
       return drawOverlay(host, api);
     case kMessagePointerMove: {
@@ -88,19 +88,19 @@ int32_t handle(WispHost* host, tagWispAPI* api, int32_t message) {
       return onKeyDown(host, api, eventKeyCode(api));
     case kMessageKeyUp:
       return onKeyUp(host, api, eventKeyCode(api));
-    case kMessageAcknowledged1009:
-    case kMessageAcknowledged1010:
-    case kMessageAcknowledged1011:
-      return 0;
+    case kMessagePointerEntered:
+    case kMessagePointerLeft:
+    case kMessageDoubleClick:
+      return kResultNotDone;
     case kMessagePointerOverSelection: {
       const EffectInstance* instance = instanceOf(api);
-      return instance ? pointerOverSelectedInput(*instance) : 0;
+      return instance ? pointerOverSelectedInput(*instance) : kResultNotDone;
     }
     case kMessagePickLayer:
       return pickLayerForSelectedInput(host, api);
     case kMessageCopyInstance:
       copyInstance(api, static_cast<const EffectInstance*>(api->renderContext));
-      return 0;
+      return kResultNotDone;
     default:
       return kResultNotHandled;
   }

@@ -1,5 +1,5 @@
 // Message dispatch: decodes a host message, runs its handler and turns the plug-in's own
-// exceptions into result 5.
+// exceptions into the exception result.
 #pragma once
 
 #include "host/wisp_api.h"

@@ -5,6 +5,7 @@
 
 #include <GL/glew.h>
 
+#include <utility>
 #include <vector>
 
 #include "common/param_ids.h"
@@ -38,16 +39,27 @@ struct CentringMatrix {
   }
 };
 
-// The clear colour belongs to the host: it is put back however the render ends.
+// The clear colour belongs to the host: it is put back however the render ends. The render
+// starts from a transparent clear.
 class ClearColourGuard {
  public:
-  ClearColourGuard() { glGetFloatv(GL_COLOR_CLEAR_VALUE, saved_); }
+  ClearColourGuard() {
+    glGetFloatv(GL_COLOR_CLEAR_VALUE, saved_);
+    glClearColor(0.0f, 0.0f, 0.0f, 0.0f);
+  }
   ~ClearColourGuard() { glClearColor(saved_[0], saved_[1], saved_[2], saved_[3]); }
   ClearColourGuard(const ClearColourGuard&) = delete;
   ClearColourGuard& operator=(const ClearColourGuard&) = delete;
 
  private:
   GLfloat saved_[4];
+};
+
+// What the passes draw, built from the parameters before any GL call: the regions and the
+// visible segment of every cut.
+struct FrameGeometry {
+  RegionList regions;
+  std::vector<CutSegment> segments;
 };
 
 void setMatrix(const EffectData& registry, const char* name, const float* values, bool transpose) {
@@ -119,45 +131,50 @@ void drawRegions(const RegionList& regions, WispHost* host, tagWispAPI* api,
   }
 }
 
-}  // namespace
-
-int renderFrame(WispHost* host, tagWispAPI* api) {
-  if (!api->renderContext || !programsBuilt(static_cast<const EffectData*>(api->pluginData)))
-    return 1;
-  const WispRenderContext& context = *static_cast<const WispRenderContext*>(api->renderContext);
-  // A frame without pixels has nothing to show, and a target of its size could not even be
-  // drawn into: an empty texture leaves the framebuffer incomplete.
-  if (context.width <= 0 || context.height <= 0) return 1;
-  const EffectData& registry = *static_cast<const EffectData*>(api->pluginData);
+FrameGeometry readFrameGeometry(WispHost* host, tagWispAPI* api, const WispRenderContext& context) {
   const genVec2 frameSize{static_cast<float>(context.width), static_cast<float>(context.height)};
-
   const CutList cuts = readCutList(host, api, context.time, frameSize, context.hasPixelAspect != 0,
                                    context.pixelAspect);
   const int32_t cutType = api->GetChoiceParam(host, param::kCutType, 0);
   // The partition starts from a cut; with none the frame shows the plain source.
-  const RegionList regions = cuts.empty() ? RegionList{} : partitionFrame(cuts, frameSize, cutType);
-  const std::vector<CutSegment> segments = clipCutSegments(cuts, frameSize);
+  RegionList regions = cuts.empty() ? RegionList{} : partitionFrame(cuts, frameSize, cutType);
+  return FrameGeometry{std::move(regions), clipCutSegments(cuts, frameSize)};
+}
 
-  RenderTarget composition = createRenderTarget(host, api, false);
-  ClearColourGuard clearColour;
-  glClearColor(0.0f, 0.0f, 0.0f, 0.0f);
+// The source copied into the composition: the picture wherever no region draws. Returns the
+// centring matrix moved to the frame centre, which every later draw places its geometry with.
+CentringMatrix copySource(WispHost* host, tagWispAPI* api, const RenderTarget& composition) {
+  const EffectData& registry = *static_cast<const EffectData*>(api->pluginData);
+  const WispRenderContext& context = *static_cast<const WispRenderContext*>(api->renderContext);
   CentringMatrix centring;
-
-  // The source copied into the composition: the picture wherever no region draws.
   attachRenderTarget(composition.texture, 0, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
   registry.useProgramAt(programs::kSplitScreenIndex);
   glClear(GL_COLOR_BUFFER_BIT);
   setMatrix(registry, shader_ids::kProjectionMatrix, context.projection, false);
   setMatrix(registry, shader_ids::kModelViewMatrix, centring.values, true);
-  centring.translate(frameSize.x / 2.0f, frameSize.y / 2.0f);
+  centring.translate(static_cast<float>(context.width) / 2.0f,
+                     static_cast<float>(context.height) / 2.0f);
   setSourceTexture(registry, context.source);
   setSampling(registry, InputSampling{});
   const TexturedQuad frameQuad = makeFrameQuad(context);
   drawTexturedVertices(api, host, frameQuad.data(), 4, GL_TRIANGLE_STRIP);
-
   setMatrix(registry, shader_ids::kModelViewMatrix, centring.values, true);
-  drawRegions(regions, host, api, centring, composition);
+  return centring;
+}
 
+// The region pass: the source, then every region with its input's picture.
+CentringMatrix composeRegions(WispHost* host, tagWispAPI* api, const RegionList& regions,
+                              const RenderTarget& composition) {
+  const CentringMatrix centring = copySource(host, api, composition);
+  drawRegions(regions, host, api, centring, composition);
+  return centring;
+}
+
+// The distance field: every pixel keeps, by MIN blending, its distance to the nearest cut
+// segment in units of the border's reach, or 1 where no mesh reaches.
+RenderTarget drawDistanceField(WispHost* host, tagWispAPI* api, const CentringMatrix& centring,
+                               const std::vector<CutSegment>& segments) {
+  const WispRenderContext& context = *static_cast<const WispRenderContext*>(api->renderContext);
   RenderTarget distance = createRenderTarget(host, api, false);
   attachRenderTarget(distance.texture, 0, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
   glClearColor(1.0f, 1.0f, 1.0f, 0.0f);
@@ -173,9 +190,19 @@ int renderFrame(WispHost* host, tagWispAPI* api) {
   glBlendFunc(GL_ONE, GL_ONE);
   glDisable(GL_BLEND);
   glClearColor(0.0f, 0.0f, 0.0f, 0.0f);
+  return distance;
+}
 
+// The border combine: the composition into the host's output, with the border colour laid
+// over it wherever the distance field says a pixel lies within half the border width.
+void combineBorder(WispHost* host, tagWispAPI* api, const RenderTarget& composition,
+                   const RenderTarget& distance) {
+  const EffectData& registry = *static_cast<const EffectData*>(api->pluginData);
+  const WispRenderContext& context = *static_cast<const WispRenderContext*>(api->renderContext);
   attachRenderTarget(context.output, 0, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D);
   glClear(GL_COLOR_BUFFER_BIT);
+  // borderWidth is asked again rather than handed over from the distance pass: hosts get the
+  // same reads, in the same order, from every render of this effect, and this is the second.
   const float borderWidth = api->GetFloatParam(host, param::kBorderWidth, context.time);
   float colour[4] = {0.0f, 0.0f, 0.0f, 1.0f};
   api->GetColorParam(host, param::kBorderColor, context.time, &colour[0], &colour[1], &colour[2]);
@@ -193,14 +220,37 @@ int renderFrame(WispHost* host, tagWispAPI* api) {
   registry.setUniform1f(registry.uniformLocation(shader_ids::kBorderHalfWidth), borderWidth * 0.5f);
   registry.setUniform4f(registry.uniformLocation(shader_ids::kBorderColour), colour[0] * alpha,
                         colour[1] * alpha, colour[2] * alpha, colour[3] * alpha);
-  const TexturedQuad outputQuad = makeTextureQuad(composition.texture, frameSize.x, frameSize.y);
+  const TexturedQuad outputQuad = makeTextureQuad(
+      composition.texture, static_cast<float>(context.width), static_cast<float>(context.height));
   drawTexturedVertices(api, host, outputQuad.data(), 4, GL_TRIANGLE_STRIP);
+}
 
+// Leaves unit 1 empty and unit 0 holding the source with nearest filtering, no program in use.
+void resetTextureUnits(const EffectData& registry, const WispRenderContext& context) {
   unbindTextureUnit(GL_TEXTURE1, GL_TEXTURE_2D, true);
   setTextureUnitNearest(GL_TEXTURE0, GL_TEXTURE_2D, true);
   bindTextureUnit(GL_TEXTURE0, GL_TEXTURE_2D, context.source.id, true);
   setTextureUnitNearest(GL_TEXTURE0, GL_TEXTURE_2D, true);
   registry.releaseProgram();
+}
+
+}  // namespace
+
+int renderFrame(WispHost* host, tagWispAPI* api) {
+  if (!api->renderContext || !programsBuilt(static_cast<const EffectData*>(api->pluginData)))
+    return 1;
+  const WispRenderContext& context = *static_cast<const WispRenderContext*>(api->renderContext);
+  // A frame without pixels has nothing to show, and a target of its size could not even be
+  // drawn into: an empty texture leaves the framebuffer incomplete.
+  if (context.width <= 0 || context.height <= 0) return 1;
+  const FrameGeometry geometry = readFrameGeometry(host, api, context);
+
+  RenderTarget composition = createRenderTarget(host, api, false);
+  ClearColourGuard clearColour;
+  const CentringMatrix centring = composeRegions(host, api, geometry.regions, composition);
+  RenderTarget distance = drawDistanceField(host, api, centring, geometry.segments);
+  combineBorder(host, api, composition, distance);
+  resetTextureUnits(*static_cast<const EffectData*>(api->pluginData), context);
 
   releaseRenderTarget(distance);
   // Leaving the scope restores the clear colour and then gives the composition back, in that

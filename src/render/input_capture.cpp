@@ -69,7 +69,7 @@ const char* ownLayerGuid(const WispRenderContext& context) {
 
 void ownLayerFallback(const WispRenderContext& context, LayerState& state) {
   std::memset(&state, 0, sizeof state);
-  state.type = 4;
+  state.type = kLayerTypeEffect;
   state.frameCount = 1;
   state.width = context.width;
   state.height = context.height;
@@ -140,7 +140,7 @@ bool captureLayerFrame(WispHost* host, tagWispAPI* api, const WispRenderContext&
                                   ? currentTimeMs
                                   : timeOfFrame(static_cast<int32_t>(frame), rate);
     const int32_t status = getLayerState(host, api, context, guid, stateTime, chosen, true);
-    if (status != 0 || !layerTypeIn(chosen.type, kImageLayerTypes)) {
+    if (status != 0 || !layerTypeIn(chosen.type, kLayerTypesWithImage)) {
       chooseOwnLayer();
     } else {
       const int64_t frameInLayer = frame - chosen.firstFrame;

@@ -45,8 +45,6 @@ void setFlatDefault(WispHost* host, tagWispAPI* api, const WispRenderContext& co
 
 }  // namespace
 
-bool layerTypeIn(uint32_t type, uint32_t mask) { return type < 32 && ((mask >> type) & 1u); }
-
 double compositionFrameRate(WispHost* host, tagWispAPI* api) {
   WispTimeInfo info{0, 0, kDefaultFrameRate};
   if (api->GetTimeInfo(host, &info) != 0) return kDefaultFrameRate;
@@ -76,9 +74,10 @@ int32_t getLayerState(WispHost* host, tagWispAPI* api, const WispRenderContext& 
       flattenMatrix(state.secondMatrix);
     } else {
       intoLayerSpace(state.placement, context);
-      if (state.type == 1 || state.type == 7) intoLayerSpace(state.secondMatrix, context);
+      if (layerTypeIn(state.type, kLayerTypesWithSecondMatrix))
+        intoLayerSpace(state.secondMatrix, context);
     }
-    if (!(flat && layerTypeIn(state.type, kFlattenedLayerTypes))) return status;
+    if (!(flat && layerTypeIn(state.type, kLayerTypesFlattened))) return status;
   }
   setFlatDefault(host, api, context, state);
   return status;

@@ -7,12 +7,6 @@
 
 namespace veltrane {
 
-// Layer types that carry an image, and those replaced by a flat default when a flat state is
-// asked for, as bit masks over the type number.
-constexpr uint32_t kImageLayerTypes = 0xD3;
-constexpr uint32_t kFlattenedLayerTypes = 0xD2;
-bool layerTypeIn(uint32_t type, uint32_t mask);
-
 // The composition frame rate; 25 when the host cannot say.
 double compositionFrameRate(WispHost* host, tagWispAPI* api);
 int32_t frameOfTime(double milliseconds, double frameRate);

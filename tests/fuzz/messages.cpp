@@ -1,8 +1,9 @@
 // Fuzzes the message boundary as a hostile host would drive it: the reference host loads the
-// module and sends messages 0 to 14 and 1001 to 1014 in any order, with zero-size and odd
-// frames, NaN, infinite and huge numbers in its records and parameters, null events and failing
-// host operations. Any crash, escaping exception, GL error, answer outside the message's set or
-// texture or buffer left with the plug-in after a message stops the run.
+// module and sends every number of the protocol's two message ranges, named or not, in any
+// order, with zero-size and odd frames, NaN, infinite and huge numbers in its records and
+// parameters, null events and failing host operations. Any crash, escaping exception, GL error,
+// answer outside the message's set or texture or buffer left with the plug-in after a message stops
+// the run.
 #include <fuzzer/FuzzedDataProvider.h>
 
 #include <algorithm>
@@ -10,6 +11,7 @@
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
+#include <initializer_list>
 #include <memory>
 #include <string>
 #include <vector>
@@ -24,25 +26,33 @@ namespace {
 const char* const kGuids[] = {"aaaaaaaa-0000-4000-8000-000000000001",
                               "5ec0a11e-0000-4000-8000-000000000001", refhost::kNoLayer, "zz", ""};
 
-// Bit n set: the message may answer n. A program exception (5) only where a host call can
-// fail; every message not listed answers 1.
-const struct {
-  int32_t message;
-  uint32_t answers;
-} kAnswers[] = {{1, 0b110},   {2, 0b100010}, {8, 0b100010}, {5, 0b100},   {6, 0b100},
-                {9, 0b100},   {11, 0b100},   {1004, 0b11},  {1005, 0b11}, {1006, 0b11},
-                {1007, 0b11}, {1008, 0b11},  {1012, 0b11},  {1013, 0b11}, {1009, 0b1},
-                {1010, 0b1},  {1011, 0b1},   {1014, 0b1}};
+constexpr uint32_t answer(WispResult result) { return 1u << result; }
 
-bool answerAllowed(int32_t message, int32_t result) {
-  uint32_t answers = 0b10;
-  for (const auto& entry : kAnswers) answers = entry.message == message ? entry.answers : answers;
-  return result >= 0 && result < 32 && (answers >> result & 1) != 0;
+// The answers a message may give: the program exception only where a host call can fail; an
+// unnamed number is not handled, and every message not listed here answers done.
+uint32_t allowedAnswers(int32_t message) {
+  const auto among = [message](std::initializer_list<int32_t> messages) {
+    return std::find(messages.begin(), messages.end(), message) != messages.end();
+  };
+  if (!wispMessageName(message)) return answer(kResultNotHandled);
+  if (message == kMessageUnload) return answer(kResultDone) | answer(kResultNotHandled);
+  if (among({kMessageDeclareParameters, kMessagePrepareGl}))
+    return answer(kResultDone) | answer(kResultException);
+  if (among({kMessagePointerMove, kMessagePointerPress, kMessagePointerRelease, kMessageKeyDown,
+             kMessageKeyUp, kMessagePointerOverSelection, kMessagePickLayer}))
+    return answer(kResultNotDone) | answer(kResultDone);
+  if (among(
+          {kMessagePointerEntered, kMessagePointerLeft, kMessageDoubleClick, kMessageCopyInstance}))
+    return answer(kResultNotDone);
+  return answer(kResultDone);
 }
 
-[[noreturn]] void fail(const testsupport::InstrumentedHost& host, int32_t message,
-                       const std::string& what) {
-  std::fprintf(stderr, "message %d: %s; its host calls:\n", message, what.c_str());
+bool answerAllowed(int32_t message, int32_t result) {
+  return result >= 0 && result < 32 && (allowedAnswers(message) >> result & 1) != 0;
+}
+
+[[noreturn]] void fail(const testsupport::InstrumentedHost& host, int32_t message, const std::string& what) {
+  std::fprintf(stderr, "%s: %s; its host calls:\n", wispMessageText(message).c_str(), what.c_str());
   for (const std::string& call : host.callLog()) std::fprintf(stderr, "  %s\n", call.c_str());
   std::abort();
 }
@@ -102,7 +112,7 @@ class Session {
     api.instanceData = instance;
     api.pluginData = registry;
     warm_.gl->clearErrors();
-    grown_ = grown_ || (message == 8 && registry == warm_.registry);
+    grown_ = grown_ || (message == kMessagePrepareGl && registry == warm_.registry);
     int32_t result = host_.send(message);
     if (!answerAllowed(message, result)) fail(host_, message, "answered " + std::to_string(result));
     if (host_.outstandingTextures() != 0 || host_.outstandingBuffers() != 0)
@@ -112,10 +122,10 @@ class Session {
     auto forget = [](std::vector<void*>& list, void* item) {
       list.erase(std::remove(list.begin(), list.end(), item), list.end());
     };
-    if (message == 0) registries_.push_back(api.pluginData);
-    if (message == 1) forget(registries_, registry);
-    if (message == 3) instances_.push_back(api.instanceData);
-    if (message == 4) forget(instances_, instance);
+    if (message == kMessageLoad) registries_.push_back(api.pluginData);
+    if (message == kMessageUnload) forget(registries_, registry);
+    if (message == kMessageCreateInstance) instances_.push_back(api.instanceData);
+    if (message == kMessageDestroyInstance) forget(instances_, instance);
     registry_ = api.pluginData;
     host_.clearCallLog();
     return result;
@@ -131,11 +141,18 @@ class Session {
 };
 
 void configureHost(FuzzedDataProvider& data, testsupport::InstrumentedHost& host) {
-  const int32_t hostIds[] = {0, 3000, 5100, 5200, 5600, 6001, -1};
+  const int32_t hostIds[] = {0,
+                             kHostProductTouch,
+                             kHostProductCompositor,
+                             kHostProductCompositorPro,
+                             kHostProductRenderNode,
+                             kHostProductCompositorPreview,
+                             -1};
   host.setHostId(data.PickValueInArray(hostIds));
   // Other modes ask for a target of the built-in template's size, 0 x 0, which a host that
   // allocates exactly the sizes asked (as this one does) cannot draw into.
-  host.setTextureFormatMode(data.ConsumeBool() ? 0 : 2);
+  host.setTextureFormatMode(data.ConsumeBool() ? kTextureFormatLikeOutput
+                                               : kTextureFormatLikeSecond);
   host.setTimeInfo(hostileInt(data, 0, 96), hostileInt(data, 0, 96), hostileFloat(data));
   for (int i = data.ConsumeIntegralInRange(0, 3); i > 0; --i) {
     refhost::Layer layer;
@@ -174,8 +191,11 @@ void editParameter(FuzzedDataProvider& data, testsupport::InstrumentedHost& host
 // Sends one message with records of the kind it takes, filled with hostile values.
 void sendMessage(FuzzedDataProvider& data, Session& session) {
   testsupport::InstrumentedHost& host = session.host();
-  const int32_t message = data.ConsumeBool() ? data.ConsumeIntegralInRange(0, 14)
-                                             : data.ConsumeIntegralInRange(1001, 1014);
+  // The two ranges the protocol numbers its messages in, gaps included.
+  const int32_t message =
+      data.ConsumeBool()
+          ? data.ConsumeIntegralInRange<int32_t>(kMessageLoad, kMessageParameterEditEnded)
+          : data.ConsumeIntegralInRange<int32_t>(kMessageViewerOpened, kMessageCopyInstance);
   const std::vector<void*>& instances = session.instances();
   void* instance = instances.empty() || data.ConsumeProbability<float>() < 0.05f
                        ? nullptr
@@ -187,8 +207,8 @@ void sendMessage(FuzzedDataProvider& data, Session& session) {
           : params[data.ConsumeIntegralInRange<size_t>(0, params.size() - 1)].id.c_str()};
   WispPointerEvent pointer{hostileInt(data, -20, 100), hostileInt(data, -20, 100),
                            data.ConsumeBool() ? 1.0 : static_cast<double>(hostileFloat(data))};
-  WispKeyEvent key{data.ConsumeBool()   ? 65505u
-                   : data.ConsumeBool() ? 65307u
+  WispKeyEvent key{data.ConsumeBool()   ? kKeyLeftShift
+                   : data.ConsumeBool() ? kKeyEscape
                                         : data.ConsumeIntegral<uint32_t>()};
   const int32_t width = data.ConsumeIntegralInRange(0, 64);
   const int32_t height = data.ConsumeIntegralInRange(0, 64);
@@ -202,17 +222,21 @@ void sendMessage(FuzzedDataProvider& data, Session& session) {
   WispLayerPickerContext picker{data.PickValueInArray(kGuids)};
   void* context = nullptr;
   void* event = nullptr;
-  if (message == 7 || message == 13 || message == 14) event = &param;
-  if (message >= 1003 && message <= 1006) context = &viewer;
-  if (message >= 1004 && message <= 1006) event = &pointer;
-  if (message == 1007 || message == 1008) event = &key;
-  if (message == 1013) {
+  if (message == kMessageParameterChanged || message == kMessageParameterEditBegan ||
+      message == kMessageParameterEditEnded)
+    event = &param;
+  const bool pointerMessage = message == kMessagePointerMove || message == kMessagePointerPress ||
+                              message == kMessagePointerRelease;
+  if (message == kMessageDrawOverlay || pointerMessage) context = &viewer;
+  if (pointerMessage) event = &pointer;
+  if (message == kMessageKeyDown || message == kMessageKeyUp) event = &key;
+  if (message == kMessagePickLayer) {
     context = &picker;
     host.queuePopupAnswer(hostileInt(data, -1, 4));
   }
-  if (message == 1014 && !instances.empty())
+  if (message == kMessageCopyInstance && !instances.empty())
     context = instances[data.ConsumeIntegralInRange<size_t>(0, instances.size() - 1)];
-  if (message == 10 || message == 12) {
+  if (message == kMessageRender || message == kMessageRequestFrames) {
     frame = std::make_unique<refhost::RenderFrame>(host, settings, hostileInt(data, -2, 10));
     WispRenderContext& render = frame->context();
     render.hasPixelAspect = data.ConsumeBool();
@@ -225,7 +249,8 @@ void sendMessage(FuzzedDataProvider& data, Session& session) {
   // The overlay is drawn over the viewer's picture, which has pixels whatever the frame size.
   const int32_t pictureWidth = data.ConsumeIntegralInRange(1, 64);
   const int32_t pictureHeight = data.ConsumeIntegralInRange(1, 64);
-  const uint32_t picture = message == 1003 ? host.createTexture(pictureWidth, pictureHeight).id : 0;
+  const uint32_t picture =
+      message == kMessageDrawOverlay ? host.createTexture(pictureWidth, pictureHeight).id : 0;
   host.setDrawTarget(picture, pictureWidth, pictureHeight);
   host.setRenderContext(context);
   host.setEvent(event);

@@ -161,19 +161,4 @@ TEST(FrameRender, InputPlacementMovesAndScalesThePicture) {
   EXPECT_EQ(fixture.pixel(wide, 58, 18), kClear);
 }
 
-TEST(FrameRender, CoreAndCompatibilityProfilesDrawTheSameImage) {
-  auto renderWith = [](refhost::GlProfile profile) {
-    RenderFixture fixture(profile);
-    testsupport::InstrumentedHost& host = fixture.host();
-    host.setValue("numberOfCuts", ParamValue::ofInt(3));
-    setCut(host, 0, 3.0f, -2.0f, 20.0f);
-    setCut(host, 1, -10.0f, 5.0f, 100.0f);
-    setCut(host, 2, 12.0f, 8.0f, -60.0f);
-    host.setValue("borderWidth", ParamValue::ofFloat(5.0f));
-    host.setValue("borderColor", ParamValue::ofColor(0.2f, 0.9f, 0.4f));
-    return fixture.render({200, 30, 90, 255});
-  };
-  EXPECT_EQ(renderWith(refhost::GlProfile::Core), renderWith(refhost::GlProfile::Compatibility));
-}
-
 }  // namespace

@@ -38,11 +38,11 @@ class LayerPicker : public LoadedPlugin {
 };
 
 TEST_F(LayerPicker, OffersImageLayersAndStoresTheChoiceWithoutAnUndoStep) {
-  host().addLayer(layer("aaaaaaaa-0000-4000-8000-000000000001", "A", 0));
-  host().addLayer(layer(kOwn, "Own", 0));
-  host().addLayer(layer("bbbbbbbb-0000-4000-8000-000000000002", "B", 4));
-  host().addLayer(layer("dddddddd-0000-4000-8000-000000000004", "D", 2));
-  host().addLayer(layer("eeeeeeee-0000-4000-8000-000000000005", "", 7));
+  host().addLayer(layer("aaaaaaaa-0000-4000-8000-000000000001", "A", kLayerTypeFootage));
+  host().addLayer(layer(kOwn, "Own", kLayerTypeFootage));
+  host().addLayer(layer("bbbbbbbb-0000-4000-8000-000000000002", "B", kLayerTypeEffect));
+  host().addLayer(layer("dddddddd-0000-4000-8000-000000000004", "D", kLayerTypeAudio));
+  host().addLayer(layer("eeeeeeee-0000-4000-8000-000000000005", "", kLayerTypeModel));
   selectInputOne();
   const size_t stepsBefore = host().undoStepNames().size();
   const size_t bracketsBefore = host().callsTo("BeginUndo").size();
@@ -62,16 +62,16 @@ TEST_F(LayerPicker, OffersImageLayersAndStoresTheChoiceWithoutAnUndoStep) {
   EXPECT_EQ(host().callsTo("BeginUndo").size(), bracketsBefore);
 }
 
-TEST_F(LayerPicker, LayersOfKindFourBeforeTheOwnLayerAreNotOffered) {
-  host().addLayer(layer("bbbbbbbb-0000-4000-8000-000000000002", "B", 4));
-  host().addLayer(layer(kOwn, "Own", 0));
+TEST_F(LayerPicker, EffectLayersBeforeTheOwnLayerAreNotOffered) {
+  host().addLayer(layer("bbbbbbbb-0000-4000-8000-000000000002", "B", kLayerTypeEffect));
+  host().addLayer(layer(kOwn, "Own", kLayerTypeFootage));
   selectInputOne();
   EXPECT_EQ(pick(0), 1);
   EXPECT_EQ(host().popupMenus().back(), "Own");
 }
 
 TEST_F(LayerPicker, DeclinesWithoutASelectionUnderThePointer) {
-  host().addLayer(layer(kOwn, "Own", 0));
+  host().addLayer(layer(kOwn, "Own", kLayerTypeFootage));
   EXPECT_EQ(pick(0), 0);
   EXPECT_TRUE(host().popupMenus().empty());
   EXPECT_TRUE(host().callsTo("GetLayerCount").empty());

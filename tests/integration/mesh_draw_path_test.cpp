@@ -9,7 +9,7 @@ namespace {
 using refhost::ParamValue;
 
 // Element buffers acquired during one render: one per mesh with restart, one per strip or fan
-// without. One cut has one strip and two cap fans.
+// without. Each cut has one strip and two cap fans.
 size_t elementBuffers(testsupport::InstrumentedHost& host) {
   size_t count = 0;
   for (const std::string& line : host.callsTo("AcquireBuffer"))
@@ -28,7 +28,7 @@ TEST(MeshDrawPath, RestartFollowsTheExtensionListAndTheChip) {
       {"Intel HD 4000",
        refhost::GlProfile::Compatibility,
        {std::string("Intel"), std::string("Intel(R) HD Graphics 4000"), {}},
-       3},
+       9},
       {"Intel HD 4600",
        refhost::GlProfile::Compatibility,
        {std::string("Intel"), std::string("Intel(R) HD Graphics 4600"), {}},
@@ -36,8 +36,8 @@ TEST(MeshDrawPath, RestartFollowsTheExtensionListAndTheChip) {
       {"extension hidden",
        refhost::GlProfile::Compatibility,
        {std::nullopt, std::nullopt, {"GL_NV_primitive_restart"}},
-       3},
-      {"core profile lacks the extension", refhost::GlProfile::Core, {}, 3},
+       9},
+      {"core profile lacks the extension", refhost::GlProfile::Core, {}, 9},
   };
   std::vector<uint8_t> reference;
   for (const auto& row : table) {
@@ -45,11 +45,14 @@ TEST(MeshDrawPath, RestartFollowsTheExtensionListAndTheChip) {
     refhost::ScopedGlOverrides overrides(row.overrides);
     RenderFixture fixture(row.profile);
     testsupport::InstrumentedHost& host = fixture.host();
-    setCut(host, 0, 3.0f, -4.0f, 30.0f);
+    host.setValue("numberOfCuts", ParamValue::ofInt(3));
+    setCut(host, 0, 3.0f, -2.0f, 20.0f);
+    setCut(host, 1, -10.0f, 5.0f, 100.0f);
+    setCut(host, 2, 12.0f, 8.0f, -60.0f);
     host.setValue("borderWidth", ParamValue::ofFloat(5.0f));
-    host.setValue("borderColor", ParamValue::ofColor(1.0f, 1.0f, 1.0f));
+    host.setValue("borderColor", ParamValue::ofColor(0.2f, 0.9f, 0.4f));
     host.clearCallLog();
-    const std::vector<uint8_t> pixels = fixture.render({20, 40, 60, 255});
+    const std::vector<uint8_t> pixels = fixture.render({200, 30, 90, 255});
     EXPECT_EQ(elementBuffers(host), row.expectedElementBuffers);
     if (reference.empty()) reference = pixels;
     EXPECT_EQ(pixels, reference);

@@ -1,5 +1,9 @@
-// The parameter panel the module declares, read back from the host: every parameter's id,
-// name, kind, flags, default and range, the group nesting, refusals and the layer labels.
+// The parameter panel the module declares, read back from the host and checked against the
+// declaration's rules rather than a copy of it: ids built from their stems, the groups they sit
+// in, the flags (not in use exactly where the default layout leaves a parameter unused, the
+// angle flags), defaults within ranges, refusals and the layer labels per host product.
+#include <set>
+
 #include "loaded_plugin.h"
 #include "support/instrumented_host.h"
 
@@ -7,55 +11,80 @@ namespace {
 
 using refhost::ParamKind;
 
-struct Expected {
-  std::string id;
+constexpr int kCuts = 8;
+constexpr int kInputs = 9;
+constexpr int32_t kAnimated = kParamFlagAnimated;
+
+// Where the declaration puts a parameter: once at the top, in "Cuts" or in "Border", or once per
+// cut ("cutPosition_3" in "Cut 4") or per input ("inputLayer3" in "Input 3").
+enum class Place { Top, Cuts, PerCut, PerInput, Border };
+
+// What the declaration says of one parameter, or of every parameter with one stem.
+struct Rule {
+  Place place;
+  std::string stem;
   std::string displayName;
   ParamKind kind;
-  int32_t flags;
-  std::string defaultText;  // formatted as the host formats values
-  double minimum = 0;
-  double maximum = 0;
-  std::string unit;
-  std::string group;
+  std::string defaultText;  // as the host formats values
+  int32_t flags;            // every flag but the not-in-use one
+  double minimum = 0, maximum = 0;
+  std::string unit = {};
 };
 
-// The whole declaration, written out independently of the module's code.
-std::vector<Expected> expectedPanel(const std::string& layerLabelPrefix, bool numbered) {
-  std::vector<Expected> rows = {
-      {"preset", "Preset", ParamKind::Choice, 98, "0", 0, 0, "", ""},
-      {"cutType", "Cut Type", ParamKind::Choice, 0, "0", 0, 0, "", "Cuts"},
-      {"numberOfCuts", "Number of Cuts", ParamKind::Int, 0, "1", 1, 8, "", "Cuts"},
-      {"viewCutRegions", "View Cut Regions", ParamKind::Bool, 1, "0", 0, 0, "", "Cuts"},
-      {"cutPosition_global", "Position", ParamKind::Point, 1027, "(0, 0)", 0, 0, "", "Cuts"},
+const Rule kRules[] = {
+    {Place::Top, "preset", "Preset", ParamKind::Choice, "0",
+     kParamFlagHostPresets | kParamFlagNotSaved},
+    {Place::Cuts, "cutType", "Cut Type", ParamKind::Choice, "0", kParamFlagsNone},
+    {Place::Cuts, "numberOfCuts", "Number of Cuts", ParamKind::Int, "1", kParamFlagsNone, 1, kCuts},
+    {Place::Cuts, "viewCutRegions", "View Cut Regions", ParamKind::Bool, "0", kAnimated},
+    {Place::Cuts, "cutPosition_global", "Position", ParamKind::Point, "(0, 0)",
+     kAnimated | kParamFlagHostHandle},
+    {Place::PerCut, "cutPosition", "Position", ParamKind::Point, "(0, 0)", kAnimated},
+    {Place::PerCut, "cutDirection", "Direction", ParamKind::Angle, "0",
+     kAnimated | kParamFlagsDirection},
+    {Place::PerInput, "inputLayer", "Layer", ParamKind::Layer,
+     "00000000-0000-0000-0000-000000000000", kAnimated},
+    {Place::PerInput, "inputFrameShift", "Frame Shift", ParamKind::Int, "0", kAnimated, -100000,
+     10000},
+    {Place::PerInput, "inputFrameTranslation", "Translation", ParamKind::Point, "(0, 0)",
+     kAnimated},
+    {Place::PerInput, "inputFrameScale", "Scale", ParamKind::Float, "100", kAnimated, 1, 1000, "%"},
+    {Place::PerInput, "inputFrameRotation", "Rotation", ParamKind::Angle, "0",
+     kAnimated | kParamFlagsRotation},
+    {Place::Border, "borderWidth", "Width", ParamKind::Float, "2", kAnimated, 0, 200, "px"},
+    {Place::Border, "borderColor", "Color", ParamKind::Color, "(0, 0, 0)", kAnimated},
+    {Place::Border, "borderAlpha", "Alpha", ParamKind::Float, "1", kAnimated, 0, 1},
+};
+
+struct Declared {
+  std::string id;
+  std::string group;  // from the outermost in: "Cuts > Cut 1"
+  const Rule* rule;
+  bool unused;
+};
+
+// The panel in declaration order, each parameter marked unused where the default layout of
+// `cuts` Local cuts leaves it so: the cuts from that count on, the inputs after the one beyond
+// the last cut, the Radial centre and the placeholder preset.
+std::vector<Declared> declarationOrder(int cuts) {
+  std::vector<Declared> order;
+  const auto add = [&](Place place, int index, const std::string& group, bool unused) {
+    for (const Rule& rule : kRules) {
+      if (rule.place != place) continue;
+      const std::string suffix =
+          index < 0 ? "" : (place == Place::PerCut ? "_" : "") + std::to_string(index);
+      const bool neverInUse = rule.stem == "preset" || rule.stem == "cutPosition_global";
+      order.push_back({rule.stem + suffix, group, &rule, unused || neverInUse});
+    }
   };
-  for (int i = 0; i < 8; ++i) {
-    const int32_t flags = i == 0 ? 1 : 3;
-    const std::string group = "Cuts > Cut " + std::to_string(i + 1);
-    rows.push_back({"cutPosition_" + std::to_string(i), "Position", ParamKind::Point, flags,
-                    "(0, 0)", 0, 0, "", group});
-    rows.push_back({"cutDirection_" + std::to_string(i), "Direction", ParamKind::Angle, flags + 16,
-                    i == 0 ? "225" : "0", 0, 0, "", group});
-  }
-  for (int j = 0; j < 9; ++j) {
-    const int32_t flags = j <= 1 ? 1 : 3;
-    const std::string n = std::to_string(j);
-    const std::string group = "Input Layers/Frames > Input " + n;
-    rows.push_back({"inputLayer" + n, numbered ? layerLabelPrefix + " " + n : layerLabelPrefix,
-                    ParamKind::Layer, flags, "00000000-0000-0000-0000-000000000000", 0, 0, "",
-                    group});
-    rows.push_back({"inputFrameShift" + n, "Frame Shift", ParamKind::Int, flags, "0", -100000,
-                    10000, "", group});
-    rows.push_back({"inputFrameTranslation" + n, "Translation", ParamKind::Point, flags, "(0, 0)",
-                    0, 0, "", group});
-    rows.push_back(
-        {"inputFrameScale" + n, "Scale", ParamKind::Float, flags, "100", 1, 1000, "%", group});
-    rows.push_back(
-        {"inputFrameRotation" + n, "Rotation", ParamKind::Angle, flags + 20, "0", 0, 0, "", group});
-  }
-  rows.push_back({"borderWidth", "Width", ParamKind::Float, 1, "2", 0, 200, "px", "Border"});
-  rows.push_back({"borderColor", "Color", ParamKind::Color, 1, "(0, 0, 0)", 0, 0, "", "Border"});
-  rows.push_back({"borderAlpha", "Alpha", ParamKind::Float, 1, "1", 0, 1, "", "Border"});
-  return rows;
+  add(Place::Top, -1, "", false);
+  add(Place::Cuts, -1, "Cuts", false);
+  for (int i = 0; i < kCuts; ++i)
+    add(Place::PerCut, i, "Cuts > Cut " + std::to_string(i + 1), i >= cuts);
+  for (int j = 0; j < kInputs; ++j)
+    add(Place::PerInput, j, "Input Layers/Frames > Input " + std::to_string(j), j > cuts);
+  add(Place::Border, -1, "Border", false);
+  return order;
 }
 
 // The parameter's groups from the outermost in: "Cuts > Cut 1".
@@ -66,42 +95,51 @@ std::string groupPath(const refhost::ParamPanel& panel, const refhost::Param& pa
   return path;
 }
 
-TEST_F(LoadedPlugin, DeclaresEveryParameterInOrder) {
+TEST_F(LoadedPlugin, PanelFollowsTheDeclarationRules) {
   const refhost::ParamPanel& panel = host().panel();
-  const std::vector<Expected> expected = expectedPanel("Layer", false);
-  ASSERT_EQ(panel.params().size(), 69u);
-  ASSERT_EQ(expected.size(), 69u);
+  ASSERT_EQ(host().param("cutType").defaultValue.integer, 0) << "the default layout is Local";
+  const std::vector<Declared> expected =
+      declarationOrder(host().param("numberOfCuts").defaultValue.integer);
+  ASSERT_EQ(panel.params().size(), expected.size());
+  std::set<std::string> groupsHoldingParameters;
   for (size_t k = 0; k < expected.size(); ++k) {
     const refhost::Param& actual = panel.params()[k];
-    const Expected& want = expected[k];
+    const Declared& want = expected[k];
+    const Rule& rule = *want.rule;
     SCOPED_TRACE(want.id);
     EXPECT_EQ(actual.id, want.id);
-    EXPECT_EQ(actual.displayName, want.displayName);
-    EXPECT_EQ(actual.kind, want.kind);
-    EXPECT_EQ(actual.flags, want.flags);
-    EXPECT_EQ(refhost::formatValue(actual.kind, actual.defaultValue), want.defaultText);
-    EXPECT_EQ(actual.unit, want.unit);
     EXPECT_EQ(groupPath(panel, actual), want.group);
-    if (want.kind == ParamKind::Int || want.kind == ParamKind::Float) {
-      EXPECT_EQ(actual.minimum, want.minimum);
-      EXPECT_EQ(actual.maximum, want.maximum);
+    groupsHoldingParameters.insert(want.group);
+    EXPECT_EQ(actual.displayName, rule.displayName);
+    EXPECT_EQ(actual.kind, rule.kind);
+    EXPECT_EQ(actual.unit, rule.unit);
+    EXPECT_EQ(actual.flags, rule.flags | (want.unused ? kParamFlagNotInUse : kParamFlagsNone));
+    // The first cut starts on the diagonal; every other default is the stem's.
+    const std::string defaultText = want.id == "cutDirection_0" ? "225" : rule.defaultText;
+    EXPECT_EQ(refhost::formatValue(actual.kind, actual.defaultValue), defaultText);
+    if (rule.kind == ParamKind::Int || rule.kind == ParamKind::Float) {
+      EXPECT_EQ(actual.minimum, rule.minimum);
+      EXPECT_EQ(actual.maximum, rule.maximum);
+      const double value =
+          rule.kind == ParamKind::Int ? actual.defaultValue.integer : actual.defaultValue.number[0];
+      EXPECT_TRUE(actual.minimum <= value && value <= actual.maximum) << value;
     }
-    if (want.kind == ParamKind::Angle) {
-      EXPECT_EQ(actual.extra, 1);
-    }
+    EXPECT_EQ(actual.extra, rule.kind == ParamKind::Angle ? 1 : 0);
   }
-  EXPECT_EQ(panel.params()[0].choices, (std::vector<std::string>{"N/A"}));
-  EXPECT_EQ(panel.params()[1].choices, (std::vector<std::string>{"Local", "Radial"}));
+  EXPECT_EQ(host().param("preset").choices, (std::vector<std::string>{"N/A"}));
+  EXPECT_EQ(host().param("cutType").choices, (std::vector<std::string>{"Local", "Radial"}));
   EXPECT_EQ(host().param("inputFrameScale0").precision, 1);
   EXPECT_EQ(host().param("borderWidth").precision, 1);
   EXPECT_EQ(host().param("borderAlpha").precision, 2);
-  ASSERT_EQ(panel.groups().size(), 20u);  // each holds a parameter, so each path is checked above
+  // Every group but "Input Layers/Frames" holds a parameter, so each path was checked above.
+  groupsHoldingParameters.erase("");
+  EXPECT_EQ(panel.groups().size(), groupsHoldingParameters.size() + 1);
   EXPECT_EQ(panel.openGroupDepth(), 0);
   for (const refhost::ParamGroup& group : panel.groups()) EXPECT_TRUE(group.closed);
 }
 
-// A refused call stops the declaration at once: the result is 5, nothing after it is asked,
-// and what was declared before stays.
+// A refused call stops the declaration at once: Notify answers the exception result, nothing
+// after the refused call is asked, and what was declared before stays.
 TEST(ParameterDeclaration, StopsAtTheFirstRefusedCall) {
   refhost::Module module(VELTRANE_MODULE_PATH);
   const struct {
@@ -120,7 +158,7 @@ TEST(ParameterDeclaration, StopsAtTheFirstRefusedCall) {
     testsupport::InstrumentedHost host(module);
     ASSERT_EQ(host.send(kMessageLoad), 1);
     host.failDeclarationCall(row.refusedCall);
-    EXPECT_EQ(host.send(kMessageDeclareParameters), 5);
+    EXPECT_EQ(host.send(kMessageDeclareParameters), kResultException);
     EXPECT_EQ(host.declarationCallCount(), row.refusedCall);
     EXPECT_EQ(host.panel().params().size(), row.paramsDeclared);
     EXPECT_EQ(host.panel().openGroupDepth(), row.openGroups);
@@ -133,15 +171,17 @@ TEST(ParameterDeclaration, LayerLabelsFollowTheHostProductCode) {
   const struct {
     int32_t hostId;
     bool numbered;
-  } table[] = {{5100, true}, {5200, true},  {5600, true},  {6001, true},
-               {0, false},   {3000, false}, {5101, false}, {-1, false}};
+  } table[] = {{kHostProductCompositor, true},      {kHostProductCompositorPro, true},
+               {kHostProductRenderNode, true},      {kHostProductCompositorPreview, true},
+               {kHostProductTouch, false},          {0, false},
+               {kHostProductCompositor + 1, false}, {-1, false}};
   for (const auto& row : table) {
     SCOPED_TRACE(row.hostId);
     testsupport::InstrumentedHost host(module);
     host.setHostId(row.hostId);
     ASSERT_EQ(host.send(kMessageLoad), 1);
     ASSERT_EQ(host.send(kMessageDeclareParameters), 1);
-    for (int j = 0; j < 9; ++j) {
+    for (int j = 0; j < kInputs; ++j) {
       const std::string label = host.param("inputLayer" + std::to_string(j)).displayName;
       EXPECT_EQ(label, row.numbered ? "Layer " + std::to_string(j) : "Layer");
     }

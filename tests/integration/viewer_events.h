@@ -32,9 +32,11 @@ class ViewerEvents {
     host_.setRenderContext(nullptr);
     return result;
   }
-  int32_t press(float x, float y) { return pointer(1005, x, y, 1.0); }
-  int32_t move(float x, float y, bool held) { return pointer(1004, x, y, held ? 1.0 : 0.0); }
-  int32_t release(float x, float y) { return pointer(1006, x, y, 0.0); }
+  int32_t press(float x, float y) { return pointer(kMessagePointerPress, x, y, 1.0); }
+  int32_t move(float x, float y, bool held) {
+    return pointer(kMessagePointerMove, x, y, held ? 1.0 : 0.0);
+  }
+  int32_t release(float x, float y) { return pointer(kMessagePointerRelease, x, y, 0.0); }
   int32_t key(int32_t message, uint32_t code) {
     WispKeyEvent event{code};
     return send(message, &event);

@@ -9,9 +9,6 @@ namespace {
 
 using refhost::ParamValue;
 
-constexpr uint32_t kShift = 65505;
-constexpr uint32_t kEscape = 65307;
-
 class ViewerGestures : public LoadedPlugin {
  protected:
   void SetUp() override {
@@ -35,7 +32,10 @@ class ViewerGestures : public LoadedPlugin {
     for (const refhost::Param& param : host().panel().params()) states.push_back(param.state);
     return states;
   }
-  int32_t lastCursor() { return host().cursorShapes().empty() ? -1 : host().cursorShapes().back(); }
+  CursorShape lastCursor() {
+    return static_cast<CursorShape>(host().cursorShapes().empty() ? -1
+                                                                  : host().cursorShapes().back());
+  }
 
   std::unique_ptr<ViewerEvents> viewer_;
 };
@@ -47,7 +47,7 @@ TEST_F(ViewerGestures, DraggingACutLineMovesItParallelToItself) {
   EXPECT_EQ(number("cutPosition_0")[1], 25.0f) << "the position jumps onto the pressed point";
   viewer().move(95, 65, true);
   viewer().move(110, 60, true);
-  viewer().release(110, 60);
+  EXPECT_EQ(viewer().release(110, 60), 1);
   EXPECT_EQ(number("cutPosition_0")[0], 30.0f);
   EXPECT_EQ(number("cutPosition_0")[1], 15.0f);
   EXPECT_TRUE(host().callsTo("SetAngleParam").empty()) << "the direction is left alone";
@@ -67,7 +67,7 @@ TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
     const float theta = (90.0f + 15.0f * static_cast<float>(step)) * 3.1415927f / 180.0f;
     viewer().move(cx + 40.0f * std::sin(theta), cy + 40.0f * std::cos(theta), true);
   }
-  viewer().release(cx + radius, cy);
+  EXPECT_EQ(viewer().release(cx + radius, cy), 1);
   EXPECT_NEAR(number("cutDirection_0")[0], 720.0f, 0.5f);
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Split Screen Cut 1 Direction"}));
 }
@@ -93,9 +93,9 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
   resize(1920, 1080);
   host().setValue("numberOfCuts", ParamValue::ofInt(7));
   for (int i = 0; i < 7; ++i) setCut(i, -750.0f + 200.0f * static_cast<float>(i), 0.0f, 0.0f);
-  EXPECT_EQ(viewer().key(1007, kShift), 0);
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyLeftShift), 0);
   EXPECT_EQ(viewer().move(1810, 100, false), 0);
-  EXPECT_EQ(lastCursor(), 19);
+  EXPECT_EQ(lastCursor(), CursorShape::InsertCut);
 
   ASSERT_EQ(viewer().press(1810, 100), 1);
   EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 8);
@@ -111,7 +111,7 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
   // Eight cuts: Shift no longer inserts; the press takes the region under the pointer, the
   // part of the rightmost strip above the new horizontal cut.
   EXPECT_EQ(viewer().move(1810, 800, false), 1);
-  EXPECT_EQ(lastCursor(), 3);
+  EXPECT_EQ(lastCursor(), CursorShape::Move);
   host().clearCallLog();
   ASSERT_EQ(viewer().press(1810, 800), 1);
   viewer().release(1810, 800);
@@ -119,7 +119,7 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
   // The plug-in brackets the press as a move; moving nothing, it leaves the host no step.
   EXPECT_EQ(host().callsTo("BeginUndo").back(), "BeginUndo \"Moved Split Screen Input 8\"");
   EXPECT_EQ(host().undoStepNames().back(), "Inserting Cut");
-  EXPECT_EQ(viewer().key(1008, kShift), 0);
+  EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyLeftShift), 0);
 }
 
 TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
@@ -127,7 +127,7 @@ TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
   setRadial(2);
   setCut(0, 0.0f, 0.0f, 0.0f);
   setCut(1, 0.0f, 0.0f, 90.0f);
-  viewer().key(1007, kShift);
+  viewer().key(kMessageKeyDown, kKeyLeftShift);
   ASSERT_EQ(viewer().press(960 - 300, 540 - 300), 1);  // down and left of the centre
   EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 3);
   EXPECT_NEAR(number("cutDirection_2")[0], -135.0f, 1e-3f);
@@ -137,10 +137,18 @@ TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
 
 TEST_F(ViewerGestures, DraggingARegionMovesItsInput) {
   setCut(0, 0.0f, 0.0f, 0.0f);
+  EXPECT_EQ(viewer().move(120, 20, false), 1) << "the pointer rests over input 0's region";
   viewer().drag(120, 20, 130, 30);
   EXPECT_EQ(number("inputFrameTranslation0")[0], 10.0f);
   EXPECT_EQ(number("inputFrameTranslation0")[1], 10.0f);
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Moved Split Screen Input 0"}));
+  // Radial sectors count from input 1: with cuts up and right, the three quarters from the
+  // right round to the top are input 1's.
+  setRadial(2);
+  setCut(1, 0.0f, 0.0f, 90.0f);
+  viewer().drag(40, 20, 45, 25);
+  EXPECT_EQ(number("inputFrameTranslation1")[0], 5.0f);
+  EXPECT_EQ(host().undoStepNames().back(), "Moved Split Screen Input 1");
 }
 
 TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
@@ -152,6 +160,7 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
   // Rectangle (40, 22.5)-(120, 67.5); drag its (x1, y1) corner out to (140, 77.5).
   viewer().move(120, 67, false);
   viewer().drag(120, 67, 140, 77);
+  EXPECT_EQ(viewer().release(-50, -50), 0) << "the drag's release left nothing pressed";
   EXPECT_NEAR(host().valueAt("inputFrameScale0", 0).number[0], 62.5f, 1e-3f);
   EXPECT_NEAR(number("inputFrameTranslation0")[0], 10.0f, 1e-3f);   // x0 stays at 40
   EXPECT_NEAR(number("inputFrameTranslation0")[1], 5.625f, 1e-3f);  // y0 stays at 22.5
@@ -194,21 +203,22 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
 
 TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
   setCut(0, 0.0f, 0.0f, 0.0f);
-  EXPECT_EQ(viewer().key(1007, kEscape), 0);  // nothing selected: the key is not taken
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape),
+            0);  // nothing selected: the key is not taken
   viewer().press(120, 20);
   viewer().release(120, 20);
   EXPECT_EQ(host().send(kMessagePointerOverSelection),
             1);  // pointer over the selected input's region
-  EXPECT_EQ(viewer().key(1007, kEscape), 1);
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 1);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 1);  // key down changes nothing
-  EXPECT_EQ(viewer().key(1008, kEscape), 1);
+  EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyEscape), 1);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
-  EXPECT_EQ(viewer().key(1008, kEscape), 0);
+  EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyEscape), 0);
   viewer().drag(120, 20, 200, 20);  // released outside the frame: over no input
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
 
   // A host that keeps a pressed control's hover drops the selection after every release.
-  host().setHostId(3000);
+  host().setHostId(kHostProductTouch);
   viewer().press(120, 20);
   viewer().release(120, 20);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 0);
@@ -218,13 +228,13 @@ TEST_F(ViewerGestures, ReleaseWithoutPressClosesNoStep) {
   setCut(0, 0.0f, 0.0f, 0.0f);
   EXPECT_EQ(viewer().release(120, 20), 1);   // over a region
   EXPECT_EQ(viewer().release(-50, -50), 0);  // outside the frame
-  viewer().key(1007, kShift);
+  viewer().key(kMessageKeyDown, kKeyLeftShift);
   EXPECT_EQ(viewer().release(120, 20), 0) << "Shift with room for a cut: no region";
   EXPECT_TRUE(host().callsTo("EndUndo").empty());
   EXPECT_TRUE(host().undoStepNames().empty());
 }
 
-// Message 1014 copies another instance's interaction state into this one.
+// Copy instance copies another instance's interaction state into this one.
 TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   host().setValue("numberOfCuts", ParamValue::ofInt(3));
   setCut(0, -40.0f, 0.0f, 0.0f);
@@ -232,21 +242,21 @@ TEST_F(ViewerGestures, CopyTakesTheOtherInstancesSelectionAndKeys) {
   setCut(2, 40.0f, 0.0f, 0.0f);
   viewer().press(140, 10);  // right of every cut: input 3's region
   viewer().release(140, 10);
-  viewer().key(1007, kShift);
+  viewer().key(kMessageKeyDown, kKeyLeftShift);
   void* const source = host().api().instanceData;
 
   host().api().instanceData = nullptr;
   ASSERT_EQ(host().send(kMessageCreateInstance), 1);
   void* const copy = host().api().instanceData;
-  EXPECT_EQ(viewer().key(1007, kEscape), 0);  // a fresh record has no selection
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 0);  // a fresh record has no selection
   host().setRenderContext(source);
   EXPECT_EQ(host().send(kMessageCopyInstance), 0);
   host().setRenderContext(nullptr);
   EXPECT_EQ(host().api().instanceData, copy);
-  EXPECT_EQ(viewer().key(1007, kEscape), 1);  // input 3 is selected here now
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 1);  // input 3 is selected here now
   host().clearViewerRecords();
   viewer().move(150, 80, false);  // Shift is down here too: the insert cursor
-  EXPECT_EQ(lastCursor(), 19);
+  EXPECT_EQ(lastCursor(), CursorShape::InsertCut);
 
   EXPECT_EQ(host().send(kMessageDestroyInstance), 1);
   host().api().instanceData = source;

@@ -2,6 +2,7 @@
 // and prints its registration and the parameter panel it declared.
 #include <cstdio>
 #include <stdexcept>
+#include <string>
 
 #include "cli/cli_support.h"
 #include "commands/commands.h"
@@ -11,6 +12,7 @@
 namespace veltrane_cli {
 namespace {
 
+// %d: the four product codes that number the layer labels.
 const char kInfoHelp[] =
     "Usage: veltrane info [--plugin PATH] [--host-id N] [--json]\n"
     "\n"
@@ -23,28 +25,21 @@ const char kInfoHelp[] =
     "Options:\n"
     "  --plugin PATH  the module to load (default: $VELTRANE_PLUGIN when set, else\n"
     "                 <dir of veltrane>/../lib/veltrane.so)\n"
-    "  --host-id N    the host product code the host reports (default 0); codes 5100, 5200,\n"
-    "                 5600 and 6001 number the input layer labels\n"
+    "  --host-id N    the host product code the host reports (default 0); codes %d, %d,\n"
+    "                 %d and %d number the input layer labels\n"
     "  --json         print one JSON document instead of text\n"
     "  -h, --help     show this help\n";
 
-struct Step {
-  int32_t message;
-  const char* what;
-};
-
-// Every one of these messages answers 1 when it did its work.
-const Step kSteps[] = {{kMessageLoad, "load"},
-                       {kMessageDeclareParameters, "declare the parameters"},
-                       {kMessageCreateInstance, "create an instance"},
-                       {kMessageDestroyInstance, "destroy the instance"},
-                       {kMessageUnload, "unload"}};
+// Every one of these messages answers done when it did its work.
+const WispMessage kSteps[] = {kMessageLoad, kMessageDeclareParameters, kMessageCreateInstance,
+                              kMessageDestroyInstance, kMessageUnload};
 
 }  // namespace
 
 int runInfo(const std::vector<std::string>& args) {
   if (wantsHelp(args)) {
-    std::fputs(kInfoHelp, stdout);
+    std::printf(kInfoHelp, kHostProductCompositor, kHostProductCompositorPro,
+                kHostProductRenderNode, kHostProductCompositorPreview);
     return 0;
   }
   auto options = parseOptions(args, {{"--plugin", true}, {"--host-id", true}, {"--json", false}});
@@ -59,13 +54,13 @@ int runInfo(const std::vector<std::string>& args) {
   refhost::Registration registration = engine.module().readRegistration();
   nlohmann::ordered_json messages = nlohmann::ordered_json::array();
   std::string failure;
-  for (const Step& step : kSteps) {
+  for (const WispMessage step : kSteps) {
     // Any answer is taken: a wrong one is reported below, after the panel is shown.
-    int32_t result = engine.send(step.message, nullptr, nullptr, {});
-    messages.push_back({{"message", step.message}, {"result", result}});
-    if (result != 1 && failure.empty()) {
-      failure = path + ": message " + std::to_string(step.message) + " (" + step.what +
-                ") answered " + std::to_string(result) + ", expected 1";
+    int32_t result = engine.send(step, nullptr, nullptr, {});
+    messages.push_back({{"message", step}, {"result", result}});
+    if (result != kResultDone && failure.empty()) {
+      failure = path + ": " + wispMessageText(step) + " answered " + std::to_string(result) +
+                ", expected " + std::to_string(kResultDone);
     }
   }
 

@@ -14,7 +14,7 @@ namespace veltrane_cli {
 // Plays every event in order through the engine's viewer channel. After each one the host
 // reports every parameter whose value changed with message 7, as it does after any edit, and
 // asks the plug-in what its viewer shows (see refhost::Engine::viewerState). With `overlays`,
-// the frame at the script's time is rendered and the overlay drawn over it (message 1003), one
+// the frame at the script's time is rendered and the overlay drawn over it (draw overlay), one
 // picture per event. Returns {"params", "undoSteps", "redoSteps", "openUndoStep", "cursors",
 // "selectedInputs", "hover", "popupMenus", "results"}, where results[i] lists {"message",
 // "result"} for each message event i sent ({"message", "param", "result"} for message 7).

@@ -30,7 +30,7 @@ uint32_t readKey(const JsonField& field) {
   const char* expected = "\"Shift\", \"Escape\" or a key number (X11 keysym)";
   if (field.isString()) {
     std::string name = field.json().get<std::string>();
-    if (name == "Shift") return kKeyShift;
+    if (name == "Shift") return kKeyLeftShift;
     if (name == "Escape") return kKeyEscape;
     field.fail(expected);
   }

@@ -6,11 +6,9 @@
 #include <string>
 #include <vector>
 
-namespace veltrane_cli {
+#include "host/wisp_protocol.h"
 
-// X11 keysyms the plug-in knows by name.
-constexpr uint32_t kKeyShift = 65505;
-constexpr uint32_t kKeyEscape = 65307;
+namespace veltrane_cli {
 
 struct ViewerEvent {
   enum class Kind { Press, Move, Release, KeyDown, KeyUp, Pick, LayerMenu, Undo, Redo };

@@ -78,22 +78,24 @@ void ViewerSession::setView(double viewScale, double uiScale, const refhost::Mat
 }
 
 void ViewerSession::pointerMove(EventPosition position, bool held) {
-  event("message 1004", [&] { return engine_->pointerMove(position.x, position.y, held); });
+  event(wispMessageText(kMessagePointerMove),
+        [&] { return engine_->pointerMove(position.x, position.y, held); });
 }
 
 bool ViewerSession::pointerPress(EventPosition position) {
   finishEdit();
-  return event("message 1005", [&] {
+  return event(wispMessageText(kMessagePointerPress), [&] {
            return engine_->pointerPress(position.x, position.y);
          }).result != 0;
 }
 
 void ViewerSession::pointerRelease(EventPosition position) {
-  event("message 1006", [&] { return engine_->pointerRelease(position.x, position.y); });
+  event(wispMessageText(kMessagePointerRelease),
+        [&] { return engine_->pointerRelease(position.x, position.y); });
 }
 
 bool ViewerSession::key(uint32_t keysym, bool down) {
-  const char* what = down ? "message 1007" : "message 1008";
+  const std::string what = wispMessageText(down ? kMessageKeyDown : kMessageKeyUp);
   return event(what, [&] { return engine_->key(keysym, down); }).result == 1;
 }
 

@@ -1,7 +1,7 @@
 // A scene running in the plug-in as a host's viewer drives it: pointer and key events become
-// messages 1004 to 1008 in the frame's corner space, every parameter change is reported with
+// pointer and key messages in the frame's corner space, every parameter change is reported with
 // message 7, the frame is rendered (12, 10) only when a parameter or the frame number changed,
-// and the overlay (1003) is drawn over the picture with the viewer's projection. Panel edits,
+// and the overlay is drawn over the picture with the viewer's projection. Panel edits,
 // keyframe toggles and presets are undo steps of the host. A message the plug-in fails becomes
 // the status text and leaves the session usable.
 #pragma once
@@ -23,7 +23,7 @@ struct ViewerStats {
   int renders = 0;   // message 10
   int previews = 0;  // those of them at a preview size
   double renderSeconds = 0;
-  int overlays = 0;  // message 1003
+  int overlays = 0;  // draw overlay messages
   double overlaySeconds = 0;
 };
 
@@ -55,8 +55,8 @@ class ViewerSession {
   void pointerRelease(EventPosition position);
   // The key as an X11 keysym; true when the plug-in took it.
   bool key(uint32_t keysym, bool down);
-  // Asks whether the pointer is over the selected input (1012) and if so opens the plug-in's
-  // layer menu (1013); the host's popup menu chooser answers it.
+  // Asks whether the pointer is over the selected input and if so opens the plug-in's layer
+  // menu; the host's popup menu chooser answers it.
   void openLayerMenu();
 
   // Panel edits at the current frame. Consecutive edits of one parameter form one undo step
@@ -83,7 +83,7 @@ class ViewerSession {
   int32_t pictureHeight() const { return picture_ ? picture_->context().height : 0; }
   // How much smaller than the frame a preview is rendered: 1, 2 or 4.
   int32_t previewDivisor() const;
-  // Draws the overlay (1003) into the texture, which has the given size.
+  // Draws the overlay into the texture, which has the given size.
   void drawOverlay(uint32_t texture, int32_t width, int32_t height);
 
   // The cursor number the plug-in asked for last.

@@ -530,7 +530,8 @@ void ViewerWindow::printStats() const {
   auto each = [](double seconds, int count) { return count ? 1000 * seconds / count : 0.0; };
   std::printf(
       "frames: %d rendered again (%.1f ms from input to screen), %d with only the overlay "
-      "redrawn (%.1f ms); message 10 with 12: %.1f ms, message 1003: %.1f ms; while dragging: "
+      "redrawn (%.1f ms); render with request frames: %.1f ms, draw overlay: %.1f ms; while "
+      "dragging: "
       "%d frames in %.2f s, %.1f per second; %d of %d renders at a preview size\n",
       rendered_.count, each(rendered_.seconds, rendered_.count), overlayOnly_.count,
       each(overlayOnly_.seconds, overlayOnly_.count), each(stats.renderSeconds, stats.renders),

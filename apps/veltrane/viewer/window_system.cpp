@@ -8,13 +8,13 @@
 #include <cstdlib>
 #include <stdexcept>
 
+#include "host/wisp_protocol.h"
+
 namespace veltrane_viewer {
 namespace {
 
-// X11 keysyms, the numbering the plug-in's key messages use.
-constexpr uint32_t kShiftLeft = 65505;
+// The right Shift's X11 keysym; the plug-in reacts to the left one and Escape (WispKey) only.
 constexpr uint32_t kShiftRight = 65506;
-constexpr uint32_t kEscape = 65307;
 
 std::string glfwErrorText() {
   const char* description = nullptr;
@@ -85,11 +85,11 @@ ImGuiRuntime::~ImGuiRuntime() {
 uint32_t keysymFor(int key) {
   switch (key) {
     case GLFW_KEY_LEFT_SHIFT:
-      return kShiftLeft;
+      return kKeyLeftShift;
     case GLFW_KEY_RIGHT_SHIFT:
       return kShiftRight;
     case GLFW_KEY_ESCAPE:
-      return kEscape;
+      return kKeyEscape;
     default:
       return 0;  // no other key means anything to the plug-in
   }

@@ -5,6 +5,7 @@
 #include <nlohmann/json.hpp>
 
 #include "cli_runner.h"
+#include "host/wisp_protocol.h"
 
 namespace {
 
@@ -32,7 +33,8 @@ void flatten(const nlohmann::json& items, std::vector<nlohmann::json>& params, i
 
 // The panel's content is checked against the module's declaration elsewhere; here its form.
 TEST(InfoCommand, ReportsTheDeclaredPanelAsJsonOrText) {
-  CliRun run = runCli({"info", "--json", "--plugin", VELTRANE_MODULE_PATH, "--host-id", "6001"});
+  CliRun run = runCli({"info", "--json", "--plugin", VELTRANE_MODULE_PATH, "--host-id",
+                       std::to_string(kHostProductCompositorPreview)});
   ASSERT_EQ(run.status, 0) << run.err;
   nlohmann::json document = nlohmann::json::parse(run.out);
   EXPECT_EQ(document["registration"]["version"], "1.2.0.0");

@@ -7,6 +7,7 @@
 #include <nlohmann/json.hpp>
 
 #include "cli_runner.h"
+#include "host/wisp_protocol.h"
 #include "refhost/media/image_files.h"
 
 namespace {
@@ -58,10 +59,12 @@ TEST(InteractCommand, DraggingACutLineMovesItInOneUndoStep) {
   EXPECT_EQ(result["params"]["cutDirection_0"], 225);
   EXPECT_EQ(result["undoSteps"], json::array({"Split Screen Cut 1 Position"}));
   EXPECT_EQ(result["cursors"].size(), 5u);
-  EXPECT_EQ(result["results"][1][0], message(1005, 1));
-  const json changed = {{"message", 7}, {"param", "cutPosition_0"}, {"result", 1}};
-  EXPECT_EQ(result["results"][2], json::array({message(1004, 1), changed}));
-  EXPECT_EQ(result["results"][4][0], message(1006, 1));
+  EXPECT_EQ(result["results"][1][0], message(kMessagePointerPress, kResultDone));
+  const json changed = {
+      {"message", kMessageParameterChanged}, {"param", "cutPosition_0"}, {"result", kResultDone}};
+  EXPECT_EQ(result["results"][2],
+            json::array({message(kMessagePointerMove, kResultDone), changed}));
+  EXPECT_EQ(result["results"][4][0], message(kMessagePointerRelease, kResultDone));
 
   // One picture per event, the last showing the cut where it was dragged.
   std::vector<std::string> pictures;
@@ -115,12 +118,13 @@ TEST(InteractCommand, LayerMenuAssignsThePickedLayerToTheSelectedInput) {
         << id;
   }
   EXPECT_EQ(result["results"][2], json::array());  // a pick sends nothing
-  EXPECT_EQ(result["results"][3][0], message(1012, 1));
-  EXPECT_EQ(result["results"][3][1], message(1013, 1));
-  EXPECT_EQ(result["results"][4], json::array({message(1007, 1)}));
-  EXPECT_EQ(result["results"][5], json::array({message(1008, 1)}));
+  EXPECT_EQ(result["results"][3][0], message(kMessagePointerOverSelection, kResultDone));
+  EXPECT_EQ(result["results"][3][1], message(kMessagePickLayer, kResultDone));
+  EXPECT_EQ(result["results"][4], json::array({message(kMessageKeyDown, kResultDone)}));
+  EXPECT_EQ(result["results"][5], json::array({message(kMessageKeyUp, kResultDone)}));
   // Escape deselected the input: the host no longer offers the menu.
-  EXPECT_EQ(result["results"][6], json::array({message(1012, 0)}));
+  EXPECT_EQ(result["results"][6],
+            json::array({message(kMessagePointerOverSelection, kResultNotDone)}));
   const int n = std::stoi(input);
   EXPECT_EQ(result["selectedInputs"], json::array({n, n, n, n, n, nullptr, nullptr, nullptr, n}));
   EXPECT_EQ(result["hover"],
@@ -131,13 +135,15 @@ TEST(InteractCommand, WholeNumbersWithAZeroFractionAreTaken) {
   json scene = smallScene("bars");
   scene["params"]["numberOfCuts"] = 2.0;
   scene["params"]["cutType"] = 1.0;
-  const json events = json::parse(R"({"hostId": 3000.0, "events": [{"keyDown": 65505.0}]})");
+  const json events = {
+      {"hostId", static_cast<double>(kHostProductTouch)},
+      {"events", json::array({{{"keyDown", static_cast<double>(kKeyLeftShift)}}})}};
   ScratchDirectory folder;
   Interaction done = interact(folder, events, {}, scene.dump());
   ASSERT_EQ(done.run.status, 0) << done.run.err;
   EXPECT_EQ(done.result["params"]["numberOfCuts"], 2);
   EXPECT_EQ(done.result["params"]["cutType"], "Radial");
-  EXPECT_EQ(done.result["results"][0][0]["message"], 1007);
+  EXPECT_EQ(done.result["results"][0][0]["message"], kMessageKeyDown);
 }
 
 }  // namespace

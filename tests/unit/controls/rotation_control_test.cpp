@@ -77,7 +77,7 @@ TEST(RotationControl, CursorOctantsTurnHalfWayBetweenDirections) {
 }
 
 TEST(RotationControl, PressedHoverSurvivesButtonUpMovesOnlyOnTheStickyHost) {
-  for (const int hostId : {0, 3000}) {
+  for (const int hostId : {0, static_cast<int>(kHostProductTouch)}) {
     testsupport::InstrumentedHost host;
     host.setHostId(hostId);
     AngleParam param;
@@ -90,7 +90,7 @@ TEST(RotationControl, PressedHoverSurvivesButtonUpMovesOnlyOnTheStickyHost) {
     host.clearViewerRecords();
     EXPECT_FALSE(control.test(host.handle(), &host.api(), kCentre, 100.0f, around(90.0f, 300.0f),
                               kUnitScale, 1.0f, 0.0f, 0));
-    const bool sticky = hostId == 3000;
+    const bool sticky = hostId == kHostProductTouch;
     EXPECT_EQ(control.hot, sticky ? 1 : 0) << hostId;
     EXPECT_EQ(control.grabPointerAngle == anchor, sticky) << hostId;
     EXPECT_EQ(host.redrawCount(), sticky ? 0 : 1) << hostId;

@@ -1,5 +1,6 @@
-// GL start-up builds the thirteen programs at fixed indices on Mesa, and every stage of them is
-// valid GLSL 4.10 for the reference compiler as well.
+// GL start-up builds every program the render and the overlay select, each linked and found
+// by name; a stage the driver will not compile leaves by the compile exception, which Notify
+// answers as such; and every stage is valid GLSL 4.10 for the reference compiler as well.
 #include "render/gl_startup.h"
 
 #include <gtest/gtest.h>
@@ -9,43 +10,68 @@
 #include <fstream>
 #include <string>
 
+#include "common/glsl_exception.h"
+#include "plugin/dispatch.h"
+#include "refhost/gl/gl_overrides.h"
+#include "shaders/program_names.h"
+#include "shaders/shader_identifiers.h"
 #include "support/gl_host.h"
 #include "support/temp_paths.h"
 
 namespace {
 
+namespace programs = veltrane::programs;
+
 using GlStartup = testsupport::GlHostTest;
 
-TEST_F(GlStartup, BuildsTheProgramsInTheirFixedOrderAndOnlyTheHelpersOnce) {
+// Every program a draw selects by name.
+const char* const kDrawnPrograms[] = {
+    programs::kSplitScreen,          programs::kCombineBorder, programs::kDistanceField,
+    programs::kLayerAlignment,       programs::kClear,         programs::kCopy,
+    programs::kCutPositionControl,   programs::kCutMoveHandle, programs::kRotationControl,
+    programs::kMoveHandle,           programs::kCutHandle,     programs::kQuadControl,
+    programs::kDirectionScaleControl};
+
+TEST_F(GlStartup, BuildsEveryDrawnProgramLinkedAndFoundByName) {
   testing::internal::CaptureStdout();
   buildPrograms();
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "") << "silent unless verbose";
-  ASSERT_EQ(registry_->programCount(), 13);
-  std::string order;  // the names by index
-  for (int index = 0; index < 13; ++index) {
-    for (const veltrane::ProgramName& name : registry_->programNames())
-      if (name.index == index) order += name.name + " ";
-    EXPECT_TRUE(registry_->program(index).linked) << index;
+  EXPECT_TRUE(veltrane::programsBuilt(registry_.get()));
+  for (const char* name : kDrawnPrograms) {
+    const int index = registry_->programIndex(name);
+    ASSERT_GE(index, 0) << name;
+    EXPECT_TRUE(registry_->program(index).linked) << name;
+    EXPECT_EQ(registry_->programId(name), static_cast<int32_t>(registry_->program(index).id));
   }
-  EXPECT_EQ(order,
-            "splitScreen combineBorder distanceField layerAlignment glClear glCopy "
-            "SplitScreenCutPositionControl SplitScreenCutMoveHandle RotationControl MoveHandle "
-            "CutHandle AAQuadControl DirectionScaleControl ");
-  EXPECT_EQ(glGetAttribLocation(registry_->program(2).id, "vertexPosition"), 0);
+  // The source copy selects its program by index rather than by name.
+  EXPECT_EQ(registry_->programIndex(programs::kSplitScreen), programs::kSplitScreenIndex);
+  // The meshes feed the distance field through the position location alone.
+  EXPECT_EQ(glGetAttribLocation(registry_->programId(programs::kDistanceField),
+                                veltrane::shader_ids::kVertexPosition),
+            veltrane::shader_ids::kPositionLocation);
 
-  // A second start-up, verbose: the banner, no logs (Mesa has nothing to say about these
-  // sources), every program but the two helpers again, the new ones found first by name.
+  // A second start-up, verbose, prints only the banner (the driver has nothing to say about
+  // these sources) and builds every program again but the two helpers, which it keeps.
   host().setVerbose(true);
-  const int32_t clearId = registry_->programId("glClear");
+  const int before = registry_->programCount();
+  const int32_t clearId = registry_->programId(programs::kClear);
   testing::internal::CaptureStdout();
   EXPECT_EQ(veltrane::prepareGl(handle(), api()), 1);
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "Veltrane Plugin\n");
-  EXPECT_EQ(registry_->programCount(), 24);
-  EXPECT_EQ(registry_->programId("glClear"), clearId);
-  EXPECT_EQ(registry_->programIndex("splitScreen"), 13);
-  EXPECT_EQ(registry_->programIndex("distanceField"), 15);
-  EXPECT_TRUE(registry_->program(15).linked) << "bound and linked by name";
-  EXPECT_EQ(registry_->programIndex("DirectionScaleControl"), 23);
+  EXPECT_EQ(registry_->programCount(), 2 * before - 2);
+  EXPECT_EQ(registry_->programId(programs::kClear), clearId);
+}
+
+TEST_F(GlStartup, AShaderTheDriverRefusesLeavesByTheCompileException) {
+  refhost::GlOverrides refusing;
+  refusing.refuseShaderCompiles = true;
+  refhost::ScopedGlOverrides overrides(refusing);
+  registry_ = std::make_unique<veltrane::EffectData>();
+  api()->pluginData = registry_.get();
+  EXPECT_THROW(veltrane::prepareGl(handle(), api()), Plugin::gl::FXGLSLexception);
+  EXPECT_EQ(registry_->programCount(), 0) << "a failed compile adds nothing";
+  EXPECT_FALSE(veltrane::programsBuilt(registry_.get())) << "so nothing will draw";
+  EXPECT_EQ(veltrane::dispatchMessage(handle(), api(), kMessagePrepareGl), kResultException);
 }
 
 // Runs glslangValidator on `path`; returns its exit status and collects its output.

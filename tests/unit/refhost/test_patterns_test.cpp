@@ -1,9 +1,15 @@
-// Generated pictures hold exactly the values they promise, the counter's code block reads
-// back the frame number, and frame sources hand GL its rows bottom first (a moving source's
-// upright frames are read back through the render context).
+// Generated pictures keep the promises the tests that use them rely on, at every size, and the
+// counter's code block reads back its frame; frame sources hand GL its rows bottom first (a
+// moving source's upright frames are read back through the render context).
 #include "refhost/media/test_patterns.h"
 
 #include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <set>
+#include <utility>
+#include <vector>
 
 #include "refhost/engine/composition.h"
 #include "refhost/media/media_source.h"
@@ -11,30 +17,53 @@
 namespace refhost {
 namespace {
 
-TEST(TestPatterns, PixelsHoldTheirDocumentedValues) {
-  // 70x40 frames: bars of 10 columns, checker squares of 5 pixels.
-  const struct {
-    Pattern pattern;
-    int32_t x, y;
-    Rgba8 expected;
-  } cases[] = {
-      {Pattern::Bars, 9, 39, {191, 191, 191, 255}},
-      {Pattern::Bars, 10, 0, {191, 191, 0, 255}},
-      {Pattern::Bars, 35, 20, {0, 191, 0, 255}},
-      {Pattern::Bars, 69, 0, {0, 0, 191, 255}},
-      {Pattern::Checker, 4, 0, {204, 204, 204, 255}},
-      {Pattern::Checker, 5, 0, {51, 51, 51, 255}},
-      {Pattern::Checker, 5, 5, {204, 204, 204, 255}},
-      {Pattern::Gradient, 0, 0, {0, 255, 128, 255}},
-      {Pattern::Gradient, 69, 39, {255, 0, 128, 255}},
-      {Pattern::Gradient, 23, 13, {85, 170, 128, 255}},
-      {Pattern::Counter, 69, 39, {32, 48, 96, 255}},
-  };
-  for (const auto& c : cases) {
-    const RgbaImage image = generatePattern(c.pattern, 3, 70, 40);
-    ASSERT_EQ(image.pixels.size(), 70u * 40u * 4u);
-    EXPECT_EQ(image.pixel(c.x, c.y), c.expected)
-        << patternName(c.pattern) << " at " << c.x << "," << c.y;
+// At every size: every pattern opaque; the bars seven distinct colours in full-height columns
+// of even width, so a region showing them can be told by its colour; the checker two greys
+// alternating square by square from a light corner; the gradient red rising to the right and
+// green upwards, never falling back, over the whole range, blue holding.
+TEST(TestPatterns, PicturesKeepTheirShapeAtEverySize) {
+  for (const auto& [width, height] : {std::pair{1, 1}, {7, 3}, {64, 36}, {71, 40}, {320, 180}}) {
+    SCOPED_TRACE(std::to_string(width) + "x" + std::to_string(height));
+    for (const std::string& name : patternNames()) {
+      const RgbaImage image = generatePattern(*patternFromName(name), 3, width, height);
+      ASSERT_EQ(image.pixels.size(), static_cast<size_t>(width * height * 4)) << name;
+      for (size_t alpha = 3; alpha < image.pixels.size(); alpha += 4)
+        ASSERT_EQ(image.pixels[alpha], 255) << name;
+    }
+    const RgbaImage bars = generatePattern(Pattern::Bars, 0, width, height);
+    const RgbaImage checker = generatePattern(Pattern::Checker, 0, width, height);
+    const RgbaImage gradient = generatePattern(Pattern::Gradient, 0, width, height);
+    std::vector<std::pair<Rgba8, int32_t>> columns;  // each bar's colour and width
+    const Rgba8 light = checker.pixel(0, 0);
+    int32_t cell = 1;
+    while (cell < width && checker.pixel(cell, 0) == light) ++cell;
+    for (int32_t x = 0; x < width; ++x) {
+      if (columns.empty() || columns.back().first != bars.pixel(x, 0))
+        columns.push_back({bars.pixel(x, 0), 0});
+      ++columns.back().second;
+      for (int32_t y = 0; y < height; ++y) {
+        const Rgba8 square = checker.pixel(x, y), ramp = gradient.pixel(x, y);
+        ASSERT_EQ(bars.pixel(x, y), bars.pixel(x, 0)) << x << "," << y;
+        ASSERT_TRUE(square[0] == square[1] && square[1] == square[2]) << "grey";
+        ASSERT_EQ(square == light, (x / cell + y / cell) % 2 == 0) << x << "," << y;
+        ASSERT_EQ(ramp[2], gradient.pixel(0, 0)[2]);
+        ASSERT_GE(ramp[0], gradient.pixel(std::max(x - 1, 0), y)[0]) << x << "," << y;
+        ASSERT_LE(ramp[1], gradient.pixel(x, std::max(y - 1, 0))[1]) << "rows count from the top";
+      }
+    }
+    std::set<Rgba8> colours;
+    for (const auto& [colour, count] : columns) {
+      colours.insert(colour);
+      EXPECT_LE(std::abs(count - width / 7), 1);
+    }
+    EXPECT_EQ(colours.size(), static_cast<size_t>(std::min(width, 7)));
+    EXPECT_EQ(columns.size(), colours.size()) << "no colour comes back further right";
+    EXPECT_TRUE(width <= cell || checker.pixel(cell, 0)[0] < light[0]) << "the other is darker";
+    if (width > 1 && height > 1) {
+      EXPECT_EQ(gradient.pixel(0, height - 1), (Rgba8{0, 0, gradient.pixel(0, 0)[2], 255}));
+      EXPECT_EQ(gradient.pixel(width - 1, 0)[0], 255);
+      EXPECT_EQ(gradient.pixel(0, 0)[1], 255);
+    }
   }
   for (const std::string& name : patternNames())
     EXPECT_EQ(patternName(*patternFromName(name)), name);
