@@ -176,6 +176,10 @@ struct VideoWriter::Encoder {
     av_pix_fmt_get_chroma_sub_sample(codec->pix_fmt, &chromaShiftX, &chromaShiftY);
     codec->width = chromaShiftX ? (width + 1) & ~1 : width;
     codec->height = chromaShiftY ? (height + 1) & ~1 : height;
+    if (codec->width != width || codec->height != height)
+      addNote(std::to_string(width) + "x" + std::to_string(height) + " is written as " +
+              std::to_string(codec->width) + "x" + std::to_string(codec->height) + " (" + pixels +
+              " needs even sides; the last column or row is repeated)");
     AVRational rate = av_d2q(frameRate > 0 ? frameRate : 25.0, 1001000);
     codec->time_base = av_inv_q(rate);
     codec->framerate = rate;

@@ -32,8 +32,10 @@ std::string outputName(const std::map<std::string, std::string>& options);
 // Checks the output options against the output and the scene, then renders the scene's frames
 // (all, or --frame N / --frames A-B) into the output: a still, a sequence or a video with its
 // codec, quality, bit depth and sound. Prints "wrote ..." and returns the exit status.
-// `command` names the command in notes ("render", "split").
+// `command` names the command in notes ("render", "split"); `notes` are printed as such once
+// the output is accepted, before the frames.
 int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
-                const AudioFrom& audioFrom, const std::string& command);
+                const AudioFrom& audioFrom, const std::string& command,
+                const std::vector<std::string>& notes = {});
 
 }  // namespace veltrane_cli
