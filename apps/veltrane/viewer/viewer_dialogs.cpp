@@ -34,6 +34,23 @@ void showProblem(const std::string& problem) {
   ImGui::PopStyleColor();
 }
 
+// A path field that has the keyboard when its dialog appears; typing replaces the text offered.
+void pathField(const char* prompt, char* text, std::size_t size) {
+  ImGui::TextUnformatted(prompt);
+  if (ImGui::IsWindowAppearing()) ImGui::SetKeyboardFocusHere();
+  ImGui::SetNextItemWidth(ImGui::GetFontSize() * 30);
+  ImGui::InputText("##path", text, size, ImGuiInputTextFlags_AutoSelectAll);
+}
+
+// The buttons that end a dialog: the one that accepts it, then Cancel.
+DialogAnswer acceptOrCancel(const char* accept) {
+  DialogAnswer answer = DialogAnswer::None;
+  if (ImGui::Button(accept)) answer = DialogAnswer::Accept;
+  ImGui::SameLine();
+  if (ImGui::Button("Cancel")) answer = DialogAnswer::Cancel;
+  return answer;
+}
+
 }  // namespace
 
 const std::array<const char*, 7>& renderCodecChoices() {
@@ -60,19 +77,15 @@ DialogAnswer drawSaveAs(SaveAsDialog& dialog) {
   DialogAnswer answer = DialogAnswer::None;
   if (dialog.confirmingReplace) {
     ImGui::Text("%s is there already. Replace it?", dialog.path.data());
-    if (ImGui::Button("Replace")) answer = DialogAnswer::Accept;
-    ImGui::SameLine();
-    if (ImGui::Button("Cancel")) dialog.confirmingReplace = false;
+    answer = acceptOrCancel("Replace");
+    if (answer == DialogAnswer::Cancel) {  // back to the path, the dialog stays
+      dialog.confirmingReplace = false;
+      answer = DialogAnswer::None;
+    }
   } else {
-    ImGui::TextUnformatted("Save the scene as:");
-    if (ImGui::IsWindowAppearing()) ImGui::SetKeyboardFocusHere();
-    ImGui::SetNextItemWidth(ImGui::GetFontSize() * 30);
-    ImGui::InputText("##path", dialog.path.data(), dialog.path.size(),
-                     ImGuiInputTextFlags_AutoSelectAll);  // typing replaces the path offered
+    pathField("Save the scene as:", dialog.path.data(), dialog.path.size());
     showProblem(dialog.problem);
-    if (ImGui::Button("Save")) answer = DialogAnswer::Accept;
-    ImGui::SameLine();
-    if (ImGui::Button("Cancel")) answer = DialogAnswer::Cancel;
+    answer = acceptOrCancel("Save");
   }
   // The window decides whether an Accept closes the dialog (it may ask to replace first).
   return ending(answer, dialog.open);
@@ -80,14 +93,8 @@ DialogAnswer drawSaveAs(SaveAsDialog& dialog) {
 
 DialogAnswer drawRenderDialog(RenderDialog& dialog) {
   if (!beginModal("Render", dialog.open)) return DialogAnswer::None;
-  DialogAnswer answer = DialogAnswer::None;
-  const float wide = ImGui::GetFontSize() * 30;
   const float narrow = ImGui::GetFontSize() * 7;
-  ImGui::TextUnformatted("Render the scene as it is now to:");
-  if (ImGui::IsWindowAppearing()) ImGui::SetKeyboardFocusHere();
-  ImGui::SetNextItemWidth(wide);
-  ImGui::InputText("##output", dialog.output.data(), dialog.output.size(),
-                   ImGuiInputTextFlags_AutoSelectAll);
+  pathField("Render the scene as it is now to:", dialog.output.data(), dialog.output.size());
   ImGui::TextDisabled("a video (.mp4 .mov .mkv .webm), a still (.png .exr) or frames (f%%04d.png)");
   ImGui::SetNextItemWidth(narrow);
   ImGui::InputText("from", dialog.from.data(), dialog.from.size());
@@ -100,10 +107,7 @@ DialogAnswer drawRenderDialog(RenderDialog& dialog) {
   ImGui::Combo("codec", &dialog.codec, codecs.data(), static_cast<int>(codecs.size()));
   ImGui::Checkbox("replace a file that is there", &dialog.replace);
   showProblem(dialog.problem);
-  if (ImGui::Button("Render")) answer = DialogAnswer::Accept;
-  ImGui::SameLine();
-  if (ImGui::Button("Cancel")) answer = DialogAnswer::Cancel;
-  return ending(answer, dialog.open);
+  return ending(acceptOrCancel("Render"), dialog.open);
 }
 
 }  // namespace veltrane_viewer
