@@ -134,13 +134,18 @@ untilFirstResult() {
   return script;
 }
 
-// The checkout as a reader has it, its build included, in a folder of its own.
+// The checkout as a reader has it, its build included, in a folder of its own. The build's
+// Testing folder is the folder's own, so that the test runs it starts keep their logs apart
+// from those of the run this test is part of.
 void layOutCheckout(const fs::path& folder, const fs::path& clips) {
   for (const auto& entry : fs::directory_iterator(kSource)) {
     const std::string name = entry.path().filename().string();
     if (name != "build" && name != ".git") fs::create_symlink(entry.path(), folder / name);
   }
-  fs::create_symlink(kBuild, folder / "build");
+  fs::create_directory(folder / "build");
+  for (const auto& entry : fs::directory_iterator(kBuild))
+    if (entry.path().filename() != "Testing")
+      fs::create_symlink(entry.path(), folder / "build" / entry.path().filename());
   for (const char* clip : kReadersClips) fs::create_symlink(clips / clip, folder / clip);
 }
 
