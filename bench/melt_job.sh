@@ -91,7 +91,7 @@ for run in $(seq "$runs"); do
     real_time=-1 "${melt_h264[@]}"
   measure melt-veltrane-2 mv2.mp4 melt melt-veltrane.mlt -consumer avformat:mv2.mp4 \
     real_time=-2 "${melt_h264[@]}"
-  measure render render.mp4 "$build_dir/bin/veltrane" render --plugin "$build_dir/lib/veltrane.so" \
+  measure render render.mp4 "$build_dir/bin/veltrane" render -y --plugin "$build_dir/lib/veltrane.so" \
     melt-diagonal.json -o render.mp4 --no-audio --quiet
   measure melt-composite-1 mc.mp4 melt melt-composite.mlt -consumer avformat:mc.mp4 \
     real_time=-1 "${melt_h264[@]}"

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "cli/cli_support.h"
+#include "cli/nearest_name.h"
 #include "cli/stop_signals.h"
 #include "commands/commands.h"
 #include "refhost/media/ffmpeg_utilities.h"
@@ -69,8 +70,10 @@ int main(int argc, char** argv) {
     if (args[0] == command.name) chosen = &command;
   }
   if (!chosen) {
-    std::fprintf(stderr, "veltrane: unknown command '%s' (see 'veltrane --help')\n",
-                 args[0].c_str());
+    std::vector<std::string> names;
+    for (const Command& command : kCommands) names.push_back(command.name);
+    std::fprintf(stderr, "veltrane: unknown command '%s'%s (see 'veltrane --help')\n",
+                 args[0].c_str(), veltrane_cli::didYouMean(args[0], names).c_str());
     return 2;
   }
   std::vector<std::string> rest(args.begin() + 1, args.end());
@@ -90,7 +93,8 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "veltrane %s: out of memory\n", chosen->name);
     return 1;
   } catch (const std::exception& error) {
-    std::fprintf(stderr, "veltrane %s: %s\n", chosen->name, error.what());
+    std::fprintf(stderr, "veltrane %s: %s\n", chosen->name,
+                 veltrane_cli::withModuleHint(error.what()).c_str());
     return 1;
   }
 }

@@ -1,6 +1,10 @@
 // Installing a composition into the host.
 #include "refhost/engine/composition.h"
 
+#include <algorithm>
+#include <climits>
+#include <cmath>
+
 #include "refhost/engine.h"
 #include "refhost/pipeline/frame_prefetch.h"
 
@@ -15,10 +19,50 @@ namespace {
 constexpr int32_t kDecodeAhead = 3;
 constexpr std::size_t kDecodeAheadBytes = std::size_t{128} << 20;
 
+// A file shown from later in it (MediaSpec::startSeconds and endSeconds): composition frame n
+// shows the file's frame n + start, and the last frame before the end holds from there on. The
+// times are taken to the nearest composition frame.
+class TrimmedSource : public MediaSource {
+ public:
+  TrimmedSource(std::shared_ptr<MediaSource> file, const MediaSpec& spec, FrameRate rate)
+      : file_(std::move(file)),
+        start_(static_cast<int32_t>(std::lround(spec.startSeconds * rate.perSecond()))),
+        end_(spec.endSeconds > 0 ? static_cast<int32_t>(std::ceil(spec.endSeconds * rate.perSecond() - 1e-6))
+                                 : 0) {}
+  RgbaImage frame(int32_t index, int32_t width, int32_t height, PixelFormat format) override {
+    return file_->frame(shifted(index), width, height, format);
+  }
+  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
+                              PixelFormat format) override {
+    return file_->glRows(shifted(index), width, height, format);
+  }
+  int32_t frameCount() const override {
+    int32_t count = file_->frameCount();
+    if (count == 0) return 0;
+    if (end_ > 0) count = std::min(count, end_);
+    return std::max(1, count - start_);
+  }
+  bool changesOverTime() const override { return file_->changesOverTime(); }
+  MediaInfo info() const override { return file_->info(); }
+
+ private:
+  int32_t shifted(int32_t index) const {
+    int64_t frame = int64_t{index} + start_;
+    if (end_ > 0) frame = std::min<int64_t>(frame, end_ - 1);
+    return static_cast<int32_t>(std::clamp<int64_t>(frame, INT32_MIN, INT32_MAX));
+  }
+
+  std::shared_ptr<MediaSource> file_;
+  int32_t start_;
+  int32_t end_;  // 0: the file's own end
+};
+
 // Sources that change over time (videos, the counter) decode ahead on a worker thread each.
 std::shared_ptr<MediaSource> opened(const MediaSpec& spec, FrameRate rate,
                                     const std::shared_ptr<DecodeAheadBudget>& budget) {
   std::shared_ptr<MediaSource> source = openMediaSource(spec, rate);
+  if (spec.startSeconds > 0 || spec.endSeconds > 0)
+    source = std::make_shared<TrimmedSource>(std::move(source), spec, rate);
   if (!source->changesOverTime()) return source;
   return std::make_shared<PrefetchingSource>(std::move(source), kDecodeAhead, budget);
 }

@@ -46,6 +46,10 @@ struct MediaSpec {
   // A picture of other proportions than the size asked for is shown whole at its own
   // proportions, centred, with transparent bars beside it ("contain"), instead of stretched.
   bool keepProportions = false;
+  // A file shown from later in it: the composition's frame 0 shows the time `startSeconds` of
+  // the file, and from `endSeconds` on (when above 0) its last frame before that time holds.
+  double startSeconds = 0;
+  double endSeconds = 0;
   // What the media turned out to hold when it was first opened (a scene's media are opened
   // as the scene is read); empty until then. Later openings take its word for what the file
   // is instead of probing it again.

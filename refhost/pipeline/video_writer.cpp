@@ -181,6 +181,10 @@ struct VideoWriter::Encoder {
     av_pix_fmt_get_chroma_sub_sample(codec->pix_fmt, &chromaShiftX, &chromaShiftY);
     codec->width = chromaShiftX ? (width + 1) & ~1 : width;
     codec->height = chromaShiftY ? (height + 1) & ~1 : height;
+    if (codec->width != width || codec->height != height)
+      addNote(std::to_string(width) + "x" + std::to_string(height) + " is written as " +
+              std::to_string(codec->width) + "x" + std::to_string(codec->height) + " (" + pixels +
+              " needs even sides; the last column or row is repeated)");
     const FrameRate exact = reduced(frameRate.valid() ? frameRate : FrameRate{25, 1});
     const AVRational rate{static_cast<int>(exact.numerator), static_cast<int>(exact.denominator)};
     codec->time_base = av_inv_q(rate);

@@ -20,9 +20,9 @@ target_compile_definitions(test_demo_frame PRIVATE VELTRANE_DEMO_FRAMES_DIR="${f
 
 add_test(NAME WindowsModule.ExportsAndImports COMMAND ${CMAKE_COMMAND}
          -DMODULE=$<TARGET_FILE:veltrane> -P ${CMAKE_CURRENT_SOURCE_DIR}/windows/module_tables.cmake)
-add_test(NAME DemoFrame.LinuxRender COMMAND ${VELTRANE_LINUX_BUILD_DIR}/bin/veltrane render
+add_test(NAME DemoFrame.LinuxRender COMMAND ${VELTRANE_LINUX_BUILD_DIR}/bin/veltrane render -y
          ${scene} -o ${frames}/linux.png --frame 40)
-add_test(NAME DemoFrame.WindowsRender COMMAND veltrane_cli render ${scene}
+add_test(NAME DemoFrame.WindowsRender COMMAND veltrane_cli render -y ${scene}
          -o ${frames}/windows.png --frame 40 --plugin $<TARGET_FILE:veltrane>)
 set_tests_properties(DemoFrame.LinuxRender DemoFrame.WindowsRender PROPERTIES
                      FIXTURES_SETUP demo_frames LABELS demo_frame)

@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <filesystem>
 
+#include "cli/nearest_name.h"
 #include "refhost/platform/shared_library.h"
 
 namespace veltrane_cli {
@@ -69,8 +70,12 @@ Arguments parseArguments(const std::vector<std::string>& args,
     throw UsageError(error.what());
   }
   for (const std::string& extra : app.remaining()) {
-    if (extra.size() > 1 && extra[0] == '-')
-      throw UsageError("unknown option '" + extra.substr(0, extra.find('=')) + "'");
+    if (extra.size() > 1 && extra[0] == '-') {
+      const std::string option = extra.substr(0, extra.find('='));
+      std::vector<std::string> names;
+      for (const OptionDefinition& definition : definitions) names.push_back(definition.name);
+      throw UsageError("unknown option '" + option + "'" + didYouMean(option, names));
+    }
   }
   for (std::size_t i = 0; i < definitions.size(); ++i) {
     if (declared[i]->count() == 0) continue;
@@ -125,15 +130,33 @@ std::string installedPluginPath() {
       .string();
 }
 
+namespace {
+
+// Where the module's path came from, for the message when it cannot be loaded.
+std::string pluginPathOrigin = "looked for beside the command";
+
+}  // namespace
+
 std::string pluginPath(const std::map<std::string, std::string>& options) {
   auto given = options.find("--plugin");
   if (given != options.end()) {
     if (given->second.empty()) throw UsageError("option '--plugin' needs a non-empty path");
+    pluginPathOrigin = "named by --plugin";
     return given->second;
   }
   const char* environment = std::getenv("VELTRANE_PLUGIN");
-  if (environment && *environment) return environment;
+  if (environment && *environment) {
+    pluginPathOrigin = "named by $VELTRANE_PLUGIN";
+    return environment;
+  }
+  pluginPathOrigin = "looked for beside the command, in ../lib";
   return installedPluginPath();
+}
+
+std::string withModuleHint(const std::string& message) {
+  if (message.rfind("cannot load plug-in module '", 0) != 0) return message;
+  return message + "; " + pluginPathOrigin +
+         "; name the module with --plugin PATH or the VELTRANE_PLUGIN variable";
 }
 
 }  // namespace veltrane_cli

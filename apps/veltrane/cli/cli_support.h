@@ -52,4 +52,8 @@ refhost::GlProfile glProfile(const std::map<std::string, std::string>& options);
 std::string pluginPath(const std::map<std::string, std::string>& options);
 std::string installedPluginPath();
 
+// A failure to load the module with, after it, where the path came from (the last pluginPath()
+// asked) and how to name another; other messages unchanged.
+std::string withModuleHint(const std::string& message);
+
 }  // namespace veltrane_cli

@@ -6,6 +6,7 @@
 #include <stdexcept>
 
 #include "cli/cli_support.h"
+#include "cli/output_safety.h"
 #include "cli/stop_signals.h"
 #include "commands/commands.h"
 #include "events/event_replay.h"
@@ -23,6 +24,7 @@ namespace fs = std::filesystem;
 
 const char kInteractHelp[] =
     "Usage: veltrane interact SCENE.json --events EVENTS.json -o RESULT.json [--overlay DIR]\n"
+    "                         [-y | -n]\n"
     "                         [--profile core|compat] [--plugin PATH] [--call-log FILE]\n"
     "\n"
     "Sets up the scene as 'veltrane render' does, then plays the events of EVENTS.json to the\n"
@@ -37,7 +39,9 @@ const char kInteractHelp[] =
     "RESULT.json receives every parameter's value (in the scene's form, ready to paste into a\n"
     "scene), the undo steps, and after each event the cursor, the selected input and whether\n"
     "the pointer is over it, the menus shown and what every message answered. The outputs\n"
-    "appear only when all are complete, as with 'render'.\n"
+    "appear only when all are complete, as with 'render', and, as there, files already under\n"
+    "their names are replaced with -y, kept with -n, and otherwise asked about on a terminal\n"
+    "and refused without one.\n"
     "\n"
     "Example (a script in the repository: drag one input's picture, then undo):\n"
     "  veltrane interact docs/examples/demo.json --events docs/examples/events/move-input.json \\\n"
@@ -48,6 +52,9 @@ const char kInteractHelp[] =
     "  -o, --output F  where the result goes (required)\n"
     "  --overlay DIR   also write DIR/event_0000.png, ...: after each event, the frame at the\n"
     "                  script's time with the plug-in's handles drawn over it\n"
+    "  -y, --overwrite replace outputs that are there already\n"
+    "  -n, --no-overwrite\n"
+    "                  keep them: refuse to run when one is there\n"
     "  --profile P     GL profile of the host's context: core (default) or compat\n"
     "  --plugin PATH   the module to load\n"
     "  --call-log FILE write every message and the host operations the plug-in called\n"
@@ -67,7 +74,11 @@ int runInteract(const std::vector<std::string>& args) {
                                            {"--overlay", true},
                                            {"--profile", true},
                                            {"--plugin", true},
-                                           {"--call-log", true}});
+                                           {"--call-log", true},
+                                           {"-y", false},
+                                           {"--overwrite", false},
+                                           {"-n", false},
+                                           {"--no-overwrite", false}});
   auto& options = parsed.options;
   if (parsed.positional.size() != 1) throw UsageError("expects one scene file");
   if (!options.count("--events")) throw UsageError("needs --events EVENTS.json");
@@ -77,15 +88,34 @@ int runInteract(const std::vector<std::string>& args) {
   refhost::GlProfile profile = glProfile(options);
   std::string module = pluginPath(options);
 
+  const Replacing replacing = replacingChoice(options);
+  // The result and the pictures never take an input's place; checked before anything is read.
+  const std::string& sceneFile = parsed.positional.front();
+  std::vector<std::string> inputs = sceneMediaFiles(sceneFile);
+  inputs.insert(inputs.end(), {sceneFile, options["--events"]});
+  const std::string outputOption = options.count("-o") ? "-o" : "--output";
+  refuseInputAsOutput(outputOption, output, inputs);
+  const bool withOverlay = options.count("--overlay") > 0;
+  const std::string overlayPattern =
+      withOverlay ? options["--overlay"] + "/event_%04d.png" : std::string();
+  if (withOverlay) refuseInputAsOutput("--overlay", overlayPattern, inputs);
+
   noteStopSignals();
-  Scene scene = loadScene(parsed.positional.front());
+  Scene scene = loadScene(sceneFile);
   EventScript script = loadEventScript(options["--events"]);
+  checkOutputNames(outputOption, output, {output}, replacing);
+  if (withOverlay) {
+    const refhost::OutputTarget pictures = refhost::parseOutputTarget(overlayPattern);
+    std::vector<std::string> names;
+    for (std::size_t event = 0; event < script.events.size(); ++event)
+      names.push_back(pictures.frameName(static_cast<int32_t>(event)));
+    checkOutputNames("--overlay", overlayPattern, names, replacing);
+  }
   std::optional<MadeFolder> overlayFolder;
   std::unique_ptr<refhost::FrameSink> overlays;
   if (options.count("--overlay")) {
     overlayFolder.emplace(options["--overlay"], "--overlay");
-    refhost::OutputTarget target =
-        refhost::parseOutputTarget(options["--overlay"] + "/event_%04d.png");
+    refhost::OutputTarget target = refhost::parseOutputTarget(overlayPattern);
     overlays = refhost::openFrameSink(target, scene.composition.width, scene.composition.height,
                                       scene.composition.frameRate);
   }

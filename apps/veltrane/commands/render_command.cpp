@@ -4,6 +4,7 @@
 
 #include "cli/cli_support.h"
 #include "commands/chunk_render.h"
+#include "cli/output_safety.h"
 #include "commands/commands.h"
 #include "commands/render_job.h"
 #include "scene/scene_document.h"
@@ -12,7 +13,8 @@ namespace veltrane_cli {
 namespace {
 
 const char kRenderHelp[] =
-    "Usage: veltrane render SCENE.json -o OUT [--frame N | --frames A-B]\n"
+    "Usage: veltrane render SCENE.json -o OUT [-y | -n]\n"
+    "                       [--frame N | --frames A-B | --from T --to T]\n"
     "                       [--codec C] [--crf N] [--preset P] [--bit-depth B]\n"
     "                       [--audio-from N|FILE | --audio-from layer NAME | --audio mix|N,M\n"
     "                       | --no-audio] [--strict] [--quiet] [--profile core|compat]\n"
@@ -33,6 +35,8 @@ const char kRenderExamples[] =
     "\n"
     "Examples:\n"
     "  veltrane render docs/examples/demo.json -o out.png --frame 40\n"
+    "  Seconds 1 to 2 as a video, replacing what is there:\n"
+    "  veltrane render docs/examples/demo.json -o part.mp4 --from 1 --to 2 -y\n"
     "  10-bit HEVC of frames 0 to 99 with the sound of another recording:\n"
     "  veltrane render scene.json -o out.mp4 --frames 0-99 --codec h265 --bit-depth 10 \\\n"
     "      --crf 18 --audio-from take2.wav\n"
@@ -54,8 +58,14 @@ int runRender(const std::vector<std::string>& arguments) {
   const AudioFrom audioFrom = takeAudioFrom(args);
   Arguments parsed = parseArguments(args, kRenderOutputOptions);
   if (parsed.positional.size() != 1) throw UsageError("expects one scene file");
-  outputName(parsed.options);  // checked before the scene is read
-  const Scene scene = loadScene(parsed.positional.front());
+  // Checked before the scene is read, so that an output that is an input is never touched.
+  const std::string& sceneFile = parsed.positional.front();
+  std::vector<std::string> inputs = sceneMediaFiles(sceneFile);
+  inputs.push_back(sceneFile);
+  if (audioFrom.kind == AudioFrom::Kind::File) inputs.push_back(audioFrom.name);
+  refuseInputAsOutput(parsed.options.count("-o") ? "-o" : "--output", outputName(parsed.options),
+                      inputs);
+  const Scene scene = loadScene(sceneFile);
   return renderScene(scene, parsed.options, audioFrom, "render");
 }
 

@@ -12,7 +12,10 @@
 #include <stdexcept>
 #include <thread>
 
+#include "cli/nearest_name.h"
+#include "cli/output_safety.h"
 #include "cli/stop_signals.h"
+#include "commands/frame_choice.h"
 #include "output/call_log.h"
 #include "output/made_folder.h"
 #include "output/progress_bar.h"
@@ -44,42 +47,6 @@ void keepFrameMemory() {
 // Image sequences are written by a worker per core, up to four.
 int imageWriters() {
   return static_cast<int>(std::clamp(std::thread::hardware_concurrency(), 1u, 4u));
-}
-
-FrameRange parseRange(const std::string& text) {
-  std::string::size_type dash = text.find('-', 1);
-  if (dash == std::string::npos) {  // one frame, as --frame N
-    const int32_t frame = parseInt32("--frames", text);
-    return {frame, frame};
-  }
-  FrameRange range{parseInt32("--frames", text.substr(0, dash)),
-                   parseInt32("--frames", text.substr(dash + 1))};
-  if (range.last < range.first)
-    throw UsageError("option '--frames' expects A <= B, got '" + text + "'");
-  return range;
-}
-
-FrameRange chooseFrames(const std::map<std::string, std::string>& options,
-                        const refhost::OutputTarget& target, const Scene& scene) {
-  if (options.count("--frame") && options.count("--frames"))
-    throw UsageError("give --frame or --frames, not both");
-  int32_t duration = scene.composition.duration;
-  FrameRange range{0, target.kind == refhost::OutputKind::Still ? 0 : duration - 1};
-  if (options.count("--frame")) {
-    int32_t frame = parseInt32("--frame", options.at("--frame"));
-    range = {frame, frame};
-  } else if (options.count("--frames")) {
-    range = parseRange(options.at("--frames"));
-  }
-  if (target.kind == refhost::OutputKind::Still && range.count() != 1)
-    throw UsageError("a ." +
-                     std::string(target.imageFormat == refhost::ImageFormat::Png ? "png" : "exr") +
-                     " output holds one frame; use a %04d pattern or a video for " +
-                     std::to_string(range.count()) + " frames");
-  if (range.first < 0 || range.last >= duration)
-    throw UsageError("frames " + std::to_string(range.first) + "-" + std::to_string(range.last) +
-                     " lie outside the scene's frames 0-" + std::to_string(duration - 1));
-  return range;
 }
 
 const char* optionOf(refhost::EncodingSetting setting) {
@@ -124,6 +91,21 @@ void chooseImageDepth(const std::map<std::string, std::string>& options,
   target.imageBitDepth = depth;
 }
 
+// "; did you mean ..." for a codec or preset name that is none of the known ones.
+std::string nearestEncodingName(const refhost::VideoEncoding& encoding) {
+  const refhost::VideoCodecInfo* codec = refhost::findVideoCodec(encoding.codec);
+  if (!codec) {
+    std::vector<std::string> names;
+    for (const refhost::VideoCodecInfo& known : refhost::videoCodecs()) names.push_back(known.name);
+    return didYouMean(encoding.codec, names);
+  }
+  const auto& presets = codec->presets;
+  if (encoding.preset &&
+      std::find(presets.begin(), presets.end(), *encoding.preset) == presets.end())
+    return didYouMean(*encoding.preset, presets);
+  return "";
+}
+
 // A video's encoding: the codec asked for or the container's, its defaults overridden by the
 // options. Refuses what the codec or the container cannot do.
 void chooseVideoEncoding(const std::map<std::string, std::string>& options,
@@ -141,7 +123,7 @@ void chooseVideoEncoding(const std::map<std::string, std::string>& options,
   if (options.count("--preset")) encoding.preset = options.at("--preset");
   if (auto refusal = refhost::refusalOf(encoding, target.container))
     throw UsageError(std::string("option '") + optionOf(refusal->setting) +
-                     "': " + refusal->reason);
+                     "': " + refusal->reason + nearestEncodingName(encoding));
   target.video = encoding;
 }
 
@@ -183,10 +165,12 @@ void refuseDamage(const Scene& scene) {
 }  // namespace
 
 const std::vector<OptionDefinition> kRenderOutputOptions = {
-    {"-o", true},          {"--output", true}, {"--frame", true},   {"--frames", true},
-    {"--codec", true},     {"--crf", true},    {"--preset", true},  {"--bit-depth", true},
-    {"--no-audio", false}, {"--quiet", false}, {"--profile", true}, {"--plugin", true},
-    {"--call-log", true},  {"--audio", true},  {"--strict", false}};
+    {"-o", true},           {"--output", true},    {"--frame", true},        {"--frames", true},
+    {"--from", true},       {"--to", true},        {"--codec", true},        {"--crf", true},
+    {"--preset", true},     {"--bit-depth", true}, {"--no-audio", false},    {"--quiet", false},
+    {"--profile", true},    {"--plugin", true},    {"--call-log", true},     {"-y", false},
+    {"--overwrite", false}, {"-n", false},         {"--no-overwrite", false}, {"--audio", true},
+    {"--strict", false}};
 
 const char kRenderOutputHelp[] =
     "OUT by its name:\n"
@@ -200,7 +184,10 @@ const char kRenderOutputHelp[] =
     "or encoded as AAC, or Opus in .webm, where the container needs it), as long as the video,\n"
     "silent where a clip's sound ends; a note says why a video is silent. Clips are numbered\n"
     "from 1: the effect's own source, then the scene's layers in order (for split, the clips\n"
-    "in the order given). A missing folder for OUT is made.\n"
+    "in the order given). A missing folder for OUT is made. OUT may not be an input (the\n"
+    "scene, its media, a clip): that is refused before anything is read. A file already\n"
+    "under OUT's name is replaced with -y, kept with -n; without either a terminal asks, and\n"
+    "without a terminal the render is refused.\n"
     "A damaged frame of a clip is shown as the decoder conceals it (or the last good frame is\n"
     "held), and a warning at the end names the clips that had any.\n"
     "Files appear under their names only when complete, a sequence's all at once; on any\n"
@@ -209,9 +196,11 @@ const char kRenderOutputHelp[] =
     "\n"
     "Output options:\n"
     "  -o, --output OUT   where the frames go (required)\n"
-    "  --frame N          render only frame N\n"
+    "  --frame N          render only frame N (or the frame shown at a time, e.g. 1.5)\n"
     "  --frames A-B       render frames A to B, or --frames N for frame N alone (default: every\n"
-    "                     frame)\n"
+    "                     frame); A and B may be times (1.0-2.0: the frames from 1 s until 2 s)\n"
+    "  --from T, --to T   render from time T, until time T (as FFmpeg's -ss and -to): seconds\n"
+    "                     (2.5, 500ms) or [HH:]MM:SS[.mmm] (00:01:02.500)\n"
     "  --codec C          a video's codec: h264 or h265 (.mp4, .mov, .mkv), prores (.mov,\n"
     "                     .mkv), ffv1 (.mkv; lossless, 4:4:4), vp9 or av1 (.webm, .mp4, .mkv)\n"
     "  --crf N            quality, lower is better: h264 and h265 0-51 (default 18 and 20),\n"
@@ -231,6 +220,8 @@ const char kRenderOutputHelp[] =
     "  --audio N,M,...    the sound of the clips listed, mixed (e.g. --audio 1,3)\n"
     "  --no-audio         leave the sound out of a video\n"
     "  --strict           fail on the first damaged frame of a clip instead of concealing it\n"
+    "  -y, --overwrite    replace an output that is there already\n"
+    "  -n, --no-overwrite keep it: refuse to render when one is there\n"
     "  --quiet            print no progress (into a log it is a line every few seconds)\n"
     "  --profile P        the profile of the host's OpenGL context: core (default) or compat\n"
     "                     (compatibility; not a video setting)\n"
@@ -260,7 +251,8 @@ RenderJob chooseRenderJob(const Scene& scene, const std::map<std::string, std::s
     chooseImageDepth(options, target);
   }
   glProfile(options);  // checked with the other options, before anything is read
-  job.frames = chooseFrames(options, target, scene);
+  job.frames = chooseFrames(options, target, scene.composition.duration,
+                            scene.composition.frameRate.perSecond());
   // The colour a video is converted to and tagged with is the composition's: the scene's own
   // choice, else its video source's, else BT.709 (see refhost::defaultColour).
   target.video.colour = scene.composition.colour;
@@ -274,8 +266,14 @@ RenderJob chooseRenderJob(const Scene& scene, const std::map<std::string, std::s
 }
 
 int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
-                const AudioFrom& audioFrom, const std::string& command) {
-  return runRenderJob(scene, chooseRenderJob(scene, options, audioFrom), options, command);
+                const AudioFrom& audioFrom, const std::string& command,
+                const std::vector<std::string>& notes) {
+  const RenderJob job = chooseRenderJob(scene, options, audioFrom);
+  checkOutputNames(options.count("-o") ? "-o" : "--output", job.target.path,
+                   outputFileNames(job.target, job.frames), replacingChoice(options));
+  for (const std::string& note : notes)
+    std::fprintf(stderr, "veltrane %s: note: %s\n", command.c_str(), note.c_str());
+  return runRenderJob(scene, job, options, command);
 }
 
 int runRenderJob(const Scene& scene, const RenderJob& job,

@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "cli/cli_support.h"
+#include "commands/frame_choice.h"
 #include "commands/render_sound.h"
 #include "refhost/pipeline/frame_output.h"
 #include "scene/scene_document.h"
@@ -21,13 +22,6 @@ extern const char kRenderOutputHelp[];
 // The output's name from -o/--output; UsageError when it is missing, given twice or not an
 // output kind.
 std::string outputName(const std::map<std::string, std::string>& options);
-
-// Frames first to last of the composition.
-struct FrameRange {
-  int32_t first = 0;
-  int32_t last = 0;
-  int32_t count() const { return last - first + 1; }
-};
 
 // What a render writes: the output with its encoding, the frames, and the sound a video
 // carries over their time.
@@ -52,8 +46,10 @@ RenderJob chooseRenderJob(const Scene& scene, const std::map<std::string, std::s
 int runRenderJob(const Scene& scene, const RenderJob& job,
                  const std::map<std::string, std::string>& options, const std::string& command);
 
-// chooseRenderJob, then runRenderJob.
+// chooseRenderJob, the output's names checked (an input, an existing file: see
+// cli/output_safety.h), `notes` printed, then runRenderJob.
 int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
-                const AudioFrom& audioFrom, const std::string& command);
+                const AudioFrom& audioFrom, const std::string& command,
+                const std::vector<std::string>& notes = {});
 
 }  // namespace veltrane_cli

@@ -158,16 +158,20 @@ SoundChoice chooseSound(const AudioFrom& from, const std::map<std::string, std::
   auto clip = [&](const std::string& path, bool required) {
     return refhost::AudioClip{path, startSeconds, seconds, required};
   };
+  // A trimmed clip's sound starts where its pictures do in its file.
+  auto clipOf = [&](const refhost::MediaSpec& spec, bool required) {
+    return refhost::AudioClip{spec.path, startSeconds + spec.startSeconds, seconds, required};
+  };
   if (from.kind == AudioFrom::Kind::File) return {{clip(checkedFile(from.name), true)}, ""};
   const std::vector<const refhost::MediaSpec*> media = sceneMedia(scene);
   SoundChoice choice;
   if (*asked) {
     for (int32_t number : chosenClips(from, mode, scene))
-      choice.clips.push_back(clip(media[static_cast<std::size_t>(number) - 1]->path, true));
+      choice.clips.push_back(clipOf(*media[static_cast<std::size_t>(number) - 1], true));
     if (choice.clips.empty()) choice.silence = "no clip has sound";
     return choice;
   }
-  if (hasSound(*media.front())) return {{clip(media.front()->path, false)}, ""};
+  if (hasSound(*media.front())) return {{clipOf(*media.front(), false)}, ""};
   const bool others = std::any_of(media.begin() + 1, media.end(),
                                   [](const refhost::MediaSpec* m) { return hasSound(*m); });
   choice.silence = clipNames(scene).front() + " " + noSoundOf(*media.front()) +

@@ -4,6 +4,7 @@
 #include <filesystem>
 
 #include "cli/cli_support.h"
+#include "cli/output_safety.h"
 #include "commands/commands.h"
 #include "commands/render_job.h"
 #include "commands/split_scene.h"
@@ -16,7 +17,8 @@ namespace {
 const char kSplitHelp[] =
     "Usage: veltrane split CLIP... -o OUT [--layout NAME] [--angle DEG] [--gap PIXELS]\n"
     "                      [--border WIDTH[,COLOUR[,OPACITY]]] [--radial-centre X,Y]\n"
-    "                      [--frame N:X,Y[,SCALE[,ROTATION]]] [--size WxH] [--fps R]\n"
+    "                      [--nudge N:X,Y[,SCALE[,ROTATION]]] [--trim N:START[-END]]\n"
+    "                      [--size WxH] [--fps R]\n"
     "                      [--duration first|longest|shortest] [--save-scene FILE.json]\n"
     "                      [render's output options]\n"
     "\n"
@@ -33,7 +35,8 @@ const char kSplitHelp[] =
     "--audio-from N and --audio N,M take these numbers.\n"
     "\n"
     "Layouts (--layout; default by the number of clips: diagonal-2 for 1 or 2, comic-3 for 3,\n"
-    "grid-2x2 for 4, radial-N for 5 to 8, grid-3x3 for 9):\n"
+    "grid-2x2 for 4, radial-N for 5 to 8, grid-3x3 for 9; a name without its count, such as\n"
+    "radial, slanted or grid, takes the one for the number of clips):\n"
     "  diagonal-2, vertical-2, horizontal-2     two pictures\n"
     "  slanted-2, slanted-3, slanted-4          columns leaning 15 degrees\n"
     "  z-3                                      three bands between two parallel slants\n"
@@ -54,10 +57,14 @@ const char kSplitHelp[] =
     "  --radial-centre X,Y\n"
     "                     the centre of a radial layout, in pixels from the frame's centre\n"
     "                     (y up)\n"
-    "  --frame N:X,Y[,SCALE[,ROTATION]]\n"
+    "  --nudge N:X,Y[,SCALE[,ROTATION]]\n"
     "                     nudge clip N's picture (N from 1, in the order given): X,Y pixels\n"
     "                     (y up), SCALE percent of its framed size, ROTATION degrees; may be\n"
     "                     given for several clips\n"
+    "  --trim N:START[-END]\n"
+    "                     show clip N from the time START of its file (and until END, its\n"
+    "                     last frame holding after it); times in seconds or [HH:]MM:SS[.mmm];\n"
+    "                     may be given for several clips\n"
     "  --size WxH         the frame size (default: the first clip's, upright)\n"
     "  --fps R            the frame rate: 30, 29.97 (= 30000/1001) or 30000/1001 (default:\n"
     "                     the first video's nominal rate, else 25; a note says which rate a\n"
@@ -65,7 +72,7 @@ const char kSplitHelp[] =
     "  --duration D       first (default): as long as the first clip; longest; shortest.\n"
     "                     Stills last as long as the composition\n"
     "  --save-scene FILE  also write the scene made, a scene file that 'render', 'interact'\n"
-    "                     and 'view' accept\n"
+    "                     and 'view' accept (replaced or kept as -y and -n say, like OUT)\n"
     "\n";
 
 const char kSplitExamples[] =
@@ -76,15 +83,17 @@ const char kSplitExamples[] =
     "    veltrane split left.mp4 right.mp4 -o split.mp4 --border 8\n"
     "  Three clips in comic panels, the cuts turned 10 degrees, the second clip's picture moved\n"
     "  40 pixels up and shown 10 % larger, as ProRes for an editor, and the scene kept:\n"
-    "    veltrane split a.mov b.mov c.mov --layout comic-3 --angle 10 --frame 2:0,40,110 \\\n"
+    "    veltrane split a.mov b.mov c.mov --layout comic-3 --angle 10 --nudge 2:0,40,110 \\\n"
     "        -o panels.mov --save-scene panels.json\n"
     "  Five clips in radial sectors around a point left of the centre, one still to check:\n"
     "    veltrane split 1.mp4 2.mp4 3.mp4 4.mp4 5.mp4 --radial-centre -200,0 -o check.png \\\n"
-    "        --frame 3:0,0,100,15\n"
+    "        --nudge 3:0,0,100,15\n"
     "  A photo beside two clips at NTSC's rate, with the sound of clips 2 and 3 mixed, as long\n"
     "  as the longest clip:\n"
     "    veltrane split photo.jpg a.mp4 b.mov -o out.mp4 --fps 29.97 --audio 2,3 \\\n"
-    "        --duration longest\n";
+    "        --duration longest\n"
+    "  The second clip from 12.5 s into its file, the first from 1 minute 2 seconds in:\n"
+    "    veltrane split a.mp4 b.mp4 --trim 2:12.5 --trim 1:01:02 -o late.mp4\n";
 
 }  // namespace
 
@@ -100,37 +109,33 @@ int runSplit(const std::vector<std::string>& arguments) {
   std::vector<OptionDefinition> definitions = kRenderOutputOptions;
   definitions.insert(definitions.end(), kSplitOptions.begin(), kSplitOptions.end());
   definitions.push_back({"--save-scene", true});
-  // --frame is render's frame to render (N) and split's nudge of a clip (N:X,Y...), as often
-  // as wanted: the nudges are the split's, the last plain number is the frame.
-  for (OptionDefinition& definition : definitions)
-    if (definition.name == "--frame") definition.repeatable = true;
   Arguments parsed = parseArguments(args, definitions);
   auto& options = parsed.options;
-  const std::string frameValues = options.count("--frame") ? options["--frame"] : "";
-  options.erase("--frame");
-  for (std::string::size_type at = 0; at <= frameValues.size();) {
-    const std::string::size_type end = std::min(frameValues.find(';', at), frameValues.size());
-    const std::string one = frameValues.substr(at, end - at);
-    if (!one.empty() && one.find(':') == std::string::npos) options["--frame"] = one;
-    at = end + 1;
-  }
   const bool render = options.count("-o") || options.count("--output");
   if (!render && !options.count("--save-scene"))
     throw UsageError("needs -o OUT (or --save-scene FILE.json alone)");
-  if (render) outputName(options);
   if (options.count("--save-scene") && options["--save-scene"].empty())
     throw UsageError("option '--save-scene' needs a non-empty path");
+  // Checked before any clip is read, so that an output that is a clip is never touched.
+  std::vector<std::string> inputs = parsed.positional;
+  if (audioFrom.kind == AudioFrom::Kind::File) inputs.push_back(audioFrom.name);
+  if (render)
+    refuseInputAsOutput(options.count("-o") ? "-o" : "--output", outputName(options), inputs);
+  if (options.count("--save-scene")) {
+    refuseInputAsOutput("--save-scene", options["--save-scene"], inputs);
+    if (render) refuseInputAsOutput("--save-scene", options["--save-scene"], {outputName(options)});
+  }
 
-  std::map<std::string, std::string> splitOptions = options;
-  if (!frameValues.empty()) splitOptions["--frame"] = frameValues;
   const SplitScene split =
-      buildSplitScene(splitRequestFrom(parsed.positional, splitOptions), pluginPath(options));
-  for (const std::string& note : split.notes)
-    std::fprintf(stderr, "veltrane split: note: %s\n", note.c_str());
+      buildSplitScene(splitRequestFrom(parsed.positional, options), pluginPath(options));
   const std::string saveTo = options.count("--save-scene") ? options["--save-scene"] : "";
   Scene scene = sceneFromJson(split.document, saveTo.empty() ? "split" : saveTo, ".");
+  if (!saveTo.empty()) checkOutputNames("--save-scene", saveTo, {saveTo}, replacingChoice(options));
+  // The notes come once the outputs are accepted, so that a refusal is the only line.
   int status = 0;
-  if (render) status = renderScene(scene, options, audioFrom, "split");
+  if (render) status = renderScene(scene, options, audioFrom, "split", split.notes);
+  for (const std::string& note : render ? std::vector<std::string>{} : split.notes)
+    std::fprintf(stderr, "veltrane split: note: %s\n", note.c_str());
   if (status == 0 && !saveTo.empty()) {
     std::string folder = std::filesystem::path(saveTo).parent_path().string();
     MadeFolder madeFolder(folder, "--save-scene");

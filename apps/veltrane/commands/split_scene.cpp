@@ -8,9 +8,12 @@
 #include <sstream>
 
 #include "cli/cli_support.h"
+#include "cli/nearest_name.h"
+#include "cli/time_values.h"
 #include "refhost/gl/headless_context.h"
 #include "refhost/media/media_source.h"
 #include "refhost/media/test_patterns.h"
+#include "scene/json_fields.h"
 
 namespace veltrane_cli {
 namespace {
@@ -56,6 +59,8 @@ struct Clip {
   bool video = false;
   std::string name;   // its layer's: the file's stem, a pattern's name, a colour
   std::string shown;  // as messages name it: the file's name, or the argument
+  double start = 0;  // seconds into the file its first frame shows (--trim)
+  double end = 0;    // seconds into the file it ends at; 0: the file's end
 };
 
 Clip readClip(const std::string& argument) {
@@ -69,7 +74,8 @@ Clip readClip(const std::string& argument) {
     if (!pattern)
       throw UsageError(shown +
                        ": expected pattern:bars, pattern:checker, pattern:gradient or "
-                       "pattern:counter");
+                       "pattern:counter" +
+                       didYouMean(name, refhost::patternNames(), "pattern:"));
     clip.source = {{"pattern", name}};
     clip.name = name;
     return clip;
@@ -105,7 +111,9 @@ Clip readClip(const std::string& argument) {
 
 int32_t framesOf(const Clip& clip, refhost::FrameRate rate) {
   if (!clip.video || !(clip.info.duration > 0)) return 0;
-  return std::max(1, static_cast<int32_t>(std::ceil(clip.info.duration * rate.perSecond() - 1e-6)));
+  const double seconds =
+      (clip.end > 0 ? std::min(clip.end, clip.info.duration) : clip.info.duration) - clip.start;
+  return std::max(1, static_cast<int32_t>(std::ceil(seconds * rate.perSecond() - 1e-6)));
 }
 
 // The composition's rate: the one asked for, else the first video's nominal rate, else 25; a
@@ -136,6 +144,25 @@ nlohmann::ordered_json rateJson(refhost::FrameRate rate) {
   return rate.text();
 }
 
+// A trim of a clip: its video shown from later in the file, refused for a clip without time.
+void applyTrim(const ClipTrim& trim, std::vector<Clip>& clips) {
+  const std::string shown = "option '--trim': ";
+  if (trim.input < 1 || trim.input > static_cast<int32_t>(clips.size()))
+    throw UsageError(shown + "expected a clip number from 1 to " + std::to_string(clips.size()) +
+                     ", got " + std::to_string(trim.input));
+  Clip& clip = clips[static_cast<std::size_t>(trim.input - 1)];
+  const std::string which = "clip " + std::to_string(trim.input) + " (" + clip.name + ")";
+  if (!clip.video || !(clip.info.duration > 0))
+    throw UsageError(shown + which + " is a still picture; only a video can be trimmed");
+  if (trim.startSeconds >= clip.info.duration)
+    throw UsageError(shown + which + " lasts " + numberText(clip.info.duration) +
+                     " s; a start of " + numberText(trim.startSeconds) + " s lies past its end");
+  clip.start = trim.startSeconds;
+  clip.end = trim.endSeconds.value_or(0);
+  if (clip.start > 0) clip.source["start"] = clip.start;
+  if (clip.end > 0) clip.source["end"] = clip.end;
+}
+
 // A parameter value as a scene file writes it, in the shape its declared kind has.
 nlohmann::ordered_json valueJson(const refhost::Param& declared, const refhost::ParamValue& value) {
   auto number = [](double v) { return std::round(v * 1e4) / 1e4; };  // no float noise in files
@@ -161,6 +188,7 @@ std::vector<Clip> readClips(const SplitRequest& request) {
     throw UsageError("expects 1 to 9 clips, got " + std::to_string(request.clips.size()));
   std::vector<Clip> clips;
   for (const std::string& argument : request.clips) clips.push_back(readClip(argument));
+  for (const ClipTrim& trim : request.trims) applyTrim(trim, clips);
   return clips;
 }
 
@@ -168,17 +196,18 @@ std::vector<Clip> readClips(const SplitRequest& request) {
 // nudges.
 std::size_t chooseLayout(const SplitRequest& request, std::size_t clips) {
   const std::string name = request.layout.value_or(defaultLayoutFor(static_cast<int32_t>(clips)));
-  const std::optional<std::size_t> layout = findLayout(name);
+  const std::optional<std::size_t> layout = findLayout(name, static_cast<int32_t>(clips));
   if (!layout)
     throw UsageError("option '--layout': expected one of " + layoutNames() + ", got '" + name +
-                     "'");
+                     "'" + didYouMean(name, layoutNamesTaken()));
   const LayoutInfo& info = layouts()[*layout];
   if (static_cast<int32_t>(clips) > info.regions)
-    throw UsageError("option '--layout': " + name + " shows " + std::to_string(info.regions) +
-                     " pictures, fewer than the " + std::to_string(clips) + " clips given");
+    throw UsageError("option '--layout': " + std::string(info.name) + " shows " +
+                     std::to_string(info.regions) + " pictures, fewer than the " +
+                     std::to_string(clips) + " clips given");
   for (const FrameNudge& nudge : request.nudges)
     if (nudge.input < 1 || nudge.input > static_cast<int32_t>(clips))
-      throw UsageError("option '--frame': expected a clip number from 1 to " +
+      throw UsageError("option '--nudge': expected a clip number from 1 to " +
                        std::to_string(clips) + ", got " + std::to_string(nudge.input));
   return *layout;
 }
@@ -440,9 +469,30 @@ FrameNudge parseNudge(const std::string& option, const std::string& text) {
   return nudge;
 }
 
+ClipTrim parseTrim(const std::string& option, const std::string& text) {
+  const std::string::size_type colon = text.find(':');
+  if (colon == std::string::npos || colon == 0)
+    throw UsageError("option '" + option +
+                     "' expects N:START[-END] (clip N from 1, times in seconds or "
+                     "[HH:]MM:SS[.mmm]), got '" +
+                     text + "'");
+  ClipTrim trim;
+  trim.input = parseInt32(option, text.substr(0, colon));
+  const std::string times = text.substr(colon + 1);
+  const std::string::size_type dash = times.find('-');
+  trim.startSeconds = parseSeconds(option, times.substr(0, dash));
+  if (dash != std::string::npos) {
+    trim.endSeconds = parseSeconds(option, times.substr(dash + 1));
+    if (*trim.endSeconds <= trim.startSeconds)
+      throw UsageError("option '" + option + "' expects END after START, got '" + text + "'");
+  }
+  return trim;
+}
+
 const std::vector<OptionDefinition> kSplitOptions = {
-    {"--layout", true}, {"--size", true}, {"--fps", true},           {"--duration", true},
-    {"--angle", true},  {"--gap", true},  {"--radial-centre", true}, {"--border", true}};
+    {"--layout", true},      {"--size", true},      {"--fps", true},           {"--duration", true},
+    {"--angle", true},       {"--gap", true},       {"--radial-centre", true}, {"--border", true},
+    {"--nudge", true, true}, {"--trim", true, true}};
 
 SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
                               const std::map<std::string, std::string>& options) {
@@ -461,9 +511,17 @@ SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
   if (auto* text = given("--radial-centre"))
     request.layoutOptions.radialCentre = parsePoint("--radial-centre", *text);
   if (auto* text = given("--border")) request.border = parseBorder("--border", *text);
-  if (auto* text = given("--frame"))
+  if (auto* text = given("--frame"); text && text->find(':') != std::string::npos)
+    throw UsageError(
+        "option '--frame' takes the frame to render (N, or a time); a clip's picture "
+        "is moved with --nudge " +
+        *text);
+  if (auto* text = given("--nudge"))
     for (const std::string& one : splitAt(*text, ';'))
-      if (one.find(':') != std::string::npos) request.nudges.push_back(parseNudge("--frame", one));
+      request.nudges.push_back(parseNudge("--nudge", one));
+  if (auto* text = given("--trim"))
+    for (const std::string& one : splitAt(*text, ';'))
+      request.trims.push_back(parseTrim("--trim", one));
   return request;
 }
 

@@ -17,12 +17,19 @@
 
 namespace veltrane_cli {
 
-// A nudge of one clip's framing, as `--frame N:X,Y[,SCALE[,ROTATION]]` gives it.
+// A nudge of one clip's framing, as `--nudge N:X,Y[,SCALE[,ROTATION]]` gives it.
 struct FrameNudge {
   int32_t input = 1;    // the clip's place on the command line, from 1
   Point offset{0, 0};   // frame pixels, x to the right, y up
   double scale = 100;   // percent of the framed size
   double rotation = 0;  // degrees
+};
+
+// Where in its file a clip begins (and ends), as `--trim N:START[-END]` gives it.
+struct ClipTrim {
+  int32_t input = 1;                 // the clip's place on the command line, from 1
+  double startSeconds = 0;           // the time in the file the composition's first frame shows
+  std::optional<double> endSeconds;  // the time the clip ends at; its last frame holds after
 };
 
 struct BorderSetting {
@@ -42,6 +49,7 @@ struct SplitRequest {
   LayoutOptions layoutOptions;
   std::optional<BorderSetting> border;
   std::vector<FrameNudge> nudges;
+  std::vector<ClipTrim> trims;
 };
 
 struct SplitScene {
@@ -54,14 +62,15 @@ struct SplitScene {
 // `modulePath` where its regions lie to frame each picture. Throws UsageError naming the
 // argument and what was expected: a missing or unreadable clip, one without a picture, more
 // than 9 clips, more clips than the layout has regions, an unknown layout (listing the known
-// ones), a --frame index out of range, a gap or centre the layout does not take.
+// ones), a --nudge or --trim clip number out of range, a trim past a clip's end, a gap or centre
+// the layout does not take.
 SplitScene buildSplitScene(const SplitRequest& request, const std::string& modulePath);
 
 // The options that shape a split, as `split` and `view` take them.
 extern const std::vector<OptionDefinition> kSplitOptions;
 // The request of the clips and the options (--size, --fps, --duration, --layout, --angle, --gap,
-// --radial-centre, --border, and the nudges among the --frame values: those of the form N:X,Y,
-// the values of a repeated --frame joined by ';').
+// --radial-centre, --border, and --nudge and --trim, the values of each repeated one joined by
+// ';'). A --frame of the old nudge's form (N:X,Y) is refused, naming --nudge.
 SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
                               const std::map<std::string, std::string>& options);
 
@@ -74,6 +83,7 @@ refhost::FrameRate parseFrameRate(const std::string& option, const std::string& 
 Point parsePoint(const std::string& option, const std::string& text);
 BorderSetting parseBorder(const std::string& option, const std::string& text);
 FrameNudge parseNudge(const std::string& option, const std::string& text);
+ClipTrim parseTrim(const std::string& option, const std::string& text);
 SplitRequest::Length parseLength(const std::string& option, const std::string& text);
 
 }  // namespace veltrane_cli

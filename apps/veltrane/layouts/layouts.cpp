@@ -7,6 +7,7 @@
 #include "layouts/layouts.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cmath>
 
 namespace veltrane_cli {
@@ -100,6 +101,16 @@ LayoutPlan basePlan(const std::string& name, double w, double h, std::optional<d
   return radialSectors(sectors, sectors == 4 ? 45 : 0);
 }
 
+// A layout's name without its count of pictures: "radial-5" and "grid-3x3" are "radial" and
+// "grid"; a name without a count is its own family.
+std::string familyOf(const std::string& name) {
+  const std::string::size_type dash = name.rfind('-');
+  if (dash == std::string::npos || dash + 1 >= name.size() ||
+      !std::isdigit(static_cast<unsigned char>(name[dash + 1])))
+    return name;
+  return name.substr(0, dash);
+}
+
 // Turns a point about the frame's centre the way directions turn: towards +x from +y.
 Point turned(Point p, double degrees) {
   const double a = degrees / kDegreesPerRadian;
@@ -110,10 +121,34 @@ Point turned(Point p, double degrees) {
 
 const std::vector<LayoutInfo>& layouts() { return kLayouts; }
 
-std::optional<std::size_t> findLayout(const std::string& name) {
-  for (std::size_t i = 0; i < kLayouts.size(); ++i)
+std::optional<std::size_t> findLayout(const std::string& name, int32_t pictures) {
+  std::optional<std::size_t> chosen;
+  for (std::size_t i = 0; i < kLayouts.size(); ++i) {
     if (name == kLayouts[i].name) return i;
-  return std::nullopt;
+    if (name != familyOf(kLayouts[i].name)) continue;
+    const int32_t regions = kLayouts[i].regions;
+    if (!chosen) {
+      chosen = i;
+      continue;
+    }
+    const int32_t best = kLayouts[*chosen].regions;
+    // Enough regions beats too few; of those enough, the fewest; of too few, the most.
+    const bool better = (regions >= pictures) != (best >= pictures)
+                            ? regions >= pictures
+                            : (regions >= pictures ? regions < best : regions > best);
+    if (better) chosen = i;
+  }
+  return chosen;
+}
+
+std::vector<std::string> layoutNamesTaken() {
+  std::vector<std::string> names;
+  for (const LayoutInfo& layout : kLayouts) names.push_back(layout.name);
+  for (const LayoutInfo& layout : kLayouts) {
+    const std::string family = familyOf(layout.name);
+    if (std::find(names.begin(), names.end(), family) == names.end()) names.push_back(family);
+  }
+  return names;
 }
 
 std::string layoutNames() {

@@ -36,9 +36,14 @@ struct LayoutInfo {
 
 // Every layout, in the Presets menu's order.
 const std::vector<LayoutInfo>& layouts();
-std::optional<std::size_t> findLayout(const std::string& name);
+// By its whole name ("radial-5"), or by its family's name without the count ("radial",
+// "diagonal", "grid", "z") for `pictures` pictures: the family's layout of that many regions,
+// else its smallest with more, else its largest.
+std::optional<std::size_t> findLayout(const std::string& name, int32_t pictures = 0);
 // "diagonal-2, vertical-2, ...": for messages.
 std::string layoutNames();
+// Every name findLayout takes: the layouts' and their families'.
+std::vector<std::string> layoutNamesTaken();
 // The layout a split of `inputs` pictures takes when none is named: diagonal-2 for 1 or 2,
 // comic-3 for 3, grid-2x2 for 4, radial-N for 5 to 8, grid-3x3 for 9.
 std::string defaultLayoutFor(int32_t inputs);

@@ -6,6 +6,7 @@
 #include <nlohmann/json.hpp>
 #include <set>
 #include <string>
+#include <vector>
 
 #include "refhost/core/params.h"
 #include "refhost/engine/composition.h"
@@ -30,7 +31,14 @@ struct Scene {
 // expected.
 Scene loadScene(const std::string& path);
 
-// The same for a parsed document; `baseDirectory` resolves relative file names.
+// The media files a scene file names, resolved against its folder, read from the document
+// alone: nothing is opened or decoded. Those it can find in a document that fails to read.
+std::vector<std::string> sceneMediaFiles(const std::string& path);
+
+// The media files of a composition: its own source's and its layers'.
+std::vector<std::string> mediaFilesOf(const refhost::Composition& composition);
+
+// The same as loadScene for a parsed document; `baseDirectory` resolves relative file names.
 Scene sceneFromJson(const nlohmann::ordered_json& document, const std::string& file,
                     const std::string& baseDirectory);
 

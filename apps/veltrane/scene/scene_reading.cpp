@@ -41,11 +41,14 @@ std::string mediaFileProblem(const std::filesystem::path& path) {
 MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
   const char* expected =
       "a source: {\"pattern\": NAME}, {\"color\": [r, g, b, a]} or {\"file\": PATH}, the last "
-      "with \"fit\" if it is to keep its proportions";
+      "with \"fit\" if it is to keep its proportions and \"start\" and \"end\" (seconds) to "
+      "show part of it";
   if (!field.present() || !field.json().is_object() || field.json().empty()) field.fail(expected);
-  field.requireObject({"pattern", "color", "file", "fit"});
-  const bool withFit = field.member("fit").present();
-  if (field.json().size() != (withFit ? 2u : 1u) || (withFit && !field.member("file").present()))
+  field.requireObject({"pattern", "color", "file", "fit", "start", "end"});
+  // Besides what a source is, a file may say how it is fitted and where in it to start and end.
+  std::size_t fileMembers = 0;
+  for (const char* member : {"fit", "start", "end"}) fileMembers += field.member(member).present();
+  if (field.json().size() != 1 + fileMembers || (fileMembers && !field.member("file").present()))
     field.fail(expected);
   if (JsonField pattern = field.member("pattern"); pattern.present()) {
     auto chosen = refhost::patternFromName(pattern.string("a pattern name"));
@@ -70,6 +73,13 @@ MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
     const std::string how = fit.string("\"stretch\" or \"contain\"");
     if (how != "stretch" && how != "contain") fit.fail("\"stretch\" or \"contain\"");
     spec.keepProportions = how == "contain";
+  }
+  if (JsonField start = field.member("start"); start.present())
+    spec.startSeconds = start.numberIn(0, 1e7);
+  if (JsonField end = field.member("end"); end.present()) {
+    spec.endSeconds = end.numberIn(0, 1e7);
+    if (spec.endSeconds <= spec.startSeconds)
+      end.fail("a time in seconds after \"start\" (" + numberText(spec.startSeconds) + ")");
   }
   try {
     // Opened once to prove it decodes, and to learn what the composition needs to know of it.
@@ -239,6 +249,34 @@ Scene sceneFromJson(const nlohmann::ordered_json& document, const std::string& f
     scene.params = params.json();
   }
   return scene;
+}
+
+std::vector<std::string> sceneMediaFiles(const std::string& path) {
+  std::vector<std::string> files;
+  try {
+    const nlohmann::ordered_json document = readJsonFile(path);
+    const std::filesystem::path base = std::filesystem::path(path).parent_path();
+    auto add = [&](const nlohmann::ordered_json& source) {
+      if (!source.is_object() || !source.contains("file") || !source["file"].is_string()) return;
+      std::filesystem::path file(source["file"].get<std::string>());
+      files.push_back((file.is_relative() ? base / file : file).lexically_normal().string());
+    };
+    if (document.is_object() && document.contains("source")) add(document["source"]);
+    if (document.is_object() && document.contains("layers") && document["layers"].is_array())
+      for (const auto& layer : document["layers"])
+        if (layer.is_object() && layer.contains("source")) add(layer["source"]);
+  } catch (const std::exception&) {
+    // Read again, and refused with its reason, when the scene is loaded.
+  }
+  return files;
+}
+
+std::vector<std::string> mediaFilesOf(const refhost::Composition& composition) {
+  std::vector<std::string> files;
+  if (composition.source.kind == MediaSpec::Kind::File) files.push_back(composition.source.path);
+  for (const refhost::CompositionLayer& layer : composition.layers)
+    if (layer.media.kind == MediaSpec::Kind::File) files.push_back(layer.media.path);
+  return files;
 }
 
 Scene loadScene(const std::string& path) {

@@ -63,6 +63,26 @@ void ViewCanvas::showPicture(uint32_t picture, int32_t frameWidth, int32_t frame
   glBindFramebuffer(GL_READ_FRAMEBUFFER, 0);
 }
 
+void ViewCanvas::clearOutside(const PixelRect& area) {
+  glBindFramebuffer(GL_DRAW_FRAMEBUFFER, canvasFramebuffer_);
+  glViewport(0, 0, width_, height_);
+  glEnable(GL_SCISSOR_TEST);
+  // The bands left, right, above and below the area, in GL's rows from the bottom.
+  const GLint left = whole(area.x), right = whole(area.x + area.width);
+  const GLint bottom = whole(height_ - (area.y + area.height)), top = whole(height_ - area.y);
+  const GLint bands[4][4] = {{0, 0, left, height_},
+                             {right, 0, width_ - right, height_},
+                             {left, top, right - left, height_ - top},
+                             {left, 0, right - left, bottom}};
+  for (const GLint* band : bands) {
+    if (band[2] <= 0 || band[3] <= 0) continue;
+    glScissor(band[0], band[1], band[2], band[3]);
+    glClearBufferfv(GL_COLOR, 0, kBackground);
+  }
+  glDisable(GL_SCISSOR_TEST);
+  glBindFramebuffer(GL_FRAMEBUFFER, 0);
+}
+
 void ViewCanvas::present() {
   glDisable(GL_SCISSOR_TEST);
   glBindFramebuffer(GL_READ_FRAMEBUFFER, canvasFramebuffer_);

@@ -26,6 +26,9 @@ class ViewCanvas {
   // (framebuffer pixels, y down): pixel for pixel when magnified, smoothed when reduced.
   void showPicture(uint32_t picture, int32_t pictureWidth, int32_t pictureHeight,
                    const PixelRect& where);
+  // Clears everything outside `area` (framebuffer pixels, y down): a zoomed picture and the
+  // handles over it stay within the picture area, clear of the chrome around it.
+  void clearOutside(const PixelRect& area);
   // Copies the canvas onto the window's framebuffer.
   void present();
 

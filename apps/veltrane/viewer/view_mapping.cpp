@@ -80,6 +80,12 @@ refhost::Matrix4 ViewMapping::projection(int32_t framebufferWidth,
   return m;
 }
 
+double densityScale(double contentScale, double dotsPerInch) {
+  constexpr double kDenseScreen = 100;  // dots per inch
+  constexpr double kDenseScale = 1.5;
+  return std::max(contentScale, dotsPerInch > kDenseScreen ? kDenseScale : 1.0);
+}
+
 double handleScale(double density, double viewScale) {
   if (!(viewScale > 0) || !std::isfinite(viewScale)) return density;
   const double band = 15.0 / (viewScale * viewScale);

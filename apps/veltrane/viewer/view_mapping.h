@@ -70,6 +70,11 @@ class ViewMapping {
   bool fitted_ = true;
 };
 
+// The UI scale a screen asks for: the desktop's content scale, and at least 1.5 on a screen
+// above 100 dots per inch, where handles drawn one pixel a unit are small and thin.
+// `dotsPerInch` is 0 when the screen does not say.
+double densityScale(double contentScale, double dotsPerInch);
+
 // The UI scale handed to the plug-in with the view scale `viewScale` (frame pixels per screen
 // pixel): the screen's density, raised where needed so that every handle the overlay draws can
 // be grabbed. The plug-in asks a cut's position control first, within a band of

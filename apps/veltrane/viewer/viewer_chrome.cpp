@@ -21,11 +21,19 @@ constexpr ImGuiWindowFlags kFixedWindow = ImGuiWindowFlags_NoMove | ImGuiWindowF
 const ImVec4 kFailureText{1.0f, 0.45f, 0.4f, 1.0f};
 const ImVec4 kUndoneText{0.55f, 0.55f, 0.55f, 1.0f};
 
-void menuBar(ViewerSession& session, ViewerActions& actions, ChromeLayout& layout) {
+// The handle sizes the View menu offers besides the screen's own.
+constexpr double kHandleScales[] = {1, 1.5, 2, 3};
+
+void menuBar(ViewerSession& session, const ChromeState& state, ViewerActions& actions,
+             ChromeLayout& layout) {
   if (!ImGui::BeginMainMenuBar()) return;
   layout.menuHeight = ImGui::GetWindowSize().y;
   if (ImGui::BeginMenu("File")) {
     actions.save = ImGui::MenuItem("Save", "Ctrl+S") || actions.save;
+    actions.saveAs = ImGui::MenuItem("Save As...", "Ctrl+Shift+S") || actions.saveAs;
+    actions.render =
+        ImGui::MenuItem("Render...", "Ctrl+R", false, !state.render.running) || actions.render;
+    ImGui::Separator();
     actions.quit = ImGui::MenuItem("Quit", "Ctrl+Q") || actions.quit;
     ImGui::EndMenu();
   }
@@ -39,6 +47,17 @@ void menuBar(ViewerSession& session, ViewerActions& actions, ChromeLayout& layou
   if (ImGui::BeginMenu("View")) {
     actions.fit = ImGui::MenuItem("Fit", "F") || actions.fit;
     actions.actualPixels = ImGui::MenuItem("Actual Pixels", "1") || actions.actualPixels;
+    if (ImGui::BeginMenu("Handle Size")) {
+      if (ImGui::MenuItem("As the screen asks", nullptr, !state.handleScaleChosen))
+        actions.uiScale = 0;
+      for (double scale : kHandleScales) {
+        char label[16];
+        std::snprintf(label, sizeof label, "%gx", scale);
+        if (ImGui::MenuItem(label, nullptr, state.handleScaleChosen && state.handleScale == scale))
+          actions.uiScale = scale;
+      }
+      ImGui::EndMenu();
+    }
     ImGui::EndMenu();
   }
   if (ImGui::BeginMenu("Presets")) {
@@ -96,7 +115,8 @@ void sidePanel(ViewerSession& session, const ChromeState& state, float top, floa
 void bottomBar(ViewerSession& session, const ChromeState& state, float windowWidth,
                float windowHeight, ChromeLayout& layout, ViewerActions& actions) {
   const ImGuiStyle& style = ImGui::GetStyle();
-  float rows = ImGui::GetFrameHeightWithSpacing() + ImGui::GetTextLineHeightWithSpacing();
+  // The timeline, then the status line or a running render's progress bar.
+  float rows = 2 * ImGui::GetFrameHeightWithSpacing();
   layout.bottomHeight = rows + 2 * style.WindowPadding.y;
   ImGui::SetNextWindowPos(ImVec2(0, windowHeight - layout.bottomHeight));
   ImGui::SetNextWindowSize(ImVec2(windowWidth - layout.panelWidth, layout.bottomHeight));
@@ -112,8 +132,20 @@ void bottomBar(ViewerSession& session, const ChromeState& state, float windowWid
   ImGui::SameLine();
   ImGui::Text("%s  (%d of %d, %g fps)", time.c_str(), session.frame() + 1, state.duration,
               state.frameRate);
-  bool modified = session.modified();
-  if (!session.status().empty()) {
+  // A note (such as where the scene was saved) holds until the next edit; a failure until the
+  // next note. The title bar says the same: modified or not.
+  const bool modified = session.modified();
+  if (state.render.running) {
+    const float share =
+        state.render.total > 0 ? static_cast<float>(state.render.done) / state.render.total : 0;
+    char text[64];
+    std::snprintf(text, sizeof text, "%d/%d", state.render.done, state.render.total);
+    if (ImGui::SmallButton("Stop")) actions.stopRender = true;
+    ImGui::SameLine();
+    ImGui::Text("rendering %s", state.render.output.c_str());
+    ImGui::SameLine();
+    ImGui::ProgressBar(share, ImVec2(-1, 0), text);
+  } else if (!session.status().empty() && (session.statusIsFailure() || !modified)) {
     if (session.statusIsFailure()) ImGui::PushStyleColor(ImGuiCol_Text, kFailureText);
     ImGui::TextUnformatted(session.status().c_str());
     if (session.statusIsFailure()) ImGui::PopStyleColor();
@@ -138,7 +170,7 @@ ViewerActions drawChrome(ViewerSession& session, const ChromeState& state, float
                          float windowHeight, ChromeLayout& layout) {
   ViewerActions actions;
   layout.panelWidth = kPanelWidth * state.uiScale;
-  menuBar(session, actions, layout);
+  menuBar(session, state, actions, layout);
   bottomBar(session, state, windowWidth, windowHeight, layout, actions);
   sidePanel(session, state, layout.menuHeight, windowHeight - layout.menuHeight, windowWidth,
             actions);

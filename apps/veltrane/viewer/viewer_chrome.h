@@ -14,6 +14,9 @@ namespace veltrane_viewer {
 
 struct ViewerActions {
   bool save = false;
+  bool saveAs = false;
+  bool render = false;
+  bool stopRender = false;
   bool quit = false;
   bool fit = false;
   bool actualPixels = false;
@@ -22,9 +25,10 @@ struct ViewerActions {
   bool togglePlay = false;
   int preset = -1;  // index into veltrane_cli::layouts()
   bool fitPictures = false;
-  int undoSteps = 0;   // how many steps the history list asked to undo
-  int redoSteps = 0;   // or to redo
-  int32_t frame = -1;  // the frame the timeline moved to
+  int undoSteps = 0;    // how many steps the history list asked to undo
+  int redoSteps = 0;    // or to redo
+  int32_t frame = -1;   // the frame the timeline moved to
+  double uiScale = -1;  // the handle size chosen in the View menu; 0: the screen's own
 };
 
 // The chrome's size in window units (ImGui's), which fixes the picture area.
@@ -34,13 +38,24 @@ struct ChromeLayout {
   float bottomHeight = 0;
 };
 
+// A render running in the background, shown in the bottom bar.
+struct RenderProgress {
+  bool running = false;
+  std::string output;
+  int done = 0;
+  int total = 0;
+};
+
 struct ChromeState {
-  std::string title;  // the scene file, shown in the status line
+  std::string title;  // the file Save writes, shown in the status line
   bool playing = false;
   double frameRate = 25;
   int32_t duration = 1;
   std::vector<LayerOption> layers;
-  float uiScale = 1;  // the display's content scale: the chrome grows with it
+  float uiScale = 1;               // the display's content scale: the chrome grows with it
+  double handleScale = 1;          // the UI scale handed to the plug-in for its handles
+  bool handleScaleChosen = false;  // chosen by the person rather than the screen's
+  RenderProgress render;
 };
 
 // Draws the chrome into the current ImGui frame of a window of the given size and returns what

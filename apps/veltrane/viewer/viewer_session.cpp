@@ -225,10 +225,14 @@ void ViewerSession::drawOverlay(uint32_t texture, int32_t width, int32_t height)
 bool ViewerSession::modified() { return snapshot() != saved_; }
 
 void ViewerSession::save(const std::string& path) {
+  writeCopy(path);
+  saved_ = snapshot();
+}
+
+void ViewerSession::writeCopy(const std::string& path) {
   finishEdit();
   veltrane_cli::writeScene(path,
                            veltrane_cli::savedScene(scene_, engine_->panel(), directoryOf(path)));
-  saved_ = snapshot();
 }
 
 }  // namespace veltrane_viewer

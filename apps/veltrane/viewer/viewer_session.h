@@ -103,6 +103,8 @@ class ViewerSession {
   bool modified();
   // Writes the scene with the current values to `path` (staged, then renamed).
   void save(const std::string& path);
+  // The same, without counting as saved: a copy for a render of the scene as it is now.
+  void writeCopy(const std::string& path);
 
   // Messages 4 and 1.
   void finish() { engine_->finish(); }

@@ -18,6 +18,7 @@
 #include "viewer/cursor_shapes.h"
 #include "viewer/view_canvas.h"
 #include "viewer/viewer_chrome.h"
+#include "viewer/viewer_document.h"
 #include "viewer/viewer_session.h"
 #include "viewer/window_system.h"
 
@@ -65,8 +66,11 @@ class ViewerWindow {
   void stepTo(int32_t frame);
   void drawFrame();
   void handleActions(const ViewerActions& actions);
-  void save();
   void updateTitle();
+  // The UI scale the handles are drawn at: the person's choice, else the screen's.
+  double baseHandleScale() const {
+    return chosenHandleScale_ > 0 ? chosenHandleScale_ : screenHandleScale_;
+  }
   int32_t chooseFromMenu(const std::string& items);
   ChromeState chromeState() const;
   void want(int frames) { pendingFrames_ = std::max(pendingFrames_, frames); }
@@ -83,6 +87,9 @@ class ViewerWindow {
   WindowHandle window_;
   float uiScale_ = 1;
   std::unique_ptr<ViewerSession> session_;
+  std::unique_ptr<ViewerDocument> document_;
+  double screenHandleScale_ = 1;
+  double chosenHandleScale_ = 0;  // 0: none chosen
   std::unique_ptr<ImGuiRuntime> imgui_;
   std::unique_ptr<ViewCanvas> canvas_;
   ViewMapping mapping_;
@@ -101,7 +108,6 @@ class ViewerWindow {
   Point2 pointer_;  // framebuffer pixels
   bool buttonInPicture_ = false;
   bool panning_ = false;
-  bool quit_ = false;
   bool playing_ = false;
   double playStartTime_ = 0;
   int32_t playStartFrame_ = 0;
@@ -136,6 +142,10 @@ ViewerWindow::ViewerWindow(const veltrane_cli::Scene& scene, const ViewOptions& 
                                              std::move(context), options.frame);
   session_->engine().setPopupMenuChooser(
       [this](const std::string& items) { return chooseFromMenu(items); });
+  document_ =
+      std::make_unique<ViewerDocument>(*session_, scene, options.savePath, options.modulePath);
+  screenHandleScale_ = densityScale(uiScale_, screenDotsPerInch());
+  chosenHandleScale_ = options.uiScale;
 
   glfwSetWindowUserPointer(window, this);
   glfwSetCursorPosCallback(window, [](GLFWwindow* w, double x, double y) {
@@ -151,6 +161,12 @@ ViewerWindow::ViewerWindow(const veltrane_cli::Scene& scene, const ViewOptions& 
     of(w).queue({InputEvent::Kind::Key, 0, 0, key, action, mods});
   });
   glfwSetWindowRefreshCallback(window, [](GLFWwindow* w) { of(w).want(1); });
+  // Closing the window asks first, as Quit does, when there are unsaved changes.
+  glfwSetWindowCloseCallback(window, [](GLFWwindow* w) {
+    glfwSetWindowShouldClose(w, GLFW_FALSE);
+    of(w).document_->requestQuit();
+    of(w).want(2);
+  });
   imgui_ = std::make_unique<ImGuiRuntime>(window, uiScale_);
   canvas_ = std::make_unique<ViewCanvas>();
   const int shapes[6] = {GLFW_ARROW_CURSOR, GLFW_IBEAM_CURSOR,   GLFW_CROSSHAIR_CURSOR,
@@ -162,14 +178,20 @@ ViewerWindow::~ViewerWindow() {
   glfwMakeContextCurrent(window_.get());
   canvas_.reset();
   imgui_.reset();
+  document_.reset();
   session_.reset();
   for (GLFWcursor* cursor : cursors_) glfwDestroyCursor(cursor);
 }
 
 void ViewerWindow::run() {
   glfwShowWindow(window_.get());
-  while (!glfwWindowShouldClose(window_.get()) && !quit_) {
+  while (!document_->quitting()) {
     waitForEvents();
+    // A background render's progress is shown as it moves, and its end.
+    const RenderProgress before = document_->renderProgress();
+    document_->pollRender();
+    const RenderProgress after = document_->renderProgress();
+    if (after.running != before.running || after.done != before.done) want(1);
     double start = glfwGetTime();
     int renders = session_->stats().renders;
     glfwGetWindowSize(window_.get(), &windowWidth_, &windowHeight_);
@@ -188,7 +210,6 @@ void ViewerWindow::run() {
       times.seconds += glfwGetTime() - start;
     }
   }
-  if (session_->modified()) std::fprintf(stderr, "veltrane view: closed with unsaved changes\n");
   session_->finish();
   if (options_.stats) printStats();
 }
@@ -200,6 +221,8 @@ void ViewerWindow::waitForEvents() {
     double next = playStartTime_ + (session_->frame() - playStartFrame_ + 1) /
                                        std::max(scene_.composition.frameRate.perSecond(), 0.001);
     glfwWaitEventsTimeout(std::max(next - glfwGetTime(), 0.0));
+  } else if (document_->renderProgress().running) {
+    glfwWaitEventsTimeout(0.1);  // the render's progress bar moves on
   } else if (previewing()) {
     // Woken when the pointer comes to rest, to show the frame at full size.
     glfwWaitEventsTimeout(std::max(lastDragMove_ + kRestSeconds - glfwGetTime(), 0.0));
@@ -226,7 +249,7 @@ EventPosition ViewerWindow::eventAt(Point2 pixel) const {
 }
 
 void ViewerWindow::updateView() {
-  session_->setView(mapping_.viewScale(), handleScale(uiScale_, mapping_.viewScale()),
+  session_->setView(mapping_.viewScale(), handleScale(baseHandleScale(), mapping_.viewScale()),
                     mapping_.projection(framebufferWidth_, framebufferHeight_));
 }
 
@@ -300,6 +323,11 @@ void ViewerWindow::onButton(const InputEvent& event) {
 }
 
 void ViewerWindow::onKey(const InputEvent& event) {
+  if (document_->dialogOpen()) {  // the dialog's own keys; the rest goes to its fields
+    if (event.action == GLFW_PRESS) document_->dialogKey(event.code);
+    want(2);
+    return;
+  }
   if (ImGui::GetIO().WantTextInput) return;  // typing into a field
   want(2);
   if (uint32_t keysym = keysymFor(event.code); keysym && event.action != GLFW_REPEAT) {
@@ -314,8 +342,13 @@ bool ViewerWindow::onViewerKey(int key, int mods) {
     if (key == GLFW_KEY_Z && (mods & GLFW_MOD_SHIFT)) return session_->redo();
     if (key == GLFW_KEY_Z) return session_->undo();
     if (key == GLFW_KEY_Y) return session_->redo();
-    if (key == GLFW_KEY_S) save();
-    if (key == GLFW_KEY_Q) quit_ = true;
+    if (key == GLFW_KEY_S && (mods & GLFW_MOD_SHIFT)) {
+      document_->openSaveAs();
+    } else if (key == GLFW_KEY_S) {
+      document_->save();
+    }
+    if (key == GLFW_KEY_R) document_->openRender();
+    if (key == GLFW_KEY_Q) document_->requestQuit();
     return true;
   }
   switch (key) {
@@ -394,12 +427,15 @@ void ViewerWindow::updateCursor() {
 
 ChromeState ViewerWindow::chromeState() const {
   ChromeState state;
-  state.title = std::filesystem::path(scene_.file).filename().string();
+  state.title = std::filesystem::path(document_->savePath()).filename().string();
   state.playing = playing_;
   state.frameRate = scene_.composition.frameRate.perSecond();
   state.duration = scene_.composition.duration;
   state.layers = layers_;
   state.uiScale = uiScale_;
+  state.handleScale = baseHandleScale();
+  state.handleScaleChosen = chosenHandleScale_ > 0;
+  state.render = document_->renderProgress();
   return state;
 }
 
@@ -409,6 +445,11 @@ void ViewerWindow::drawFrame() {
   ImGui::NewFrame();
   ViewerActions actions = drawChrome(*session_, chromeState(), static_cast<float>(windowWidth_),
                                      static_cast<float>(windowHeight_), layout_);
+  const bool dialogWasOpen = document_->dialogOpen();
+  document_->drawDialogs();
+  // A dialog closes on the frame after its answer: draw that frame, and one more for ImGui to
+  // let go of the keyboard.
+  if (dialogWasOpen != document_->dialogOpen()) want(2);
   ImGui::Render();
   handleActions(actions);
 
@@ -427,6 +468,7 @@ void ViewerWindow::drawFrame() {
   canvas_->showPicture(session_->pictureTexture(), session_->pictureWidth(),
                        session_->pictureHeight(), mapping_.frameRect());
   session_->drawOverlay(canvas_->texture(), framebufferWidth_, framebufferHeight_);
+  canvas_->clearOutside(mapping_.area());
   canvas_->present();
   glViewport(0, 0, framebufferWidth_, framebufferHeight_);
   ImGui_ImplOpenGL3_RenderDrawData(ImGui::GetDrawData());
@@ -437,8 +479,15 @@ void ViewerWindow::drawFrame() {
 
 void ViewerWindow::handleActions(const ViewerActions& actions) {
   bool acted = true;
-  if (actions.save) save();
-  if (actions.quit) quit_ = true;
+  if (actions.save) document_->save();
+  if (actions.saveAs) document_->openSaveAs();
+  if (actions.render) document_->openRender();
+  if (actions.stopRender) document_->stopRender();
+  if (actions.quit) document_->requestQuit();
+  if (actions.uiScale >= 0) {
+    chosenHandleScale_ = actions.uiScale;
+    updateView();
+  }
   if (actions.fit) mapping_.fit();
   if (actions.actualPixels) mapping_.showActualPixels();
   if (actions.undo) session_->undo();
@@ -449,36 +498,16 @@ void ViewerWindow::handleActions(const ViewerActions& actions) {
   for (int i = 0; i < actions.undoSteps; ++i) session_->undo();
   for (int i = 0; i < actions.redoSteps; ++i) session_->redo();
   if (actions.frame >= 0) stepTo(actions.frame);
-  acted = actions.save || actions.fit || actions.actualPixels || actions.undo || actions.redo ||
-          actions.togglePlay || actions.preset >= 0 || actions.fitPictures || actions.undoSteps ||
-          actions.redoSteps || actions.frame >= 0;
+  acted = actions.save || actions.saveAs || actions.render || actions.quit ||
+          actions.uiScale >= 0 || actions.fit || actions.actualPixels || actions.undo ||
+          actions.redo || actions.togglePlay || actions.preset >= 0 || actions.fitPictures ||
+          actions.undoSteps || actions.redoSteps || actions.frame >= 0;
   if (acted) want(1);
 }
 
-void ViewerWindow::save() {
-  std::string path = options_.savePath.empty() ? scene_.file : options_.savePath;
-  try {
-    session_->save(path);
-  } catch (const std::exception& error) {
-    session_->setStatus(error.what(), true);
-    std::fprintf(stderr, "veltrane view: %s\n", error.what());
-    return;
-  }
-  session_->setStatus("saved " + path, false);
-  // What was saved and the edits that led to it, for the terminal the viewer runs in.
-  auto quotedList = [](const std::vector<std::string>& steps) {
-    std::string list;
-    for (const std::string& step : steps) list += (list.empty() ? "\"" : ", \"") + step + "\"";
-    return list.empty() ? std::string("none") : list;
-  };
-  std::printf("saved %s; undo history: %s; undone: %s\n", path.c_str(),
-              quotedList(session_->engine().undoStepNames()).c_str(),
-              quotedList(session_->engine().redoStepNames()).c_str());
-  std::fflush(stdout);
-}
-
 void ViewerWindow::updateTitle() {
-  std::string title = "veltrane view - " + std::filesystem::path(scene_.file).filename().string() +
+  std::string title = "veltrane view - " +
+                      std::filesystem::path(document_->savePath()).filename().string() +
                       (session_->modified() ? " *" : "");
   if (title == title_) return;
   title_ = title;

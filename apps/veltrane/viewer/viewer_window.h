@@ -17,6 +17,7 @@ struct ViewOptions {
   int32_t frame = 0;
   std::string savePath;  // where Ctrl+S writes: the scene file itself unless given
   bool stats = false;    // print frame and render counts when the window closes
+  double uiScale = 0;    // the handles' size factor; 0: from the screen's density
 };
 
 // Opens the window on the scene and runs until it is closed. Throws std::runtime_error when no

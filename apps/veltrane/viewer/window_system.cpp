@@ -82,6 +82,15 @@ ImGuiRuntime::~ImGuiRuntime() {
   ImGui::DestroyContext();
 }
 
+double screenDotsPerInch() {
+  GLFWmonitor* monitor = glfwGetPrimaryMonitor();
+  const GLFWvidmode* mode = monitor ? glfwGetVideoMode(monitor) : nullptr;
+  int widthMillimetres = 0, heightMillimetres = 0;
+  if (monitor) glfwGetMonitorPhysicalSize(monitor, &widthMillimetres, &heightMillimetres);
+  if (!mode || widthMillimetres <= 0) return 0;
+  return mode->width * 25.4 / widthMillimetres;
+}
+
 uint32_t keysymFor(int key) {
   switch (key) {
     case GLFW_KEY_LEFT_SHIFT:

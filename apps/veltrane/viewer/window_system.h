@@ -47,6 +47,9 @@ class ImGuiRuntime {
   ImGuiRuntime& operator=(const ImGuiRuntime&) = delete;
 };
 
+// The dots per inch of the screen the window is on (the primary one), 0 when it does not say.
+double screenDotsPerInch();
+
 struct InputEvent {
   enum class Kind { Move, Button, Scroll, Key } kind = Kind::Move;
   double x = 0;  // Move: window position; Scroll: offsets

@@ -98,7 +98,7 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
       badRender({"-o", out, "--frames", "4-2"}, "option '--frames' expects A <= B, got '4-2'"),
       badRender({"-o", out, "--frames", "5-10"}, "frames 5-10 lie outside the scene's frames 0-9"),
       badRender({"-o", out, "--frame", "1", "--frames", "1-2"},
-                "give --frame or --frames, not both"),
+                "give --frame, --frames or --from/--to, not more than one"),
       badRender({"-o", out, "--profile", "es"},
                 "option '--profile' expects core or compat, got 'es'"),
       {{"interact", scene, "--events", folder.file("events.json"), "-o", folder.file("r.json"),

@@ -1,11 +1,12 @@
-// What the command line leaves when writing fails or it is stopped: one line naming the output,
-// nothing new on disk, and every file that was there before as it was.
+// What the command line leaves when an output is refused, writing fails or it is stopped: one
+// line naming the output, nothing new on disk, and every file that was there before as it was.
 #include <gtest/gtest.h>
 #include <sched.h>
 #include <signal.h>
 #include <sys/mount.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstring>
 #include <filesystem>
@@ -35,13 +36,14 @@ std::string enterMountNamespace() {
   return mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) ? std::strerror(errno) : "";
 }
 
-// A tmpfs of that many 4 KiB pages, seen by this process and the commands it starts.
+// A tmpfs of that many 4 KiB pages (read-only when asked), seen by this process and the commands
+// it starts.
 class SmallFileSystem : public ScratchDirectory {
  public:
-  explicit SmallFileSystem(std::size_t pages) {
+  explicit SmallFileSystem(std::size_t pages, unsigned long flags = 0) {
     static const std::string failure = enterMountNamespace();
     std::string size = "size=" + std::to_string(pages * 4096);
-    if (!failure.empty() || mount("tmpfs", path().c_str(), "tmpfs", 0, size.c_str()) != 0)
+    if (!failure.empty() || mount("tmpfs", path().c_str(), "tmpfs", flags, size.c_str()) != 0)
       throw std::runtime_error("cannot mount a tmpfs (needs root or user namespaces): " +
                                (failure.empty() ? std::strerror(errno) : failure));
   }
@@ -57,7 +59,8 @@ std::map<std::string, std::string> snapshot(const std::string& folder) {
 }
 
 // Runs `command` (render or interact) on the small scene of `frames` frames and a script of
-// `events` pointer moves, with the options' values (every second item) named in `folder`.
+// `events` pointer moves, with the options' values (every second item) named in `folder`, and
+// -y to replace what is there.
 CliRun runOn(const std::string& command, int frames, int events,
              const std::vector<std::string>& options, const std::string& folder,
              const std::function<void(int)>& whileRunning = nullptr) {
@@ -68,6 +71,7 @@ CliRun runOn(const std::string& command, int frames, int events,
   if (command == "interact") args.insert(args.end(), {"--events", inputs.file("events.json")});
   for (std::size_t i = 0; i < options.size(); ++i)
     args.push_back(i % 2 ? folder + "/" + options[i] : options[i]);
+  args.push_back("-y");  // the files there are to be replaced
   return runCli(args, VELTRANE_MODULE_PATH, whileRunning);
 }
 
@@ -88,7 +92,7 @@ TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
       {"render", {"-o", n + ".png"}, {n + ".png"}, 0, n + "\\.png" + full},  // near the name limit
       // Several writers race for the last free pages: any frame may be the first refused.
       {"render", {"-o", n + "%04d.png"}, {n + "0003.png"}, 5, n + "00[0-2][0-9]\\.png" + full},
-      {"render", {"-o", "s%d.png"}, {"s1.png", "s2.png/"}, 256, "s2\\.png: cannot replace it: .*"},
+      {"render", {"-o", "s%d.png"}, {"s1.png", "s2.png/"}, 256, "s2\\.png: is a folder; .*"},
       {"render", {"-o", "v.mp4"}, {"v.mp4"}, 0, "v\\.mp4: cannot write video: .*space.*"},
       {"interact", {"-o", "r"}, {"r"}, 0, "r" + full},
       {"interact", {"-o", "r", "--overlay", "o/v"}, {"r"}, 2, "o/v/event_000[1-9].png" + full},
@@ -107,6 +111,74 @@ TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
         << run.err;
     EXPECT_EQ(snapshot(disk.path()), before) << c.error;
   }
+}
+
+// Outputs refused before anything is read or written: an input named as the output (through a
+// link, a hard link, a frame pattern), a folder under the output's name, a place that takes no
+// files, and a file already there unless -y replaces it.
+TEST(OutputWrites, RefusedOutputsAreOneLineAndWriteNothing) {
+  ScratchDirectory folder;
+  const std::string a = folder.file("a.mp4");
+  commandOutput("ffmpeg -v error -f lavfi -i testsrc2=size=64x36:rate=25 -t 0.4 -pix_fmt yuv420p " +
+                a);
+  writeText(folder.file("layer.png"), slurp(a));  // any bytes: refused before it is read
+  json scene = smallScene("bars", 2);
+  scene["layers"][0]["source"] = {{"file", "layer.png"}};
+  const std::string scenePath = writeScene(folder, scene);
+  fs::create_symlink("a.mp4", folder.file("link.mp4"));
+  fs::create_hard_link(folder.file("layer.png"), folder.file("f0001.png"));
+  fs::create_directory(folder.file("folder.png"));
+  writeText(folder.file("there.png"), "old");
+  writeText(folder.file("events.json"), R"({"events": []})");
+  SmallFileSystem readOnly(16, MS_RDONLY);
+  struct Case {
+    std::vector<std::string> args;
+    int status;
+    std::string line;  // the one line on stderr, from its start
+  } const cases[] = {
+      {{"split", a, "pattern:bars", "-o", folder.file("link.mp4")},
+       2,
+       "veltrane split: option '-o': " + folder.file("link.mp4") + " is the input " + a},
+      {{"split", a, "pattern:bars", "-o", folder.file("o.png"), "--save-scene", a},
+       2,
+       "veltrane split: option '--save-scene': " + a + " is the input " + a},
+      {{"render", scenePath, "-o", folder.file("f%04d.png")},
+       2,
+       "veltrane render: option '-o': " + folder.file("f%04d.png") + " is the input " +
+           folder.file("layer.png")},
+      {{"interact", scenePath, "--events", folder.file("events.json"), "-o",
+        folder.file("events.json")},
+       2,
+       "veltrane interact: option '-o': " + folder.file("events.json") + " is the input"},
+      {{"split", a, "-o", folder.file("folder.png")},
+       1,
+       "veltrane split: " + folder.file("folder.png") + ": is a folder; -o names a file"},
+      {{"split", a, "-o", readOnly.file("new/out.mp4")},
+       1,
+       "veltrane split: " + readOnly.file("new/out.mp4") + ": cannot write in " + readOnly.path() +
+           ": Read-only file system"},
+      {{"split", a, "-o", folder.file("there.png")},
+       2,
+       "veltrane split: " + folder.file("there.png") + " exists; give -y to replace or -n"},
+      {{"split", a, "-o", folder.file("there.png"), "-n"},
+       1,
+       "veltrane split: " + folder.file("there.png") + " exists; kept as -n asks"},
+      {{"split", a, "-o", folder.file("there.png"), "-y", "-n"},
+       2,
+       "veltrane split: give -y (replace outputs) or -n (keep them), not both"},
+  };
+  const std::map<std::string, std::string> before = snapshot(folder.path());
+  for (const Case& c : cases) {
+    CliRun run = runCli(c.args);
+    EXPECT_EQ(run.status, c.status) << c.line;
+    EXPECT_EQ(run.err.rfind(c.line, 0), 0u) << run.err;
+    EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << run.err;
+    EXPECT_EQ(snapshot(folder.path()), before) << c.line;
+    EXPECT_TRUE(fs::is_empty(readOnly.path()));
+  }
+  CliRun replaced = runCli({"split", a, "-o", folder.file("there.png"), "-y"});
+  EXPECT_EQ(replaced.status, 0) << replaced.err;
+  EXPECT_NE(slurp(folder.file("there.png")), "old");
 }
 
 // Sends the signal once the command has written into a temporary, and had a moment more.

@@ -125,7 +125,7 @@ TEST(RenderAudio, VideoOutputsCarryTheSoundAskedFor) {
       {"",
        0,
        {none, quiet},
-       "none.mp4",
+       "without.mp4",
        "",
        0,
        0,

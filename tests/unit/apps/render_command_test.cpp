@@ -69,14 +69,6 @@ TEST(RenderCommand, EveryOutputKindCarriesTheFramesAskedInOrder) {
   EXPECT_EQ(folder.entries().size(), 33u);  // scene, still, 29 frames, two videos: nothing else
 }
 
-TEST(RenderCommand, TheShippedDemoSceneRenders) {
-  ScratchDirectory folder;
-  CliRun run = runCli({"render", std::string(VELTRANE_SOURCE_DIR) + "/docs/examples/demo.json",
-                       "-o", folder.file("demo.png"), "--frame", "40", "--profile", "compat"});
-  ASSERT_EQ(run.status, 0) << run.err;
-  EXPECT_EQ(refhost::readImageFile(folder.file("demo.png")).width, 640);
-}
-
 // The bare-GL replica of `--floor` draws the effect's own picture (the bench stops when it does
 // not); every case gets its times.
 TEST(BenchCommand, ReportsEveryCase) {

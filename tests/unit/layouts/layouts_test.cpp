@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <map>
+#include <tuple>
 
 #include "refhost/engine.h"
 #include "refhost/gl/headless_context.h"
@@ -142,7 +143,15 @@ TEST(Layouts, NamesOptionsAndRefusals) {
     EXPECT_EQ(defaultLayoutFor(inputs), name) << inputs;
     EXPECT_TRUE(findLayout(name)) << name;
   }
-  EXPECT_FALSE(findLayout("diagonal"));
+  // A family's name without its count takes the layout for the number of pictures.
+  const std::tuple<const char*, int, const char*> families[] = {
+      {"diagonal", 2, "diagonal-2"}, {"radial", 5, "radial-5"},
+      {"radial", 2, "radial-3"},     {"radial", 9, "radial-8"},
+      {"slanted", 3, "slanted-3"},   {"grid", 3, "grid-2x2"},
+      {"grid", 5, "grid-3x3"},       {"z", 3, "z-3"}};
+  for (const auto& [family, pictures, name] : families)
+    EXPECT_EQ(layouts()[findLayout(family, pictures).value()].name, std::string(name)) << family;
+  EXPECT_FALSE(findLayout("zigzag", 2));
   EXPECT_THROW(planLayout(*findLayout("diagonal-2"), 320, 180, {0, 20.0, std::nullopt}),
                std::invalid_argument);
   EXPECT_THROW(planLayout(*findLayout("slanted-4"), 320, 180, {0, 200.0, std::nullopt}),

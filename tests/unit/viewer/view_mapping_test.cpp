@@ -86,5 +86,13 @@ TEST(ViewMapping, ZoomKeepsThePivotPanMovesResizingKeepsTheCentreEventsRound) {
   EXPECT_EQ(std::make_pair(far.x, far.y), std::make_pair(1000000000, 0));
 }
 
+// Handles grow on dense screens: the desktop's scale, and at least 1.5 above 100 dpi.
+TEST(ViewMapping, DenseScreensDrawLargerHandles) {
+  const double cases[][3] = {{1, 0, 1},     {1, 96, 1},  {1, 100, 1},     {1, 101, 1.5},
+                             {1, 220, 1.5}, {2, 220, 2}, {1.25, 96, 1.25}};
+  for (const auto& [content, dpi, scale] : cases)
+    EXPECT_DOUBLE_EQ(densityScale(content, dpi), scale) << content << " at " << dpi << " dpi";
+}
+
 }  // namespace
 }  // namespace veltrane_viewer

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cmath>
 #include <cstring>
+#include <filesystem>
 #include <fstream>
 #include <iterator>
 #include <nlohmann/json.hpp>
@@ -58,7 +59,7 @@ class ViewerWindow : public ::testing::Test {
   refhost::RgbaImage render(const std::string& scene) {
     std::string png = dir_.file("render.png");
     ChildProcess cli(
-        {VELTRANE_CLI_PATH, "render", scene, "-o", png, "--plugin", VELTRANE_MODULE_PATH});
+        {VELTRANE_CLI_PATH, "render", scene, "-o", png, "-y", "--plugin", VELTRANE_MODULE_PATH});
     EXPECT_EQ(cli.wait(60), 0);
     return refhost::readImageFile(png);
   }
@@ -80,6 +81,15 @@ class ViewerWindow : public ::testing::Test {
     x_.run({"xdotool", "key", "ctrl+s"});
     ASSERT_TRUE(waitUntil([&] { return text(out_).find("saved") != std::string::npos; }, 30))
         << text(dir_.file("err.txt"));
+  }
+  // Whether the window's title is the file's name and, after it, " *" for unsaved changes.
+  bool titled(const std::string& file, bool modified) {
+    const std::string title = "^veltrane view - " + file + (modified ? " \\*" : "") + "$";
+    return waitUntil(
+        [&] {
+          return ChildProcess({"xdotool", "search", "--name", title}).wait(10) == 0;
+        },
+        10);
   }
 
   testsupport::ScratchDirectory dir_;
@@ -146,6 +156,31 @@ TEST_F(ViewerWindow, ShowsTheRenderOfWhatItSavesWithTheHandlesOverIt) {
   EXPECT_TRUE(waitUntil([&] { return handlesWhereTheyAre(x_.screenshot(dir_.path())); }, 30))
       << "direction handle " << counts[0] << ", rotation handle " << counts[1]
       << ", rectangle edges " << counts[2] << ", elsewhere " << counts[3];
+}
+
+// Unsaved changes are never closed without asking: Quit waits for the answer (Escape goes back),
+// the title and status follow every save and edit, Save As moves where Save writes, and
+// Discard closes without writing.
+TEST_F(ViewerWindow, AsksBeforeClosingUnsavedChangesAndSaveAsMovesTheFile) {
+  drag({}, 160, 60, 200, 60);
+  EXPECT_TRUE(titled("saved.json", true));
+  x_.run({"xdotool", "key", "ctrl+q", "sleep", "1", "key", "Escape"});
+  EXPECT_EQ(viewer_->wait(1), -1) << "closed before the question was answered";
+  const std::string other = dir_.file("other.json");
+  x_.run({"xdotool", "key", "ctrl+shift+s", "sleep", "0.5", "type", other});
+  x_.run({"xdotool", "key", "Return"});
+  ASSERT_TRUE(waitUntil([&] { return text(out_).find("saved " + other) == 0; }, 30))
+      << text(out_) << text(dir_.file("err.txt"));
+  EXPECT_TRUE(titled("other.json", false));
+  drag({}, 200, 60, 120, 60);
+  EXPECT_TRUE(titled("other.json", true)) << "an edit after a save is unsaved again";
+  x_.run({"xdotool", "key", "ctrl+q", "sleep", "1", "key", "d"});
+  EXPECT_EQ(viewer_->wait(30), 0) << text(dir_.file("err.txt"));
+  viewer_.reset();
+  EXPECT_FALSE(std::filesystem::exists(saved_));
+  EXPECT_EQ(nlohmann::json::parse(text(other))["params"]["cutPosition_0"],
+            nlohmann::json::parse("[40, -30]"))
+      << "the discarded edit is not in the file";
 }
 
 // A cut's direction handle can be grabbed at every zoom: a quarter turn dragged on the handle
