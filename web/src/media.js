@@ -1,0 +1,242 @@
+// The clips and photos a person gave the page, decoded by the browser and answered to the
+// WebAssembly host by the names its scene gives them. What a file is comes from its content,
+// never its name. Video frames are decoded ahead of a render (the host asks for them
+// synchronously): a frame the render asked for and did not find is a miss, decoded before the
+// render is done again.
+import {
+  ALL_FORMATS,
+  AudioSampleSink,
+  BlobSource,
+  CanvasSink,
+  Input,
+} from '../vendor/mediabunny.js';
+
+const kVideo = 1;
+const kStill = 2;
+// Frames kept per clip beyond those the last render used.
+const kKeptFrames = 48;
+
+const timeKey = (seconds) => Math.round(seconds * 1e6);
+
+// A problem with a file, worded as the page shows it: the file's name, then what was expected.
+export class MediaProblem extends Error {}
+
+async function openVideo(name, blob) {
+  let input;
+  try {
+    input = new Input({ source: new BlobSource(blob), formats: ALL_FORMATS });
+    await input.getFormat();
+  } catch {
+    return null; // not a container the browser's demuxer knows: perhaps a photo
+  }
+  const video = await input.getPrimaryVideoTrack();
+  if (!video) {
+    throw new MediaProblem(`${name}: holds no video (expected a clip with a picture, or a photo)`);
+  }
+  if (!(await video.canDecode())) {
+    const codec = (await video.getCodecParameterString()) || video.codec || 'unknown';
+    throw new MediaProblem(
+      `${name}: this browser cannot decode its video (${codec}); expected H.264, VP8, VP9 or AV1`,
+    );
+  }
+  const first = await video.getFirstTimestamp();
+  const stats = await video.computePacketStats(120);
+  const end = await input.computeDuration();
+  const audio = await input.getPrimaryAudioTrack();
+  const hasAudio = !!audio && (await audio.canDecode());
+  return {
+    kind: kVideo,
+    name,
+    input,
+    audio: hasAudio ? audio : null,
+    first,
+    // The picture as players show it: upright, at square pixels.
+    width: video.displayWidth,
+    height: video.displayHeight,
+    frameRate: stats.averagePacketRate || 25,
+    duration: Math.max(end - first, 0),
+    sink: new CanvasSink(video),
+    frames: new Map(),
+    used: new Set(),
+    sequence: null,
+  };
+}
+
+async function openStill(name, blob) {
+  let bitmap;
+  try {
+    // Photos stand as cameras meant them: EXIF orientation applied.
+    bitmap = await createImageBitmap(blob, { imageOrientation: 'from-image' });
+  } catch {
+    return null;
+  }
+  const canvas = new OffscreenCanvas(bitmap.width, bitmap.height);
+  const context = canvas.getContext('2d');
+  context.drawImage(bitmap, 0, 0);
+  const pixels = context.getImageData(0, 0, bitmap.width, bitmap.height).data;
+  bitmap.close();
+  return { kind: kStill, name, width: canvas.width, height: canvas.height, pixels };
+}
+
+export class MediaLibrary {
+  constructor() {
+    this.entries = new Map(); // path in the page's file system -> entry
+    this.misses = [];
+    this.scratch = new OffscreenCanvas(1, 1);
+    this.scratchContext = this.scratch.getContext('2d', { willReadFrequently: true });
+  }
+
+  // Decodes enough of the file to know what it is; throws MediaProblem naming `name`.
+  async add(path, blob, name) {
+    const entry = (await openVideo(name, blob)) ?? (await openStill(name, blob));
+    if (!entry) {
+      throw new MediaProblem(
+        `${name}: the browser cannot decode it (expected a video clip or a photo)`,
+      );
+    }
+    this.entries.set(path, entry);
+    return entry;
+  }
+
+  get(path) {
+    return this.entries.get(path);
+  }
+
+  // ---- Answers to the WebAssembly host, synchronous -------------------------------------------
+  describe(path) {
+    const entry = this.entries.get(path);
+    if (!entry) return { problem: 'the page was not given this file' };
+    return {
+      kind: entry.kind,
+      width: entry.width,
+      height: entry.height,
+      frameRate: entry.kind === kVideo ? entry.frameRate : 0,
+      duration: entry.kind === kVideo ? entry.duration : 0,
+      hasAudio: entry.kind === kVideo && !!entry.audio,
+    };
+  }
+
+  // The frame shown `seconds` into the clip at the size, rows from the bottom as GL keeps them.
+  videoRows(path, seconds, width, height) {
+    const entry = this.entries.get(path);
+    const key = timeKey(seconds);
+    let canvas = entry.frames.get(key);
+    if (!canvas) {
+      this.misses.push({ path, seconds });
+      canvas = nearestFrame(entry, key);
+    }
+    entry.used.add(key);
+    if (this.scratch.width !== width || this.scratch.height !== height) {
+      this.scratch.width = width;
+      this.scratch.height = height;
+    }
+    const context = this.scratchContext;
+    context.setTransform(1, 0, 0, 1, 0, 0);
+    context.clearRect(0, 0, width, height);
+    if (canvas) {
+      context.setTransform(1, 0, 0, -1, 0, height);
+      context.drawImage(canvas, 0, 0, width, height);
+    }
+    return context.getImageData(0, 0, width, height).data;
+  }
+
+  imagePixels(path) {
+    return this.entries.get(path).pixels;
+  }
+
+  // ---- Before and after a render ---------------------------------------------------------------
+  beginRender() {
+    this.misses = [];
+    for (const entry of this.videos()) entry.used.clear();
+  }
+
+  // The frames the render asked for and did not find.
+  takeMisses() {
+    const misses = this.misses;
+    this.misses = [];
+    return misses;
+  }
+
+  // Decodes the frames missed, each the latest at or before its time (the first before the
+  // first).
+  async prepare(misses) {
+    for (const { path, seconds } of misses) {
+      const entry = this.entries.get(path);
+      const key = timeKey(seconds);
+      if (entry.frames.has(key)) continue;
+      const wrapped =
+        (await entry.sink.getCanvas(entry.first + Math.max(seconds, 0))) ??
+        (await entry.sink.getCanvas(entry.first));
+      if (wrapped) entry.frames.set(key, wrapped.canvas);
+    }
+    this.forgetUnused();
+  }
+
+  // Frames a render going forward will ask for: every clip's frames at `times` (seconds) are
+  // decoded in order, each packet once, and taken one time after another by advance().
+  startSequence(times) {
+    for (const entry of this.videos()) {
+      entry.sequence = {
+        times,
+        next: 0,
+        iterator: entry.sink.canvasesAtTimestamps(times.map((t) => entry.first + Math.max(t, 0))),
+      };
+    }
+  }
+
+  async advance() {
+    for (const entry of this.videos()) {
+      const sequence = entry.sequence;
+      if (!sequence || sequence.next >= sequence.times.length) continue;
+      const { value } = await sequence.iterator.next();
+      const key = timeKey(sequence.times[sequence.next++]);
+      if (value) entry.frames.set(key, value.canvas);
+    }
+    this.forgetUnused();
+  }
+
+  async stopSequence() {
+    for (const entry of this.videos()) {
+      if (entry.sequence) await entry.sequence.iterator.return();
+      entry.sequence = null;
+    }
+  }
+
+  // A clip's sound as decoded samples for its first `seconds`, or nothing.
+  audioSamples(path, seconds) {
+    const entry = this.entries.get(path);
+    if (!entry || !entry.audio) return null;
+    return new AudioSampleSink(entry.audio).samples(entry.first, entry.first + seconds);
+  }
+
+  *videos() {
+    for (const entry of this.entries.values()) if (entry.kind === kVideo) yield entry;
+  }
+
+  forgetUnused() {
+    for (const entry of this.videos()) {
+      const surplus = entry.frames.size - entry.used.size - kKeptFrames;
+      if (surplus <= 0) continue;
+      let dropped = 0;
+      for (const key of entry.frames.keys()) {
+        if (dropped >= surplus) break;
+        if (entry.used.has(key)) continue;
+        entry.frames.delete(key);
+        ++dropped;
+      }
+    }
+  }
+}
+
+// Until the frame is decoded, the one nearest in time stands in for it.
+function nearestFrame(entry, key) {
+  let best = null;
+  let distance = Infinity;
+  for (const [at, canvas] of entry.frames) {
+    if (Math.abs(at - key) < distance) {
+      distance = Math.abs(at - key);
+      best = canvas;
+    }
+  }
+  return best;
+}
