@@ -2,7 +2,7 @@
 // and the renders (decoding what a render missed and rendering again). Opening anything that
 // fails leaves the open scene as it was and throws one line naming the file.
 import createVeltrane from '../veltrane.js';
-import { installGlslEs } from './glsl_es.js';
+import { installWebGlSeams } from './webgl_seams.js';
 import { MediaLibrary, MediaProblem } from './media.js';
 
 export const kMostClips = 9;
@@ -34,7 +34,7 @@ export class Page {
     const media = new MediaLibrary();
     wasm.veltraneMedia = media;
     wasm.attachCanvas(`#${canvas.id}`);
-    installGlslEs(wasm.GL.currentContext.GLctx);
+    installWebGlSeams(wasm.GL.currentContext.GLctx);
     return new Page(wasm, media, canvas);
   }
 
