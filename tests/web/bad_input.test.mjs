@@ -6,7 +6,7 @@ import { mkdtempSync, rmSync, writeFileSync } from 'node:fs';
 import { tmpdir } from 'node:os';
 import { join } from 'node:path';
 import { after, before, test } from 'node:test';
-import { openPage } from './browser.mjs';
+import { openPage } from '../../web/headless.mjs';
 
 let browser;
 let scratch;

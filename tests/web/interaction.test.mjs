@@ -7,9 +7,9 @@ import { mkdtempSync, readFileSync, rmSync, writeFileSync } from 'node:fs';
 import { tmpdir } from 'node:os';
 import { join, resolve } from 'node:path';
 import { after, before, test } from 'node:test';
-import { openPage } from './browser.mjs';
+import { openPage } from '../../web/headless.mjs';
 
-const scene = resolve(import.meta.dirname, '../../docs/examples/demo.json');
+const scene = new URL('../../docs/examples/demo.json', import.meta.url).pathname;
 const cli = process.env.VELTRANE_CLI;
 const kWidth = 640;
 const kHeight = 360;

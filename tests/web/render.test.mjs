@@ -9,13 +9,13 @@ import { mkdtempSync, readFileSync, readdirSync, rmSync } from 'node:fs';
 import { tmpdir } from 'node:os';
 import { basename, join, resolve } from 'node:path';
 import { after, before, test } from 'node:test';
-import { openPage } from './browser.mjs';
+import { openPage } from '../../web/headless.mjs';
 import { difference, pageFrame, pngPixels } from './page_frames.mjs';
 
 const kAllowedChannelDifference = 2;
 const kAllowedShareBeyond = 0.01;
 
-const examples = resolve(import.meta.dirname, '../../docs/examples');
+const examples = new URL('../../docs/examples', import.meta.url).pathname;
 const cli = process.env.VELTRANE_CLI;
 // The demo moves a cut over time and shows the counter one second ahead: three frames of it.
 const scenes = [

@@ -6,6 +6,8 @@
 //                                   RGBA bytes, top row first
 //   await veltrane.export(options)  a Blob: {container: "mp4" | "webm", first, last, audio}
 //   veltrane.state()                frame, parameter values, undo and redo step names
+//   await veltrane.benchmark(n, k)  median milliseconds of k renders of frame n at full size,
+//                                   each until WebGL has finished it
 import { exportVideo } from './exporter.js';
 
 export function installApi(page, controller) {
@@ -34,6 +36,22 @@ export function installApi(page, controller) {
         controller.shownKey = null;
         controller.refresh();
       }
+    },
+    async benchmark(n, repeats = 10) {
+      const gl = page.wasm.GL.currentContext.GLctx;
+      const pixel = new Uint8Array(4);
+      const times = [];
+      for (let i = 0; i < repeats; ++i) {
+        const started = performance.now();
+        await page.render(n, 1);
+        // Reading a pixel waits for every command before it.
+        gl.readPixels(0, 0, 1, 1, gl.RGBA, gl.UNSIGNED_BYTE, pixel);
+        times.push(performance.now() - started);
+      }
+      times.sort((a, b) => a - b);
+      controller.shownKey = null;
+      controller.refresh();
+      return times[Math.floor(times.length / 2)];
     },
     state: () => page.state(),
     info: () => page.info,

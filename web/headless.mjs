@@ -5,10 +5,10 @@ import { existsSync, mkdtempSync, rmSync } from 'node:fs';
 import { tmpdir } from 'node:os';
 import { join, resolve } from 'node:path';
 import { createRequire } from 'node:module';
-import { serve } from '../../web/serve.mjs';
+import { serve } from './serve.mjs';
 
 const require = createRequire(import.meta.url);
-const root = resolve(import.meta.dirname ?? new URL('.', import.meta.url).pathname, '../..');
+const root = resolve(new URL('.', import.meta.url).pathname, '..');
 export const pageDir = resolve(process.env.VELTRANE_WEB_DIR ?? join(root, 'build/web'));
 const chromium = process.env.VELTRANE_CHROMIUM ?? '/usr/bin/chromium';
 
