@@ -54,11 +54,12 @@ async function drag(points) {
   await browser.page.mouse.up();
 }
 
+let replays = 0;
 function interact(script) {
-  const eventsFile = join(scratch, 'events.json');
-  const resultFile = join(scratch, 'result.json');
+  const eventsFile = join(scratch, `events-${++replays}.json`);
+  const resultFile = join(scratch, `result-${replays}.json`);
   writeFileSync(eventsFile, JSON.stringify({ viewScale: [1, 1], uiScale: kUiScale, time: 0, events: script }));
-  execFileSync(cli, ['interact', scene, '--events', eventsFile, '-o', resultFile, '-y']);
+  execFileSync(cli, ['interact', scene, '--events', eventsFile, '-o', resultFile]);
   return JSON.parse(readFileSync(resultFile, 'utf8'));
 }
 
@@ -90,5 +91,12 @@ test('drags on a cut line and on a picture give the values and undo steps intera
   const undoneResult = interact([...script, { undo: 1 }]);
   assert.deepEqual(undone.redo, undoneResult.redoSteps);
   assertSameValues(undone, undoneResult);
+
+  // Saved, the scene holds the values the page shows, as the command line's scene writer keeps
+  // them (every value that differs from its default).
+  const saved = JSON.parse(await browser.page.evaluate(() => window.veltrane.save()));
+  for (const [id, value] of Object.entries(saved.params)) {
+    if (undone.keys[id] === 'static') assert.deepEqual(value, undone.values[id], id);
+  }
   assert.deepEqual(browser.problems, []);
 });

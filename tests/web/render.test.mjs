@@ -42,7 +42,7 @@ for (const { file, frames } of scenes) {
     await browser.page.evaluate((text) => window.veltrane.open(text), readFileSync(file, 'utf8'));
     for (const frame of frames) {
       const png = join(scratch, `${basename(file, '.json')}-${frame}.png`);
-      execFileSync(cli, ['render', file, '-o', png, '--frame', String(frame), '-y']);
+      execFileSync(cli, ['render', file, '-o', png, '--frame', String(frame)]);
       const native = pngPixels(png);
       const inPage = await pageFrame(browser.page, frame);
       assert.equal(inPage.data.length, native.length, `frame ${frame}: size`);

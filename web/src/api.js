@@ -5,6 +5,7 @@
 //   await veltrane.frame(n)         {width, height, data}: composition frame n at full size,
 //                                   RGBA bytes, top row first
 //   await veltrane.export(options)  a Blob: {container: "mp4" | "webm", first, last, audio}
+//   veltrane.save()                 the scene as `veltrane render` reads it, values as they are
 //   veltrane.state()                frame, parameter values, undo and redo step names
 //   await veltrane.benchmark(n, k)  median milliseconds of k renders of frame n at full size,
 //                                   each until WebGL has finished it
@@ -53,6 +54,7 @@ export function installApi(page, controller) {
       controller.refresh();
       return times[Math.floor(times.length / 2)];
     },
+    save: () => page.saveScene(),
     state: () => page.state(),
     info: () => page.info,
   };
