@@ -16,14 +16,8 @@ BUILD_DIR=$build_dir BUILD_TARGETS="veltrane veltrane_cli mltveltrane" "$root/sc
   >/dev/null
 export MLT_REPOSITORY=$build_dir/mlt/repository MLT_DATA=$build_dir/mlt/data
 
-if [[ -n ${BENCH_JOB_DIR:-} ]]; then
-  work=$BENCH_JOB_DIR
-  mkdir -p "$work"
-else
-  work=$(mktemp -d)
-  trap 'rm -rf "$work"' EXIT
-fi
-cd "$work"
+source "$root/bench/whole_jobs.sh"
+enter_work_folder
 encode=(-c:v libx264 -crf 18 -preset fast -pix_fmt yuv420p)
 [[ -f in0.mp4 ]] || ffmpeg -v error -y -f lavfi -i "testsrc2=size=1920x1080:rate=25" \
   -f lavfi -i "sine=frequency=440:sample_rate=48000" -c:a aac -t 8 "${encode[@]}" in0.mp4

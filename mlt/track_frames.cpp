@@ -1,8 +1,7 @@
-// Seeking tracks for time-shifted pictures, and stretching a picture to the render's size.
+// Seeking tracks for time-shifted pictures at the render's size.
 #include "track_frames.h"
 
-#include <algorithm>
-#include <cmath>
+#include "refhost/media/rgba_image.h"
 
 namespace veltrane_mlt {
 
@@ -87,39 +86,11 @@ std::vector<uint8_t> pictureAt(mlt_producer producer, int32_t position, int32_t 
   std::vector<uint8_t> picture;
   if (!mlt_frame_get_image(frame, &image, &format, &frameWidth, &frameHeight, 0) && image &&
       format == mlt_image_rgba && frameWidth > 0 && frameHeight > 0) {
-    picture = frameWidth == width && frameHeight == height
-                  ? std::vector<uint8_t>(image, image + std::size_t(width) * height * 4)
-                  : stretched(image, frameWidth, frameHeight, width, height);
+    picture = refhost::resizedPixels(image, frameWidth, frameHeight, refhost::PixelFormat::Rgba8,
+                                     width, height);
   }
   mlt_frame_close(frame);
   return picture;
-}
-
-std::vector<uint8_t> stretched(const uint8_t* from, int32_t fromWidth, int32_t fromHeight,
-                               int32_t width, int32_t height) {
-  std::vector<uint8_t> to(std::size_t(width) * height * 4);
-  const double scaleX = double(fromWidth) / width, scaleY = double(fromHeight) / height;
-  for (int32_t y = 0; y < height; ++y) {
-    const double sourceY = std::clamp((y + 0.5) * scaleY - 0.5, 0.0, fromHeight - 1.0);
-    const int32_t y0 = static_cast<int32_t>(sourceY), y1 = std::min(y0 + 1, fromHeight - 1);
-    const double fy = sourceY - y0;
-    for (int32_t x = 0; x < width; ++x) {
-      const double sourceX = std::clamp((x + 0.5) * scaleX - 0.5, 0.0, fromWidth - 1.0);
-      const int32_t x0 = static_cast<int32_t>(sourceX), x1 = std::min(x0 + 1, fromWidth - 1);
-      const double fx = sourceX - x0;
-      const uint8_t* p00 = from + (std::size_t(y0) * fromWidth + x0) * 4;
-      const uint8_t* p01 = from + (std::size_t(y0) * fromWidth + x1) * 4;
-      const uint8_t* p10 = from + (std::size_t(y1) * fromWidth + x0) * 4;
-      const uint8_t* p11 = from + (std::size_t(y1) * fromWidth + x1) * 4;
-      uint8_t* out = to.data() + (std::size_t(y) * width + x) * 4;
-      for (int c = 0; c < 4; ++c) {
-        const double top = p00[c] + (p01[c] - p00[c]) * fx;
-        const double bottom = p10[c] + (p11[c] - p10[c]) * fx;
-        out[c] = static_cast<uint8_t>(std::lround(top + (bottom - top) * fy));
-      }
-    }
-  }
-  return to;
 }
 
 }  // namespace veltrane_mlt

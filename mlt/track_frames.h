@@ -1,5 +1,5 @@
 // Pictures of a track at other positions than the frame being rendered: finding the producer
-// that can be sought for them, and fetching and stretching pictures to the render's size.
+// that can be sought for them, and fetching pictures at the render's size.
 #pragma once
 
 #include <framework/mlt.h>
@@ -34,10 +34,5 @@ bool clipCanSeek(mlt_frame frame);
 // deinterlaced as the consumer asked for `like` (the frame in hand), so that it matches it.
 std::vector<uint8_t> pictureAt(mlt_producer producer, int32_t position, int32_t width,
                                int32_t height, mlt_frame like);
-
-// The picture stretched to another size (bilinear, between pixel centres); `from` holds
-// fromWidth x fromHeight RGBA pixels.
-std::vector<uint8_t> stretched(const uint8_t* from, int32_t fromWidth, int32_t fromHeight,
-                               int32_t width, int32_t height);
 
 }  // namespace veltrane_mlt

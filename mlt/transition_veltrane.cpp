@@ -4,6 +4,7 @@
 
 #include "effect_service.h"
 #include "mlt_services.h"
+#include "refhost/media/rgba_image.h"
 #include "track_frames.h"
 
 namespace veltrane_mlt {
@@ -62,7 +63,8 @@ int transitionImage(mlt_frame lowerFrame, uint8_t** image, mlt_image_format* for
     return 0;
   }
   if (upperWidth != w || upperHeight != h) {
-    resized = stretched(upper, upperWidth, upperHeight, w, h);
+    resized =
+        refhost::resizedPixels(upper, upperWidth, upperHeight, refhost::PixelFormat::Rgba8, w, h);
     upper = resized.data();
   }
 

@@ -9,6 +9,7 @@
 #include "cli/cli_support.h"
 #include "cli/stop_signals.h"
 #include "commands/commands.h"
+#include "refhost/media/ffmpeg_utilities.h"
 
 namespace {
 
@@ -29,6 +30,10 @@ const Command kCommands[] = {
      &veltrane_cli::runSoak},
     {"view", "open a scene in a window: picture, handles, parameter panel, timeline, undo",
      &veltrane_cli::runView},
+    {"plan", "divide a render into chunks that machines of a render farm render apart",
+     &veltrane_cli::runPlan},
+    {"assemble", "join the rendered chunks of a plan into the final video",
+     &veltrane_cli::runAssemble},
 };
 
 void printUsage(std::FILE* out) {
@@ -69,6 +74,9 @@ int main(int argc, char** argv) {
     return 2;
   }
   std::vector<std::string> rest(args.begin() + 1, args.end());
+  // This program owns standard error: FFmpeg's messages go into the one line of a failure
+  // instead of around it.
+  refhost::keepLibraryErrorsForMessages();
   try {
     return chosen->run(rest);
   } catch (const veltrane_cli::UsageError& error) {

@@ -16,7 +16,7 @@ constexpr int32_t kDecodeAhead = 3;
 constexpr std::size_t kDecodeAheadBytes = std::size_t{128} << 20;
 
 // Sources that change over time (videos, the counter) decode ahead on a worker thread each.
-std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double rate,
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec, FrameRate rate,
                                     const std::shared_ptr<DecodeAheadBudget>& budget) {
   std::shared_ptr<MediaSource> source = openMediaSource(spec, rate);
   if (!source->changesOverTime()) return source;
@@ -25,7 +25,7 @@ std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double rate,
 
 // Another reader of the same media, opened when its first frame is asked for; a media that
 // looks the same at every frame shares the one it has.
-std::function<FrameSource()> streamOpener(const MediaSpec& spec, double rate,
+std::function<FrameSource()> streamOpener(const MediaSpec& spec, FrameRate rate,
                                           const std::shared_ptr<MediaSource>& first,
                                           const std::shared_ptr<DecodeAheadBudget>& budget) {
   if (!first->changesOverTime()) return [first] { return frameSourceOf(first); };
@@ -42,7 +42,9 @@ std::function<FrameSource()> streamOpener(const MediaSpec& spec, double rate,
 }  // namespace
 
 ColourDescription defaultColour(const MediaSpec& source) {
-  if (source.kind == MediaSpec::Kind::File && isVideoPath(source.path) && source.info)
+  // RGB video (an animated GIF, lossless RGB) has no matrix to write YUV with: BT.709 then.
+  if (source.kind == MediaSpec::Kind::File && source.info && source.info->video &&
+      source.info->colour.matrix != ColourDescription::kMatrixRgb)
     return source.info->colour;
   return ColourDescription::bt709();
 }
@@ -81,7 +83,7 @@ const char* const kDefaultOwnLayerGuid = "5ec0a11e-0000-4000-8000-000000000001";
 InstalledComposition installComposition(Engine& engine, const Composition& composition,
                                         PixelFormat format) {
   InstalledComposition installed;
-  const double rate = composition.frameRate;
+  const FrameRate rate = composition.frameRate;
   const auto budget = std::make_shared<DecodeAheadBudget>(kDecodeAheadBytes);
   installed.source = opened(composition.source, rate, budget);
   installed.sourceFrameCount =
@@ -89,7 +91,7 @@ InstalledComposition installComposition(Engine& engine, const Composition& compo
   FrameSettings settings;
   settings.width = composition.width;
   settings.height = composition.height;
-  settings.frameRate = composition.frameRate;
+  settings.frameRate = composition.frameRate.perSecond();
   settings.pixelAspect = composition.pixelAspect;
   settings.sourceFrameCount = installed.sourceFrameCount;
   settings.ownLayerGuid = composition.ownLayerGuid;

@@ -27,7 +27,7 @@ struct CompositionLayer {
 struct Composition {
   int32_t width = 1920;
   int32_t height = 1080;
-  double frameRate = 25.0;
+  FrameRate frameRate{25, 1};
   int32_t duration = 1;  // frames
   float pixelAspect = 1.0f;
   std::string ownLayerGuid = kDefaultOwnLayerGuid;
@@ -39,7 +39,8 @@ struct Composition {
 };
 
 // The composition's colour when a document does not choose one: the effect's own source's when
-// that is a video, else BT.709 with limited range. Needs the source's info (see MediaSpec).
+// that is a video in YUV, else BT.709 with limited range. Needs the source's info (see
+// MediaSpec).
 ColourDescription defaultColour(const MediaSpec& source);
 
 // The most bits a channel of any of the composition's media holds (8 for generated pictures

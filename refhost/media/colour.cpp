@@ -11,14 +11,23 @@ struct Named {
   const char* name;
 };
 
-constexpr Named kMatrices[] = {{1, "bt709"},    {5, "bt470bg"},  {6, "smpte170m"},
-                               {9, "bt2020nc"}, {10, "bt2020c"}, {0, "gbr"}};
-constexpr Named kPrimaries[] = {{1, "bt709"},  {5, "bt470bg"}, {6, "smpte170m"},
-                                {9, "bt2020"}, {4, "bt470m"},  {7, "smpte240m"}};
-constexpr Named kTransfers[] = {{1, "bt709"},         {6, "smpte170m"},  {13, "iec61966-2-1"},
-                                {14, "bt2020-10"},    {15, "bt2020-12"}, {16, "smpte2084"},
-                                {18, "arib-std-b67"}, {8, "linear"},     {4, "gamma22"},
-                                {5, "gamma28"}};
+using C = ColourDescription;
+constexpr Named kMatrices[] = {{C::kMatrixBt709, "bt709"},
+                               {C::kMatrixBt470bg, "bt470bg"},
+                               {C::kMatrixSmpte170m, "smpte170m"},
+                               {C::kMatrixBt2020, "bt2020nc"},
+                               {C::kMatrixBt2020Constant, "bt2020c"},
+                               {C::kMatrixRgb, "gbr"}};
+constexpr Named kPrimaries[] = {
+    {C::kPrimariesBt709, "bt709"},         {C::kPrimariesBt470bg, "bt470bg"},
+    {C::kPrimariesSmpte170m, "smpte170m"}, {C::kPrimariesBt2020, "bt2020"},
+    {C::kPrimariesBt470m, "bt470m"},       {C::kPrimariesSmpte240m, "smpte240m"}};
+constexpr Named kTransfers[] = {
+    {C::kTransferBt709, "bt709"},         {C::kTransferSmpte170m, "smpte170m"},
+    {C::kTransferSrgb, "iec61966-2-1"},   {C::kTransferBt2020_10, "bt2020-10"},
+    {C::kTransferBt2020_12, "bt2020-12"}, {C::kTransferPq, "smpte2084"},
+    {C::kTransferHlg, "arib-std-b67"},    {C::kTransferLinear, "linear"},
+    {C::kTransferGamma22, "gamma22"},     {C::kTransferGamma28, "gamma28"}};
 
 template <std::size_t N>
 std::string nameOf(const Named (&table)[N], int32_t number) {
@@ -54,10 +63,4 @@ std::optional<int32_t> transferFromName(const std::string& name) {
   if (name == "srgb") return ColourDescription::kTransferSrgb;
   return numberOf(kTransfers, name);
 }
-std::optional<bool> fullRangeFromName(const std::string& name) {
-  if (name == "tv" || name == "limited") return false;
-  if (name == "pc" || name == "full") return true;
-  return std::nullopt;
-}
-
 }  // namespace refhost

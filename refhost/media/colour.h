@@ -11,23 +11,32 @@ namespace refhost {
 
 struct ColourDescription {
   enum Matrix : int32_t {
+    kMatrixRgb = 0,
     kMatrixBt709 = 1,
+    kMatrixFcc = 4,
     kMatrixBt470bg = 5,
     kMatrixSmpte170m = 6,
+    kMatrixSmpte240m = 7,
     kMatrixBt2020 = 9,
     kMatrixBt2020Constant = 10
   };
   enum Primaries : int32_t {
     kPrimariesBt709 = 1,
+    kPrimariesBt470m = 4,
     kPrimariesBt470bg = 5,
     kPrimariesSmpte170m = 6,
+    kPrimariesSmpte240m = 7,
     kPrimariesBt2020 = 9
   };
   enum Transfer : int32_t {
     kTransferBt709 = 1,
+    kTransferGamma22 = 4,
+    kTransferGamma28 = 5,
     kTransferSmpte170m = 6,
+    kTransferLinear = 8,
     kTransferSrgb = 13,
     kTransferBt2020_10 = 14,
+    kTransferBt2020_12 = 15,
     kTransferPq = 16,
     kTransferHlg = 18
   };
@@ -61,16 +70,14 @@ struct ColourDescription {
   }
 };
 
-// The names ffprobe shows ("bt709", "smpte170m", "bt470bg", "bt2020nc", "tv", "pc", ...); the
-// number in decimal for one without a name here.
+// The names ffprobe shows ("bt709", "smpte170m", "bt470bg", "bt2020nc", ...); the number in
+// decimal for one without a name here.
 std::string matrixName(int32_t matrix);
 std::string primariesName(int32_t primaries);
 std::string transferName(int32_t transfer);
-inline std::string rangeName(bool fullRange) { return fullRange ? "pc" : "tv"; }
-// The number of a name above (also "bt601" for the matrix, "limited" and "full" as ranges).
+// The number of a name above (also "bt601").
 std::optional<int32_t> matrixFromName(const std::string& name);
 std::optional<int32_t> primariesFromName(const std::string& name);
 std::optional<int32_t> transferFromName(const std::string& name);
-std::optional<bool> fullRangeFromName(const std::string& name);
 
 }  // namespace refhost

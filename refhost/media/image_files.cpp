@@ -11,6 +11,7 @@
 #include <stdexcept>
 
 #include "refhost/media/image_module/image_module.h"
+#include "refhost/media/orientation.h"
 #include "refhost/platform/staged_file.h"
 
 namespace refhost {
@@ -72,20 +73,19 @@ const ImageModule& requireModule(const std::string& path, const char* what) {
 RgbaImage readImageFile(const std::string& path) {
   const ImageModule& module = requireModule(path, "read image");
   char error[512] = {};
-  int32_t width = 0, height = 0, halfFloats = 0;
-  void* pixels = nullptr;
-  if (module.read(path.c_str(), &width, &height, &halfFloats, &pixels, error, sizeof error) != 0)
+  RefhostPicture read{};
+  if (module.read(path.c_str(), &read, error, sizeof error) != 0)
     throw std::runtime_error(path + ": cannot read image: " + error);
   RgbaImage image;
-  image.width = width;
-  image.height = height;
-  image.format = halfFloats ? PixelFormat::RgbaHalf : PixelFormat::Rgba8;
-  const auto* first = static_cast<const uint8_t*>(pixels);
-  image.pixels.assign(first, first + static_cast<std::size_t>(width) *
-                                         static_cast<std::size_t>(height) *
+  image.width = read.width;
+  image.height = read.height;
+  image.format = read.halfFloats ? PixelFormat::RgbaHalf : PixelFormat::Rgba8;
+  const auto* first = static_cast<const uint8_t*>(read.pixels);
+  image.pixels.assign(first, first + static_cast<std::size_t>(read.width) *
+                                         static_cast<std::size_t>(read.height) *
                                          bytesPerPixel(image.format));
-  std::free(pixels);
-  return image;
+  std::free(read.pixels);
+  return upright(image, orientationOfExif(read.orientation));
 }
 
 std::vector<uint8_t> encodeImage(const RgbaImage& image, ImageFormat format,

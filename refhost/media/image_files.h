@@ -12,8 +12,9 @@ namespace refhost {
 
 // Grey, grey + alpha, RGB and RGBA files; a missing alpha is opaque, extra channels are
 // dropped. A file of more than 8 bits a channel (16-bit PNG or TIFF, EXR) gives an RgbaHalf
-// picture, any other an Rgba8 one with the stored bytes. Throws std::runtime_error naming the
-// path and the reason.
+// picture, any other an Rgba8 one with the stored bytes. The picture is turned upright as its
+// EXIF orientation says, as image viewers show photos. Throws std::runtime_error naming the
+// path and the reason, in one line.
 RgbaImage readImageFile(const std::string& path);
 
 enum class ImageFormat { Png, Exr };

@@ -24,7 +24,9 @@ RgbaImage readImageFile(const std::string& path) {
   stbi_uc* pixels = stbi_load(path.c_str(), &width, &height, &channels, 4);
   if (!pixels) {
     const char* reason = stbi_failure_reason();
-    throw std::runtime_error(path + ": cannot read image: " + (reason ? reason : "unknown error"));
+    throw std::runtime_error(path + ": cannot read image: " + (reason ? reason : "unknown error") +
+                             " (the Windows build reads still images only: FFmpeg, which reads "
+                             "video, is left out of it)");
   }
   RgbaImage image;
   image.width = width;

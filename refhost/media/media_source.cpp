@@ -2,12 +2,11 @@
 #include "refhost/media/media_source.h"
 
 #include <algorithm>
-#include <cctype>
 #include <cmath>
 #include <cstring>
 
 #include "refhost/media/image_files.h"
-#include "refhost/media/video_reader.h"
+#include "refhost/media/moving_pictures.h"
 
 namespace refhost {
 namespace {
@@ -66,25 +65,6 @@ class StillImageSource : public MediaSource {
   RgbaImage scaled_;
 };
 
-class VideoSource : public GlRowsSource {
- public:
-  VideoSource(const std::string& path, double compositionRate)
-      : reader_(path), rate_(compositionRate > 0 ? compositionRate : 25.0) {}
-  std::vector<uint8_t> glRows(int32_t index, int32_t width, int32_t height,
-                              PixelFormat format) override {
-    return reader_.glRowsAt(index / rate_, width, height, format);
-  }
-  int32_t frameCount() const override {
-    const double frames = std::ceil(reader_.info().duration * rate_ - 1e-6);
-    return frames > 0 ? static_cast<int32_t>(std::min(frames, 1e9)) : 0;
-  }
-  MediaInfo info() const override { return reader_.info(); }
-
- private:
-  VideoReader reader_;
-  double rate_;
-};
-
 // A media's pictures shown whole at their own proportions inside the size asked for.
 class ProportionalSource : public GlRowsSource {
  public:
@@ -134,7 +114,7 @@ class ProportionalSource : public GlRowsSource {
   MediaInfo info_;
 };
 
-std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double compositionRate);
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec, FrameRate compositionRate);
 
 }  // namespace
 
@@ -168,23 +148,11 @@ MediaSpec MediaSpec::ofFile(const std::string& path) {
   MediaSpec spec;
   spec.kind = Kind::File;
   spec.path = path;
+  spec.damage = std::make_shared<DamagedFrames>();
   return spec;
 }
 
-bool isVideoPath(const std::string& path) {
-  std::string::size_type dot = path.rfind('.');
-  if (dot == std::string::npos || path.find('/', dot) != std::string::npos) return false;
-  std::string extension = path.substr(dot + 1);
-  std::transform(extension.begin(), extension.end(), extension.begin(),
-                 [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
-  for (const char* video :
-       {"mp4", "mov", "mkv", "m4v", "avi", "webm", "mxf", "mpg", "mpeg", "ts"}) {
-    if (extension == video) return true;
-  }
-  return false;
-}
-
-std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, double compositionRate) {
+std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, FrameRate compositionRate) {
   std::shared_ptr<MediaSource> source = opened(spec, compositionRate);
   if (spec.keepProportions) return std::make_shared<ProportionalSource>(std::move(source));
   return source;
@@ -192,14 +160,14 @@ std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, double compo
 
 namespace {
 
-std::shared_ptr<MediaSource> opened(const MediaSpec& spec, double compositionRate) {
+std::shared_ptr<MediaSource> opened(const MediaSpec& spec, FrameRate compositionRate) {
   switch (spec.kind) {
     case MediaSpec::Kind::Pattern:
       return std::make_shared<PatternSource>(spec.pattern);
     case MediaSpec::Kind::Colour:
       return std::make_shared<ColourSource>(spec.colour);
     case MediaSpec::Kind::File:
-      if (isVideoPath(spec.path)) return std::make_shared<VideoSource>(spec.path, compositionRate);
+      if (auto moving = openMovingPictures(spec, compositionRate)) return moving;
       return std::make_shared<StillImageSource>(spec.path);
   }
   return nullptr;

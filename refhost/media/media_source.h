@@ -11,6 +11,8 @@
 #include <vector>
 
 #include "refhost/media/colour.h"
+#include "refhost/media/damaged_frames.h"
+#include "refhost/media/frame_rate.h"
 #include "refhost/media/rgba_image.h"
 #include "refhost/media/test_patterns.h"
 
@@ -18,16 +20,20 @@ namespace refhost {
 
 // What a media holds, as far as a composition cares.
 struct MediaInfo {
-  // The picture's size as players show it: upright (a display rotation applied) and at square
-  // pixels (a sample aspect ratio applied). 0 for generated pictures, which take any size.
+  // The picture's size as players show it: upright (a display rotation or a photo's EXIF
+  // orientation applied) and at square pixels (a sample aspect ratio applied). 0 for generated
+  // pictures, which take any size.
   int32_t width = 0;
   int32_t height = 0;
   int32_t bitDepth = 8;  // bits a channel of the stored pictures
   // What the pictures were converted to RGB from; still images and generated pictures are
   // sRGB/BT.709 RGB already.
   ColourDescription colour = ColourDescription::bt709();
-  double frameRate = 0;  // the media's own (average) rate; 0 for a still or a pattern
-  double duration = 0;   // seconds; 0 for what has no end (stills, patterns)
+  // Pictures of its own that change over time at its own rate (a video, an animated GIF or
+  // WebP), as its content says whatever its name; false for stills and generated pictures.
+  bool video = false;
+  FrameRate frameRate;  // a video's nominal rate (see VideoReader); none for the rest
+  double duration = 0;  // seconds; 0 for what has no end (stills, patterns)
   bool hasAudio = false;
 };
 
@@ -41,8 +47,11 @@ struct MediaSpec {
   // proportions, centred, with transparent bars beside it ("contain"), instead of stretched.
   bool keepProportions = false;
   // What the media turned out to hold when it was first opened (a scene's media are opened
-  // as the scene is read); empty until then.
+  // as the scene is read); empty until then. Later openings take its word for what the file
+  // is instead of probing it again.
   std::optional<MediaInfo> info;
+  // A file's frames found damaged by every source opened from this spec and its copies.
+  std::shared_ptr<DamagedFrames> damage;
 
   static MediaSpec ofPattern(Pattern pattern);
   static MediaSpec ofColour(const std::array<float, 4>& rgba);
@@ -76,13 +85,11 @@ class GlRowsSource : public MediaSource {
                               PixelFormat format) override = 0;
 };
 
-// Throws std::runtime_error naming the file when a file cannot be opened or decoded, or holds
-// what the host does not show (see VideoReader). Composition frame n at `compositionRate`
-// frames a second shows the media's picture whose presentation time is the latest at or before
-// n / compositionRate, as players and editors choose it.
-std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, double compositionRate);
-
-// Files with these endings are decoded as video; everything else as a still image.
-bool isVideoPath(const std::string& path);
+// Throws std::runtime_error naming the file, in one line, when a file cannot be opened or
+// decoded, or holds what the host does not show (see VideoReader). Whether a file is a video
+// or a still is decided by its content (see probeFile). Composition frame n at
+// `compositionRate` shows the media's picture whose presentation time is the latest at or
+// before n / compositionRate, as players and editors choose it.
+std::shared_ptr<MediaSource> openMediaSource(const MediaSpec& spec, FrameRate compositionRate);
 
 }  // namespace refhost

@@ -83,7 +83,7 @@ void RgbaImage::fillRect(int32_t x0, int32_t y0, int32_t x1, int32_t y1, Rgba8 c
 
 void copyRowsFlipped(const uint8_t* from, uint8_t* to, std::size_t rowBytes, int32_t rows) {
   for (int32_t y = 0; y < rows; ++y)
-    std::memcpy(to + static_cast<std::size_t>(rows - 1 - y) * rowBytes,
+    std::memcpy(to + static_cast<std::size_t>(glRowOf(y, rows)) * rowBytes,
                 from + static_cast<std::size_t>(y) * rowBytes, rowBytes);
 }
 
@@ -95,10 +95,28 @@ std::vector<uint8_t> flipRows(const std::vector<uint8_t>& pixels, int32_t width,
   return flipped;
 }
 
-RgbaImage resized(const RgbaImage& image, int32_t width, int32_t height) {
-  if (image.width == width && image.height == height) return image;
-  RgbaImage out(width, height, image.format);
-  if (image.width == 0 || image.height == 0) return out;
+std::vector<uint8_t> resizedPixels(const uint8_t* pixels, int32_t fromWidth, int32_t fromHeight,
+                                   PixelFormat format, int32_t width, int32_t height) {
+  width = std::max(width, 0);
+  height = std::max(height, 0);
+  const std::size_t pixel = bytesPerPixel(format);
+  std::vector<uint8_t> out(static_cast<std::size_t>(width) * height * pixel);
+  if (fromWidth <= 0 || fromHeight <= 0) return out;
+  if (fromWidth == width && fromHeight == height) {
+    std::memcpy(out.data(), pixels, out.size());
+    return out;
+  }
+  auto at = [&](int32_t x, int32_t y) {
+    return (static_cast<std::size_t>(y) * static_cast<std::size_t>(fromWidth) +
+            static_cast<std::size_t>(x)) *
+           pixel;
+  };
+  auto sampleOf = [&](std::size_t offset, int c) {
+    if (format == PixelFormat::Rgba8) return static_cast<float>(pixels[offset + c]);
+    uint16_t half;
+    std::memcpy(&half, pixels + offset + 2 * c, 2);
+    return floatFromHalf(half);
+  };
   // Pixel centres of the output mapped onto the input, clamped at the edges.
   auto sample = [](int32_t outSize, int32_t inSize, int32_t index, int32_t& low, int32_t& high,
                    float& weight) {
@@ -110,27 +128,36 @@ RgbaImage resized(const RgbaImage& image, int32_t width, int32_t height) {
     high = std::min(low + 1, inSize - 1);
     weight = position - static_cast<float>(low);
   };
-  for (int32_t y = 0; y < out.height; ++y) {
+  for (int32_t y = 0; y < height; ++y) {
     int32_t y0 = 0, y1 = 0;
     float wy = 0;
-    sample(out.height, image.height, y, y0, y1, wy);
-    for (int32_t x = 0; x < out.width; ++x) {
+    sample(height, fromHeight, y, y0, y1, wy);
+    for (int32_t x = 0; x < width; ++x) {
       int32_t x0 = 0, x1 = 0;
       float wx = 0;
-      sample(out.width, image.width, x, x0, x1, wx);
+      sample(width, fromWidth, x, x0, x1, wx);
+      uint8_t* to = &out[(static_cast<std::size_t>(y) * width + x) * pixel];
       for (int c = 0; c < 4; ++c) {
-        if (image.format == PixelFormat::Rgba8) {
-          float top = image.at(x0, y0)[c] * (1 - wx) + image.at(x1, y0)[c] * wx;
-          float bottom = image.at(x0, y1)[c] * (1 - wx) + image.at(x1, y1)[c] * wx;
-          out.at(x, y)[c] = static_cast<uint8_t>(std::lround(top * (1 - wy) + bottom * wy));
-          continue;
+        const float top = sampleOf(at(x0, y0), c) * (1 - wx) + sampleOf(at(x1, y0), c) * wx;
+        const float bottom = sampleOf(at(x0, y1), c) * (1 - wx) + sampleOf(at(x1, y1), c) * wx;
+        const float value = top * (1 - wy) + bottom * wy;
+        if (format == PixelFormat::Rgba8) {
+          to[c] = static_cast<uint8_t>(std::lround(value));
+        } else {
+          const uint16_t half = halfFromFloat(value);
+          std::memcpy(to + 2 * c, &half, 2);
         }
-        float top = image.channel(x0, y0, c) * (1 - wx) + image.channel(x1, y0, c) * wx;
-        float bottom = image.channel(x0, y1, c) * (1 - wx) + image.channel(x1, y1, c) * wx;
-        out.setChannel(x, y, c, top * (1 - wy) + bottom * wy);
       }
     }
   }
+  return out;
+}
+
+RgbaImage resized(const RgbaImage& image, int32_t width, int32_t height) {
+  if (image.width == width && image.height == height) return image;
+  RgbaImage out(width, height, image.format);
+  out.pixels = resizedPixels(image.pixels.data(), image.width, image.height, image.format,
+                             out.width, out.height);
   return out;
 }
 

@@ -39,14 +39,23 @@ struct RgbaImage {
   void fillRect(int32_t x0, int32_t y0, int32_t x1, int32_t y1, Rgba8 colour);
 };
 
+// Where row `row` of a picture `height` rows high, counted from the top as image files count,
+// lies in GL's order, which counts from the bottom: the one place rows change order. Every copy
+// between the two orders (the flips below, the decoders writing GL's order straight away, the
+// copy out of GL) places its rows by it.
+inline int32_t glRowOf(int32_t row, int32_t height) { return height - 1 - row; }
+
 // Reverses the row order of `height` rows of equal length: top-first to bottom-first and back.
-// The one place rows change order (see FrameReadback for the copy out of GL).
 std::vector<uint8_t> flipRows(const std::vector<uint8_t>& pixels, int32_t width, int32_t height);
 void copyRowsFlipped(const uint8_t* from, uint8_t* to, std::size_t rowBytes, int32_t rows);
 
 // The picture stretched to the size with bilinear filtering between pixel centres (a plain copy
 // when the size is unchanged), in its own format.
 RgbaImage resized(const RgbaImage& image, int32_t width, int32_t height);
+// The same for `pixels` of a picture fromWidth x fromHeight held elsewhere (an editor's frame),
+// in either row order: rows stay in the order they come.
+std::vector<uint8_t> resizedPixels(const uint8_t* pixels, int32_t fromWidth, int32_t fromHeight,
+                                   PixelFormat format, int32_t width, int32_t height);
 
 // The picture in the format: 8 bits become v / 255 exactly; half floats become 8 bits rounded
 // to nearest, clamped to 0 to 255.

@@ -102,8 +102,8 @@ class SequenceSink : public FrameSink {
 
 class VideoSink : public FrameSink {
  public:
-  VideoSink(const OutputTarget& target, int32_t width, int32_t height, double frameRate,
-            const AudioClip& audio)
+  VideoSink(const OutputTarget& target, int32_t width, int32_t height, FrameRate frameRate,
+            const std::vector<AudioClip>& audio)
       : target_(target),
         file_(target.path),
         writer_(std::make_unique<VideoWriter>(file_.temporaryPath(), target.container, width,
@@ -172,7 +172,7 @@ OutputTarget parseOutputTarget(const std::string& path) {
 }
 
 std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
-                                         double frameRate, const AudioClip& audio) {
+                                         FrameRate frameRate, const std::vector<AudioClip>& audio) {
   switch (target.kind) {
     case OutputKind::Still:
       return std::make_unique<StillSink>(target);

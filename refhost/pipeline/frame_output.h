@@ -53,9 +53,10 @@ class FrameSink {
 };
 
 // Throws std::runtime_error naming the file when it cannot be created (std::invalid_argument
-// for a video encoding refusalOf() refuses). A video carries the audio clip's sound, if it has
-// any.
+// for a video encoding refusalOf() refuses). A video carries the audio clips' sound, those
+// that have any, mixed when there are several.
 std::unique_ptr<FrameSink> openFrameSink(const OutputTarget& target, int32_t width, int32_t height,
-                                         double frameRate, const AudioClip& audio = {});
+                                         FrameRate frameRate,
+                                         const std::vector<AudioClip>& audio = {});
 
 }  // namespace refhost

@@ -15,12 +15,24 @@ namespace refhost {
 
 enum class VideoContainer { Mp4, Mov, Mkv, Webm };
 
+// A piece of a longer video, encoded apart (a chunk of a job on a render farm) so that the
+// pieces join into the whole video by copying their packets (see video_joiner.h): its first
+// frame is a keyframe, no frame refers to one before the keyframe of its GOP, and its
+// timestamps run from its first frame's place in the whole video.
+struct JoinablePiece {
+  int64_t firstFrame = 0;  // the place of its first frame in the whole video
+  int32_t gopLength = 0;   // frames from one keyframe to the next at most, the same in every piece
+  // Written into the file's metadata, for the joiner to check that the pieces belong together.
+  std::vector<std::pair<std::string, std::string>> tags;
+};
+
 struct VideoEncoding {
-  std::string codec = "h264";         // a name of videoCodecs()
-  std::optional<int32_t> crf;         // empty: the codec's default quality
-  std::optional<std::string> preset;  // empty: the codec's default speed
-  int32_t bitDepth = 8;               // bits a sample of the encoded pictures
-  ColourDescription colour;           // the matrix and range converted to; all four are tagged
+  std::string codec = "h264";          // a name of videoCodecs()
+  std::optional<int32_t> crf;          // empty: the codec's default quality
+  std::optional<std::string> preset;   // empty: the codec's default speed
+  int32_t bitDepth = 8;                // bits a sample of the encoded pictures
+  ColourDescription colour;            // the matrix and range converted to; all four are tagged
+  std::optional<JoinablePiece> piece;  // empty: a whole video
 };
 
 // One FFmpeg encoder of a codec and the private options it always gets.

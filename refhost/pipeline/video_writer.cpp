@@ -17,19 +17,11 @@ extern "C" {
 #include <cstring>
 #include <stdexcept>
 
+#include "refhost/media/audio_track.h"
+#include "refhost/media/ffmpeg_utilities.h"
+
 namespace refhost {
 namespace {
-
-std::string errorText(int code) {
-  char buffer[AV_ERROR_MAX_STRING_SIZE] = {};
-  av_strerror(code, buffer, sizeof buffer);
-  return buffer;
-}
-
-// FFmpeg's muxers are named as the containers' file extensions, but for Matroska's.
-const char* muxerName(VideoContainer container) {
-  return container == VideoContainer::Mkv ? "matroska" : containerExtension(container);
-}
 
 // Half floats to 16 bits a channel, clamped to 0 to 1 and rounded, one lookup a sample.
 const std::vector<uint16_t>& sixteenBitsOfHalf() {
@@ -45,13 +37,26 @@ const std::vector<uint16_t>& sixteenBitsOfHalf() {
   return table;
 }
 
-// The matrices swscale converts with, numbered as H.273 numbers them.
+// The matrices swscale converts with.
 bool swscaleHasMatrix(int32_t matrix) {
-  return matrix == 1 || matrix == 4 || matrix == 5 || matrix == 6 || matrix == 7 || matrix == 9 ||
-         matrix == 10;
+  using C = ColourDescription;
+  for (int32_t known : {C::kMatrixBt709, C::kMatrixFcc, C::kMatrixBt470bg, C::kMatrixSmpte170m,
+                        C::kMatrixSmpte240m, C::kMatrixBt2020, C::kMatrixBt2020Constant})
+    if (matrix == known) return true;
+  return false;
 }
 
 }  // namespace
+
+// FFmpeg's muxers are named as the containers' file extensions, but for Matroska's.
+const char* muxerName(VideoContainer container) {
+  return container == VideoContainer::Mkv ? "matroska" : containerExtension(container);
+}
+
+// Apple's players take HEVC in MP4 and QuickTime files only under this tag.
+uint32_t videoCodecTag(const std::string& coding, VideoContainer container) {
+  return coding == "hevc" && container != VideoContainer::Mkv ? MKTAG('h', 'v', 'c', '1') : 0;
+}
 
 bool containerHolds(VideoContainer container, const std::string& codec) {
   // The QuickTime muxer shares MP4's table of codecs, so it answers yes for VP9 and AV1, then
@@ -98,7 +103,7 @@ struct VideoWriter::Encoder {
 
   [[noreturn]] void fail(const std::string& what, int code = 0) const {
     throw std::runtime_error(shownName + ": cannot write video: " + what +
-                             (code ? " (" + errorText(code) + ")" : ""));
+                             (code ? " (" + avErrorText(code) + ")" : ""));
   }
 
   void addNote(const std::string& text) { note += (note.empty() ? "" : "; ") + text; }
@@ -143,7 +148,7 @@ struct VideoWriter::Encoder {
     codec->color_range = colour.fullRange ? AVCOL_RANGE_JPEG : AVCOL_RANGE_MPEG;
   }
 
-  void open(VideoContainer container, double frameRate, const AudioClip& audioClip) {
+  void open(VideoContainer container, FrameRate frameRate, const std::vector<AudioClip>& sound) {
     if (auto refusal = refusalOf(settings, container))
       throw std::invalid_argument(shownName + ": cannot write video: " + refusal->reason);
     if (!swscaleHasMatrix(settings.colour.matrix))
@@ -176,16 +181,16 @@ struct VideoWriter::Encoder {
     av_pix_fmt_get_chroma_sub_sample(codec->pix_fmt, &chromaShiftX, &chromaShiftY);
     codec->width = chromaShiftX ? (width + 1) & ~1 : width;
     codec->height = chromaShiftY ? (height + 1) & ~1 : height;
-    AVRational rate = av_d2q(frameRate > 0 ? frameRate : 25.0, 1001000);
+    const FrameRate exact = reduced(frameRate.valid() ? frameRate : FrameRate{25, 1});
+    const AVRational rate{static_cast<int>(exact.numerator), static_cast<int>(exact.denominator)};
     codec->time_base = av_inv_q(rate);
     codec->framerate = rate;
     // The encoder's own keyframe interval, and as many threads as it wants: the settings the
     // ffmpeg command line uses, so files and speed compare with its.
     codec->thread_count = 0;
     tagColour();
-    // Apple's players take HEVC in MP4 and QuickTime files only under this tag.
-    if (info.coding == "hevc" && container != VideoContainer::Mkv)
-      codec->codec_tag = MKTAG('h', 'v', 'c', '1');
+    codec->codec_tag = videoCodecTag(info.coding, container);
+    if (settings.piece) makeJoinable(*settings.piece);
     if (format->oformat->flags & AVFMT_GLOBALHEADER) codec->flags |= AV_CODEC_FLAG_GLOBAL_HEADER;
     // SVT-AV1 prints its whole configuration to stderr unless its log level says otherwise.
     if (codecName == "libsvtav1") setenv("SVT_LOG", "1", 0);
@@ -197,12 +202,16 @@ struct VideoWriter::Encoder {
       fail("codec data", result);
     stream->time_base = codec->time_base;
     stream->avg_frame_rate = rate;
-    if (!audioClip.path.empty()) audio = AudioTrack::open(audioClip, format);
+    if (!sound.empty()) audio = AudioTrack::open(sound, format);
 
     if ((result = avio_open(&format->pb, path.c_str(), AVIO_FLAG_WRITE)) < 0)
       fail("cannot create the file", result);
-    if ((result = avformat_write_header(format, nullptr)) < 0)
-      fail("cannot write the header", result);
+    // QuickTime files keep tags of their own only when asked to.
+    AVDictionary* headerOptions = nullptr;
+    if (settings.piece) av_dict_set(&headerOptions, "movflags", "+use_metadata_tags", 0);
+    result = avformat_write_header(format, &headerOptions);
+    av_dict_free(&headerOptions);
+    if (result < 0) fail("cannot write the header", result);
     headerWritten = true;
 
     frame->format = codec->pix_fmt;
@@ -214,6 +223,17 @@ struct VideoWriter::Encoder {
     frame->color_trc = codec->color_trc;
     frame->color_range = codec->color_range;
     if ((result = av_frame_get_buffer(frame, 0)) < 0) fail("out of memory", result);
+  }
+
+  // A piece of a longer video (see JoinablePiece): GOPs of the same length in every piece and
+  // closed, so that none refers to a frame of another piece, and timestamps that go on from
+  // the pieces before it.
+  void makeJoinable(const JoinablePiece& piece) {
+    if (piece.gopLength > 0) codec->gop_size = piece.gopLength;
+    codec->flags |= AV_CODEC_FLAG_CLOSED_GOP;
+    nextPts = piece.firstFrame;
+    for (const auto& [key, value] : piece.tags)
+      av_dict_set(&format->metadata, key.c_str(), value.c_str(), 0);
   }
 
   // A conversion from the RGB format to the encoder's format, with the matrix and range asked
@@ -287,14 +307,12 @@ struct VideoWriter::Encoder {
 };
 
 VideoWriter::VideoWriter(const std::string& path, VideoContainer container, int32_t width,
-                         int32_t height, double frameRate, const VideoEncoding& encoding,
-                         const std::string& shownName, const AudioClip& audio)
+                         int32_t height, FrameRate frameRate, const VideoEncoding& encoding,
+                         const std::string& shownName, const std::vector<AudioClip>& audio)
     : encoder_(std::make_unique<Encoder>()) {
   encoder_->path = path;
   encoder_->shownName = shownName.empty() ? path : shownName;
   encoder_->settings = encoding;
-  // The libraries' progress chatter would bury the command line's own output.
-  av_log_set_level(AV_LOG_ERROR);
   encoder_->width = width;
   encoder_->height = height;
   if (width <= 0 || height <= 0) encoder_->fail("a video needs a frame of at least 1x1");

@@ -5,24 +5,33 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <vector>
 
-#include "refhost/media/audio_track.h"
+#include "refhost/media/audio_input.h"
+#include "refhost/media/frame_rate.h"
 #include "refhost/media/rgba_image.h"
 #include "refhost/pipeline/video_encoding.h"
 
 namespace refhost {
 
+// FFmpeg's muxer for the container, and the tag a video stream of the coding (FFmpeg's name of
+// it, "hevc") is filed under in the container (0: the muxer's own choice). The joiner of
+// pieces writes its streams as the writer does.
+const char* muxerName(VideoContainer container);
+uint32_t videoCodecTag(const std::string& coding, VideoContainer container);
+
 class VideoWriter {
  public:
-  // Opens the file for frames of the size at the rate (frames per second), written as the
-  // container whatever the path's name. Chroma-subsampled video needs even sizes: an odd width
-  // or height is padded by repeating the last column or row. Throws std::invalid_argument for
-  // settings refusalOf() refuses, std::runtime_error for the rest, naming the file by
-  // `shownName` when given (the user's name for a file written under a temporary one), else by
-  // the path. With an audio clip, the file carries its sound too (see AudioClip).
+  // Opens the file for frames of the size at the rate, its time base exactly one frame,
+  // written as the container whatever the path's name. Chroma-subsampled video needs even
+  // sizes: an odd width or height is padded by repeating the last column or row. Throws
+  // std::invalid_argument for settings refusalOf() refuses, std::runtime_error for the rest,
+  // naming the file by `shownName` when given (the user's name for a file written under a
+  // temporary one), else by the path. With audio clips, the file carries their sound too, mixed
+  // when there are several (see AudioTrack).
   VideoWriter(const std::string& path, VideoContainer container, int32_t width, int32_t height,
-              double frameRate, const VideoEncoding& encoding, const std::string& shownName = "",
-              const AudioClip& audio = {});
+              FrameRate frameRate, const VideoEncoding& encoding, const std::string& shownName = "",
+              const std::vector<AudioClip>& audio = {});
   // Without finish() the file is closed as it is (unplayable); the caller deletes it.
   ~VideoWriter();
   VideoWriter(const VideoWriter&) = delete;

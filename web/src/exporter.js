@@ -34,12 +34,12 @@ export async function exportVideo(page, options = {}, onProgress = () => {}, sig
   const output = new Output({ format: container.format(), target: new BufferTarget() });
   const video = new VideoSampleSource({ codec: container.codec, bitrate: QUALITY_HIGH });
   output.addVideoTrack(video, { frameRate: fps });
-  const sound = options.audio === false || !page.sourcePath ? null : page.media.audioSamples(page.sourcePath, total / fps);
+  const sound = options.audio === false || !page.sourcePath ? null : page.media.audioSamples(page.sourcePath, page.frameSeconds(total));
   const audio = sound ? new AudioSampleSource({ codec: 'opus', bitrate: 128000 }) : null;
   if (audio) output.addAudioTrack(audio);
   await output.start();
 
-  const times = Array.from({ length: total }, (_, i) => (first + i) / fps);
+  const times = Array.from({ length: total }, (_, i) => page.frameSeconds(first + i));
   page.media.startSequence(times);
   const started = performance.now();
   try {
@@ -52,8 +52,8 @@ export async function exportVideo(page, options = {}, onProgress = () => {}, sig
         format: 'RGBA',
         codedWidth: width,
         codedHeight: height,
-        timestamp: i / fps,
-        duration: 1 / fps,
+        timestamp: page.frameSeconds(i),
+        duration: page.frameSeconds(1),
       });
       await video.add(sample);
       sample.close();

@@ -11,12 +11,16 @@ import {
   Input,
 } from '../vendor/mediabunny.js';
 
-const kVideo = 1;
+export const kVideoKind = 1;
 const kStill = 2;
 // Frames kept per clip beyond those the last render used.
 const kKeptFrames = 48;
 
 const timeKey = (seconds) => Math.round(seconds * 1e6);
+// A frame whose time equals the time asked for is shown at it, whatever rounding the two
+// computations of that time met: the decoder is asked a little after it.
+const kSameTime = 1e-7;
+const decoderTime = (entry, seconds) => entry.first + Math.max(seconds, 0) + kSameTime;
 
 // A problem with a file, worded as the page shows it: the file's name, then what was expected.
 export class MediaProblem extends Error {}
@@ -45,7 +49,7 @@ async function openVideo(name, blob) {
   const audio = await input.getPrimaryAudioTrack();
   const hasAudio = !!audio && (await audio.canDecode());
   return {
-    kind: kVideo,
+    kind: kVideoKind,
     name,
     input,
     audio: hasAudio ? audio : null,
@@ -110,9 +114,9 @@ export class MediaLibrary {
       kind: entry.kind,
       width: entry.width,
       height: entry.height,
-      frameRate: entry.kind === kVideo ? entry.frameRate : 0,
-      duration: entry.kind === kVideo ? entry.duration : 0,
-      hasAudio: entry.kind === kVideo && !!entry.audio,
+      frameRate: entry.kind === kVideoKind ? entry.frameRate : 0,
+      duration: entry.kind === kVideoKind ? entry.duration : 0,
+      hasAudio: entry.kind === kVideoKind && !!entry.audio,
     };
   }
 
@@ -165,7 +169,7 @@ export class MediaLibrary {
       const key = timeKey(seconds);
       if (entry.frames.has(key)) continue;
       const wrapped =
-        (await entry.sink.getCanvas(entry.first + Math.max(seconds, 0))) ??
+        (await entry.sink.getCanvas(decoderTime(entry, seconds))) ??
         (await entry.sink.getCanvas(entry.first));
       if (wrapped) entry.frames.set(key, wrapped.canvas);
     }
@@ -179,7 +183,7 @@ export class MediaLibrary {
       entry.sequence = {
         times,
         next: 0,
-        iterator: entry.sink.canvasesAtTimestamps(times.map((t) => entry.first + Math.max(t, 0))),
+        iterator: entry.sink.canvasesAtTimestamps(times.map((t) => decoderTime(entry, t))),
       };
     }
   }
@@ -210,7 +214,7 @@ export class MediaLibrary {
   }
 
   *videos() {
-    for (const entry of this.entries.values()) if (entry.kind === kVideo) yield entry;
+    for (const entry of this.entries.values()) if (entry.kind === kVideoKind) yield entry;
   }
 
   forgetUnused() {

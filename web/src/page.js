@@ -3,7 +3,7 @@
 // fails leaves the open scene as it was and throws one line naming the file.
 import createVeltrane from '../veltrane.js';
 import { installWebGlSeams } from './webgl_seams.js';
-import { MediaLibrary, MediaProblem } from './media.js';
+import { MediaLibrary, MediaProblem, kVideoKind } from './media.js';
 
 export const kMostClips = 9;
 // A render asks again after decoding what it missed; time-shifted inputs may each miss once.
@@ -117,10 +117,15 @@ export class Page {
         throw error instanceof MediaProblem ? new PageProblem(error.message) : error;
       }
     }
+    // The composition runs at the first video's rate (the first clip's when it is one), as
+    // `veltrane split` chooses it, else at 25 frames a second.
     const first = facts[0];
-    const rate = first.kind === 1 && first.frameRate > 0 ? Math.round(first.frameRate * 1000) / 1000 : 25;
+    const video = facts.find((entry) => entry.kind === kVideoKind && entry.frameRate > 0);
+    const rateText = video ? this.wasm.clipRateText(video.frameRate) : '25';
+    const [numerator, denominator = 1] = rateText.split('/').map(Number);
+    const rate = numerator / denominator;
     const framesOf = (entry) =>
-      entry.kind === 1 && entry.duration > 0 ? Math.max(1, Math.ceil(entry.duration * rate - 1e-6)) : 0;
+      entry.kind === kVideoKind && entry.duration > 0 ? Math.max(1, Math.ceil(entry.duration * rate - 1e-6)) : 0;
     const longest = Math.max(0, ...facts.map(framesOf));
     const duration = Math.max(framesOf(first) || longest, 1);
     const even = (value) => Math.max(2, Math.round(value / 2) * 2);
@@ -136,7 +141,7 @@ export class Page {
       description: `split of ${clips.length} clip${clips.length === 1 ? '' : 's'}`,
       width: first.width > 0 ? even(first.width) : 1920,
       height: first.height > 0 ? even(first.height) : 1080,
-      fps: rate,
+      fps: denominator === 1 ? numerator : rateText,
       duration,
       source: source(0),
       layers,
@@ -202,6 +207,13 @@ export class Page {
       await this.media.prepare(misses);
     }
     if (failure) throw new PageProblem(failure);
+  }
+
+  // Where composition frame `n` lies in seconds, exactly as the host computes it from the
+  // composition's rate, so that the frames decoded for it are found under the same time.
+  frameSeconds(n) {
+    const [numerator, denominator] = this.info.rate;
+    return (n * denominator) / numerator;
   }
 
   present() {

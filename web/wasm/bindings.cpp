@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <string>
 
+#include "browser_media.h"
 #include "page_session.h"
 
 namespace veltrane_web {
@@ -36,10 +37,14 @@ emscripten::val readPicture(PageSession& session) {
   return emscripten::val(emscripten::typed_memory_view(pixels.size(), pixels.data()));
 }
 
+// A clip's rate as a scene writes it ("25", "30000/1001"), from the rate the browser measured.
+std::string clipRateText(double perSecond) { return clipRate(perSecond).text(); }
+
 }  // namespace
 
 EMSCRIPTEN_BINDINGS(veltrane_page) {
   emscripten::function("attachCanvas", &attachCanvas);
+  emscripten::function("clipRateText", &clipRateText);
   emscripten::class_<PageSession>("PageSession")
       .constructor<>()
       .function("open", &PageSession::open)

@@ -1,19 +1,25 @@
 // The page's side of the host's media files: the clips and photos a person dropped were decoded
 // by the browser (web/src/media.js), which answers here, synchronously, by the names a scene
-// gives them. Pictures arrive upright (EXIF orientation and a clip's display rotation applied
-// by the browser) in RGB at 8 bits a channel.
+// gives them. What a file is (moving pictures or a still) is what the browser's decoders made
+// of its content. Pictures arrive upright (EXIF orientation and a clip's display rotation
+// applied by the browser) in RGB at 8 bits a channel.
+#include "browser_media.h"
+
 #include <emscripten.h>
 
+#include <cmath>
 #include <stdexcept>
 #include <string>
 
 #include "refhost/media/image_files.h"
+#include "refhost/media/moving_pictures.h"
 #include "refhost/media/video_reader.h"
+#include "refhost/media/video_source.h"
 
 namespace {
 
-// What the page knows of a file: its kind (1 a video, 2 a still image), size, rate, length in
-// seconds and whether it has sound, or an error text in `problem`.
+// What the page knows of a file: its kind (1 a video, 2 a still image), size, frames a second,
+// length in seconds and whether it has sound, or an error text in `problem`.
 // clang-format off
 EM_JS(int, pageMediaDescribe, (const char* path, double* facts, char* problem, int problemBytes), {
   const found = Module.veltraneMedia.describe(UTF8ToString(path));
@@ -52,7 +58,8 @@ PageFacts describe(const std::string& path) {
   if (out.kind == 0) throw std::runtime_error(path + ": " + problem);
   out.info.width = static_cast<int32_t>(facts[0]);
   out.info.height = static_cast<int32_t>(facts[1]);
-  out.info.frameRate = facts[2];
+  out.info.video = out.kind == kVideo;
+  if (out.info.video) out.info.frameRate = veltrane_web::clipRate(facts[2]);
   out.info.duration = facts[3];
   out.info.hasAudio = facts[4] != 0;
   return out;
@@ -60,14 +67,25 @@ PageFacts describe(const std::string& path) {
 
 }  // namespace
 
+namespace veltrane_web {
+
+refhost::FrameRate clipRate(double perSecond) {
+  if (!(perSecond > 0) || perSecond > 1e6) return {};
+  return refhost::snappedToCommonRate({std::llround(perSecond * 1001000), 1001000});
+}
+
+}  // namespace veltrane_web
+
 namespace refhost {
 
+// The browser's decoders conceal damaged frames without saying which: nothing is recorded.
 struct VideoReader::Decoder {
   std::string path;
   MediaInfo info;
 };
 
-VideoReader::VideoReader(const std::string& path) : decoder_(std::make_unique<Decoder>()) {
+VideoReader::VideoReader(const std::string& path, std::shared_ptr<DamagedFrames>)
+    : decoder_(std::make_unique<Decoder>()) {
   PageFacts facts = describe(path);
   if (facts.kind != kVideo) throw std::runtime_error(path + ": not a video");
   decoder_->path = path;
@@ -78,18 +96,27 @@ VideoReader::~VideoReader() = default;
 
 const MediaInfo& VideoReader::info() const { return decoder_->info; }
 
-std::vector<uint8_t> VideoReader::glRowsAt(double seconds, int32_t width, int32_t height,
-                                           PixelFormat format) {
+std::vector<uint8_t> VideoReader::glRowsAt(int64_t frame, FrameRate rate, int32_t width,
+                                           int32_t height, PixelFormat format) {
   RgbaImage picture(width, height, PixelFormat::Rgba8);
+  const double seconds =
+      rate.valid() ? static_cast<double>(frame) * rate.denominator / rate.numerator : 0;
   pageVideoRows(decoder_->path.c_str(), seconds, width, height, picture.pixels.data());
   if (format == PixelFormat::Rgba8) return std::move(picture.pixels);
   return converted(picture, format).pixels;
 }
 
-RgbaImage VideoReader::frameAt(double seconds, int32_t width, int32_t height, PixelFormat format) {
+RgbaImage VideoReader::frameAt(int64_t frame, FrameRate rate, int32_t width, int32_t height,
+                               PixelFormat format) {
   RgbaImage picture(width, height, format);
-  picture.pixels = flipRows(glRowsAt(seconds, width, height, format), width, height);
+  picture.pixels = flipRows(glRowsAt(frame, rate, width, height, format), width, height);
   return picture;
+}
+
+std::shared_ptr<MediaSource> openMovingPictures(const MediaSpec& spec, FrameRate compositionRate) {
+  const bool video = spec.info ? spec.info->video : describe(spec.path).kind == kVideo;
+  if (!video) return nullptr;
+  return openVideoSource(spec.path, compositionRate, spec.damage);
 }
 
 RgbaImage readImageFile(const std::string& path) {

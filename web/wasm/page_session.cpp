@@ -88,7 +88,8 @@ std::string PageSession::describe() const {
         {{"name", layout.name}, {"menuName", layout.menuName}, {"regions", layout.regions}});
   return Json{{"width", composition.width},
               {"height", composition.height},
-              {"fps", composition.frameRate},
+              {"fps", composition.frameRate.perSecond()},
+              {"rate", {composition.frameRate.numerator, composition.frameRate.denominator}},
               {"duration", composition.duration},
               {"layers", layers},
               {"layouts", layouts},

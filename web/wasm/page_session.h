@@ -29,8 +29,8 @@ class PageSession {
   std::string open(const std::string& text, const std::string& file);
   bool isOpen() const { return session_ != nullptr; }
 
-  // {"width", "height", "fps", "duration", "layers": [{guid, name}], "panel": declared tree,
-  // "layouts": [{name, menuName, regions}]}.
+  // {"width", "height", "fps" (frames a second), "rate": [numerator, denominator], "duration",
+  // "layers": [{guid, name}], "panel": declared tree, "layouts": [{name, menuName, regions}]}.
   std::string describe() const;
   // {"values": {id: value at the frame}, "enabled": {id: bool}, "keys": {id: "static" |
   // "animated" | "key"}, "undo": [names], "redo": [names], "status": text}.

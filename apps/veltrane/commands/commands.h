@@ -20,5 +20,7 @@ int runInteract(const std::vector<std::string>& args);
 int runBench(const std::vector<std::string>& args);
 int runSoak(const std::vector<std::string>& args);
 int runView(const std::vector<std::string>& args);
+int runPlan(const std::vector<std::string>& args);
+int runAssemble(const std::vector<std::string>& args);
 
 }  // namespace veltrane_cli

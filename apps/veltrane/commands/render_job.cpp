@@ -46,12 +46,6 @@ int imageWriters() {
   return static_cast<int>(std::clamp(std::thread::hardware_concurrency(), 1u, 4u));
 }
 
-struct FrameRange {
-  int32_t first = 0;
-  int32_t last = 0;
-  int32_t count() const { return last - first + 1; }
-};
-
 FrameRange parseRange(const std::string& text) {
   std::string::size_type dash = text.find('-', 1);
   if (dash == std::string::npos) {  // one frame, as --frame N
@@ -157,66 +151,33 @@ int32_t outputBitDepth(const refhost::OutputTarget& target) {
   return target.imageFormat == refhost::ImageFormat::Exr ? 16 : target.imageBitDepth;
 }
 
-// The file whose sound a video carries for --audio-from; refused when there is none to take.
-std::string audioFile(const AudioFrom& from, const Scene& scene) {
-  if (from.kind == AudioFrom::Kind::File) {
-    std::error_code error;
-    const auto status = std::filesystem::status(from.name, error);
-    if (!std::filesystem::exists(status))
-      throw UsageError("option '--audio-from': expected a file with sound, '" + from.name +
-                       "' does not exist");
-    if (std::filesystem::is_directory(status))
-      throw UsageError("option '--audio-from': expected a file with sound, '" + from.name +
-                       "' is a directory");
-    return from.name;
-  }
-  const refhost::Composition& composition = scene.composition;
-  const refhost::MediaSpec* media =
-      composition.ownLayerName == from.name ? &composition.source : nullptr;
-  std::string names = "'" + composition.ownLayerName + "'";
-  for (const refhost::CompositionLayer& layer : composition.layers) {
-    if (!media && layer.layer.name == from.name) media = &layer.media;
-    names += ", '" + layer.layer.name + "'";
-  }
-  if (!media)
-    throw UsageError(
-        "option '--audio-from': expected 'layer' and the name of one of the scene's "
-        "layers (" +
-        names + "), got '" + from.name + "'");
-  if (media->kind != refhost::MediaSpec::Kind::File || !refhost::isVideoPath(media->path))
-    throw UsageError("option '--audio-from': layer '" + from.name +
-                     "' shows no video file, so it has no sound");
-  return media->path;
+// What was damaged in a clip ("frame 89 is damaged (slices that did not decode)"), or empty
+// when nothing was.
+std::string damageText(const refhost::MediaSpec& media) {
+  if (!media.damage || media.damage->count() == 0) return "";
+  const int32_t count = media.damage->count();
+  const std::string reason = " (" + media.damage->reason() + ")";
+  if (media.info && !media.info->video) return "its picture decodes only in part" + reason;
+  const std::string first = "frame " + std::to_string(media.damage->first());
+  if (count == 1) return first + " is damaged" + reason;
+  return std::to_string(count) + " frames are damaged, the first " + first + reason;
 }
 
-// The sound a video carries, over the time of the frames rendered: the effect's own source's
-// when that is a video, another file's or a layer's with --audio-from, none with --no-audio.
-refhost::AudioClip chooseAudio(const AudioFrom& from,
-                               const std::map<std::string, std::string>& options,
-                               const Scene& scene, const refhost::OutputTarget& target,
-                               const FrameRange& frames) {
-  const bool video = target.kind == refhost::OutputKind::Video;
-  if (from.kind != AudioFrom::Kind::None) {
-    if (options.count("--no-audio")) throw UsageError("give --audio-from or --no-audio, not both");
-    if (!video)
-      throw UsageError("option '--audio-from': " + imageKind(target) +
-                       " has no sound; it applies to .mp4, .mov, .mkv and .webm outputs");
-  }
-  if (!video || options.count("--no-audio")) return {};
-  const refhost::Composition& composition = scene.composition;
-  refhost::AudioClip clip;
-  if (from.kind != AudioFrom::Kind::None) {
-    clip.path = audioFile(from, scene);
-    clip.required = true;
-  } else if (composition.source.kind == refhost::MediaSpec::Kind::File &&
-             refhost::isVideoPath(composition.source.path)) {
-    clip.path = composition.source.path;
-  } else {
-    return {};
-  }
-  clip.startSeconds = frames.first / composition.frameRate;
-  clip.seconds = frames.count() / composition.frameRate;
-  return clip;
+// Each clip with damage, as "clip 1 (a.mp4): frame 89 is damaged (...)", joined by "; ".
+std::string damagedClips(const Scene& scene) {
+  const std::vector<const refhost::MediaSpec*> media = sceneMedia(scene);
+  const std::vector<std::string> names = clipNames(scene);
+  std::string clips;
+  for (std::size_t i = 0; i < media.size(); ++i)
+    if (const std::string damage = damageText(*media[i]); !damage.empty())
+      clips += (clips.empty() ? "" : "; ") + names[i] + ": " + damage;
+  return clips;
+}
+
+// With --strict, a damaged frame fails the job in one line.
+void refuseDamage(const Scene& scene) {
+  if (const std::string clips = damagedClips(scene); !clips.empty())
+    throw std::runtime_error(clips + "; --strict refuses damaged frames");
 }
 
 }  // namespace
@@ -225,7 +186,7 @@ const std::vector<OptionDefinition> kRenderOutputOptions = {
     {"-o", true},          {"--output", true}, {"--frame", true},   {"--frames", true},
     {"--codec", true},     {"--crf", true},    {"--preset", true},  {"--bit-depth", true},
     {"--no-audio", false}, {"--quiet", false}, {"--profile", true}, {"--plugin", true},
-    {"--call-log", true}};
+    {"--call-log", true},  {"--audio", true},  {"--strict", false}};
 
 const char kRenderOutputHelp[] =
     "OUT by its name:\n"
@@ -235,9 +196,13 @@ const char kRenderOutputHelp[] =
     "  NAME.mov                  ProRes 422 HQ, 10-bit\n"
     "  NAME.webm                 VP9\n"
     "A video is converted to and tagged with the scene's colour space (its video source's, else\n"
-    "BT.709). When the effect's own source is a video with sound, a video output carries the\n"
-    "sound of the frames rendered (copied, or encoded as AAC, or Opus in .webm, where the\n"
-    "container needs it). A missing folder for OUT is made.\n"
+    "BT.709). It carries the sound of the frames rendered: the first clip's by default (copied,\n"
+    "or encoded as AAC, or Opus in .webm, where the container needs it), as long as the video,\n"
+    "silent where a clip's sound ends; a note says why a video is silent. Clips are numbered\n"
+    "from 1: the effect's own source, then the scene's layers in order (for split, the clips\n"
+    "in the order given). A missing folder for OUT is made.\n"
+    "A damaged frame of a clip is shown as the decoder conceals it (or the last good frame is\n"
+    "held), and a warning at the end names the clips that had any.\n"
     "Files appear under their names only when complete, a sequence's all at once; on any\n"
     "failure, or when stopped by SIGINT, SIGTERM or SIGHUP (exit status 128 + the signal's\n"
     "number), nothing new is left and a file that had the name keeps its contents.\n"
@@ -257,10 +222,15 @@ const char kRenderOutputHelp[] =
     "  --bit-depth B      bits a channel: 8 or 10 for a video (10 with h265, prores, ffv1, vp9\n"
     "                     and av1; default 8, prores 10), 8 or 16 for a .png output (default 8);\n"
     "                     .exr is always half float. Above 8, frames are rendered in half floats\n"
-    "  --audio-from FILE  a video's sound from FILE instead of the effect's own source\n"
+    "  --audio-from N     a video's sound from clip N (e.g. --audio-from 2)\n"
+    "  --audio-from FILE  a video's sound from FILE (e.g. --audio-from take2.wav)\n"
     "  --audio-from layer NAME\n"
     "                     a video's sound from the source file of the scene's layer NAME\n"
+    "  --audio mix        the sound of every clip that has some, mixed (each at 1/N of its\n"
+    "                     level, N the clips sounding, so the sum cannot clip)\n"
+    "  --audio N,M,...    the sound of the clips listed, mixed (e.g. --audio 1,3)\n"
     "  --no-audio         leave the sound out of a video\n"
+    "  --strict           fail on the first damaged frame of a clip instead of concealing it\n"
     "  --quiet            print no progress (into a log it is a line every few seconds)\n"
     "  --profile P        the profile of the host's OpenGL context: core (default) or compat\n"
     "                     (compatibility; not a video setting)\n"
@@ -269,46 +239,16 @@ const char kRenderOutputHelp[] =
     "  --call-log FILE    write every message and the host operations the plug-in called\n"
     "                     during it to FILE (for looking into the plug-in; slower)\n";
 
-// Takes "--audio-from FILE" and "--audio-from layer NAME" out of the arguments before the
-// others are parsed: the layer form is two words, so that a layer's name needs no quoting
-// of its own. The last one given counts, as with every other option.
-AudioFrom takeAudioFrom(std::vector<std::string>& args) {
-  AudioFrom found;
-  const std::string option = "--audio-from";
-  for (std::size_t i = 0; i < args.size();) {
-    std::string value;
-    if (args[i] == option) {
-      if (i + 1 >= args.size()) throw UsageError("option '--audio-from' needs a value");
-      value = args[i + 1];
-      args.erase(args.begin() + static_cast<long>(i), args.begin() + static_cast<long>(i) + 2);
-    } else if (args[i].rfind(option + "=", 0) == 0) {
-      value = args[i].substr(option.size() + 1);
-      args.erase(args.begin() + static_cast<long>(i));
-    } else {
-      ++i;
-      continue;
-    }
-    if (value != "layer") {
-      found = {AudioFrom::Kind::File, value};
-    } else if (i < args.size()) {
-      found = {AudioFrom::Kind::Layer, args[i]};
-      args.erase(args.begin() + static_cast<long>(i));
-    } else {
-      throw UsageError("option '--audio-from': expected a layer's name after 'layer'");
-    }
-  }
-  return found;
-}
-
 std::string outputName(const std::map<std::string, std::string>& options) {
   if (options.count("-o") && options.count("--output")) throw UsageError("give -o only once");
   if (!options.count("-o") && !options.count("--output")) throw UsageError("needs -o OUT");
   return options.count("-o") ? options.at("-o") : options.at("--output");
 }
 
-int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
-                const AudioFrom& audioFrom, const std::string& command) {
-  refhost::OutputTarget target;
+RenderJob chooseRenderJob(const Scene& scene, const std::map<std::string, std::string>& options,
+                          const AudioFrom& audioFrom) {
+  RenderJob job;
+  refhost::OutputTarget& target = job.target;
   try {
     target = refhost::parseOutputTarget(outputName(options));
   } catch (const std::invalid_argument& error) {
@@ -319,24 +259,45 @@ int renderScene(const Scene& scene, const std::map<std::string, std::string>& op
   } else {
     chooseImageDepth(options, target);
   }
+  glProfile(options);  // checked with the other options, before anything is read
+  job.frames = chooseFrames(options, target, scene);
+  // The colour a video is converted to and tagged with is the composition's: the scene's own
+  // choice, else its video source's, else BT.709 (see refhost::defaultColour).
+  target.video.colour = scene.composition.colour;
+  const refhost::FrameRate rate = scene.composition.frameRate;
+  job.sound = chooseSound(
+      audioFrom, options, scene, target.kind == refhost::OutputKind::Video ? "" : imageKind(target),
+      static_cast<double>(job.frames.first) * rate.denominator / rate.numerator,
+      static_cast<double>(job.frames.count()) * rate.denominator / rate.numerator);
+  job.strict = options.count("--strict") > 0;
+  return job;
+}
+
+int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
+                const AudioFrom& audioFrom, const std::string& command) {
+  return runRenderJob(scene, chooseRenderJob(scene, options, audioFrom), options, command);
+}
+
+int runRenderJob(const Scene& scene, const RenderJob& job,
+                 const std::map<std::string, std::string>& options, const std::string& command) {
+  const refhost::OutputTarget& target = job.target;
+  const FrameRange& frames = job.frames;
   refhost::GlProfile profile = glProfile(options);
   std::string module = pluginPath(options);
 
   noteStopSignals();
   keepFrameMemory();
-  FrameRange frames = chooseFrames(options, target, scene);
   const refhost::Composition& composition = scene.composition;
-  // The colour a video is converted to and tagged with is the composition's: the scene's own
-  // choice, else its video source's, else BT.709 (see refhost::defaultColour).
-  target.video.colour = composition.colour;
-  const refhost::AudioClip audio = chooseAudio(audioFrom, options, scene, target, frames);
+  const SoundChoice& sound = job.sound;
+  const bool strict = job.strict;
+  if (strict) refuseDamage(scene);  // stills are read with the scene
   // A missing folder for the output is made (and taken away again if the render fails).
   std::string folder = std::filesystem::path(target.path).parent_path().string();
   MadeFolder madeFolder(folder, "-o");
   // The output is opened first so that a name that cannot be written fails before any render.
   // Until commit() it exists only under a temporary name, deleted if anything below throws.
   refhost::AsyncFrameSink sink(refhost::openFrameSink(target, composition.width, composition.height,
-                                                      composition.frameRate, audio),
+                                                      composition.frameRate, sound.clips),
                                imageWriters(), kQueuedFrames, kQueuedBytes);
   SceneEngineOptions engineOptions;
   engineOptions.modulePath = module;
@@ -355,16 +316,28 @@ int renderScene(const Scene& scene, const std::map<std::string, std::string>& op
         "rendering", frames.count(), stderr,
         options.count("--quiet") ? ProgressBar::Style::Quiet : ProgressBar::Style::Auto);
     refhost::RenderRun run = refhost::framesFromTo(frames.first, frames.last);
-    run.beforeFrame = throwIfStopped;
+    run.beforeFrame = [&] {
+      throwIfStopped();
+      if (strict) refuseDamage(scene);
+    };
     run.written = [&](int32_t done) { progress.update(done); };
     refhost::renderFrames(*engine, run, sink);
   }
   engine->finish();
   throwIfStopped();
+  if (strict) refuseDamage(scene);
   std::string note = sink.note();
   std::vector<std::string> written = sink.commit();
   madeFolder.keep();
   if (!note.empty()) std::fprintf(stderr, "veltrane %s: note: %s\n", command.c_str(), note.c_str());
+  if (!sound.silence.empty())
+    std::fprintf(stderr, "veltrane %s: note: %s has no sound: %s\n", command.c_str(),
+                 target.path.c_str(), sound.silence.c_str());
+  if (const std::string clips = damagedClips(scene); !clips.empty())
+    std::fprintf(stderr,
+                 "veltrane %s: warning: damaged frames were shown as the decoder concealed them: "
+                 "%s; --strict refuses them\n",
+                 command.c_str(), clips.c_str());
   std::string where =
       written.size() == 1 ? written.front() : written.front() + " ... " + written.back();
   std::printf("wrote %s (%d frame%s of %dx%d)\n", where.c_str(), frames.count(),

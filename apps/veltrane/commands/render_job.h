@@ -8,6 +8,8 @@
 #include <vector>
 
 #include "cli/cli_support.h"
+#include "commands/render_sound.h"
+#include "refhost/pipeline/frame_output.h"
 #include "scene/scene_document.h"
 
 namespace veltrane_cli {
@@ -16,23 +18,41 @@ namespace veltrane_cli {
 extern const std::vector<OptionDefinition> kRenderOutputOptions;
 extern const char kRenderOutputHelp[];
 
-// Takes "--audio-from FILE" and "--audio-from layer NAME" out of the arguments (the layer form
-// is two words) and keeps them for renderScene; call before parsing the rest.
-struct AudioFrom {
-  enum class Kind { None, File, Layer };
-  Kind kind = Kind::None;
-  std::string name;
-};
-AudioFrom takeAudioFrom(std::vector<std::string>& args);
-
 // The output's name from -o/--output; UsageError when it is missing, given twice or not an
 // output kind.
 std::string outputName(const std::map<std::string, std::string>& options);
 
-// Checks the output options against the output and the scene, then renders the scene's frames
-// (all, or --frame N / --frames A-B) into the output: a still, a sequence or a video with its
-// codec, quality, bit depth and sound. Prints "wrote ..." and returns the exit status.
-// `command` names the command in notes ("render", "split").
+// Frames first to last of the composition.
+struct FrameRange {
+  int32_t first = 0;
+  int32_t last = 0;
+  int32_t count() const { return last - first + 1; }
+};
+
+// What a render writes: the output with its encoding, the frames, and the sound a video
+// carries over their time.
+struct RenderJob {
+  refhost::OutputTarget target;
+  FrameRange frames;
+  SoundChoice sound;
+  // A damaged frame fails the job instead of being concealed.
+  bool strict = false;
+};
+
+// Checks the output options against the output and the scene and settles the job they ask
+// for: a still, a sequence or a video with its codec, quality, bit depth and sound, of every
+// frame or of --frame N / --frames A-B. Throws UsageError naming the option.
+RenderJob chooseRenderJob(const Scene& scene, const std::map<std::string, std::string>& options,
+                          const AudioFrom& audioFrom);
+
+// Renders the job's frames into its output with the context, module, progress and call log the
+// options ask for. Prints "wrote ..." and returns the exit status; a note says why a video is
+// silent, a warning which clips had damaged frames, concealed (with --strict a damaged frame
+// fails the job instead). `command` names the command in notes ("render", "split").
+int runRenderJob(const Scene& scene, const RenderJob& job,
+                 const std::map<std::string, std::string>& options, const std::string& command);
+
+// chooseRenderJob, then runRenderJob.
 int renderScene(const Scene& scene, const std::map<std::string, std::string>& options,
                 const AudioFrom& audioFrom, const std::string& command);
 

@@ -18,7 +18,7 @@ namespace {
 constexpr int32_t kMaxClips = 9;
 // Generated pictures and stills have no size or rate of their own.
 constexpr std::array<int32_t, 2> kDefaultSize{1920, 1080};
-constexpr double kDefaultRate = 25;
+constexpr refhost::FrameRate kDefaultRate{25, 1};
 
 std::string layerGuid(std::size_t clip) {
   char text[48];  // room for any size_t
@@ -54,12 +54,14 @@ struct Clip {
   nlohmann::ordered_json source;
   refhost::MediaInfo info;
   bool video = false;
-  std::string name;
+  std::string name;   // its layer's: the file's stem, a pattern's name, a colour
+  std::string shown;  // as messages name it: the file's name, or the argument
 };
 
 Clip readClip(const std::string& argument) {
   const std::string shown = "argument '" + argument + "'";
   Clip clip;
+  clip.shown = argument;
   refhost::MediaSpec spec;
   if (argument.rfind("pattern:", 0) == 0) {
     const std::string name = argument.substr(8);
@@ -94,15 +96,44 @@ Clip readClip(const std::string& argument) {
     if (why.rfind(argument + ": ", 0) == 0) why.erase(0, argument.size() + 2);
     throw UsageError(shown + ": expected a video or image file that shows a picture (" + why + ")");
   }
-  clip.video = refhost::isVideoPath(argument);
+  clip.video = clip.info.video;
   clip.source = {{"file", argument}, {"fit", "contain"}};
   clip.name = std::filesystem::path(argument).stem().string();
+  clip.shown = std::filesystem::path(argument).filename().string();
   return clip;
 }
 
-int32_t framesOf(const Clip& clip, double rate) {
+int32_t framesOf(const Clip& clip, refhost::FrameRate rate) {
   if (!clip.video || !(clip.info.duration > 0)) return 0;
-  return std::max(1, static_cast<int32_t>(std::ceil(clip.info.duration * rate - 1e-6)));
+  return std::max(1, static_cast<int32_t>(std::ceil(clip.info.duration * rate.perSecond() - 1e-6)));
+}
+
+// The composition's rate: the one asked for, else the first video's nominal rate, else 25; a
+// first clip without a rate of its own (a still, a generated picture) says which it took.
+refhost::FrameRate chooseRate(const SplitRequest& request, const std::vector<Clip>& clips,
+                              std::vector<std::string>& notes) {
+  if (request.fps) return *request.fps;
+  const auto video = std::find_if(clips.begin(), clips.end(), [](const Clip& clip) {
+    return clip.video && clip.info.frameRate.valid();
+  });
+  if (video == clips.begin()) return video->info.frameRate;
+  const std::string first = "clip 1 (" + clips.front().shown + ") is " +
+                            (clips.front().info.width > 0 ? "a still" : "generated");
+  if (video == clips.end()) {
+    notes.push_back(first + " and no clip is a video: the frames run at " + kDefaultRate.text() +
+                    " fps; --fps R sets another rate");
+    return kDefaultRate;
+  }
+  notes.push_back(first + ": the frames run at " + video->info.frameRate.text() +
+                  " fps, the rate of clip " + std::to_string(video - clips.begin() + 1) + " (" +
+                  video->shown + "); --fps R sets another rate");
+  return video->info.frameRate;
+}
+
+// A rate as a scene writes it: a whole number, or the exact fraction as text.
+nlohmann::ordered_json rateJson(refhost::FrameRate rate) {
+  if (reduced(rate).denominator == 1) return reduced(rate).numerator;
+  return rate.text();
 }
 
 // A parameter value as a scene file writes it, in the shape its declared kind has.
@@ -154,20 +185,20 @@ std::size_t chooseLayout(const SplitRequest& request, std::size_t clips) {
 
 struct Frame {
   std::array<int32_t, 2> size = kDefaultSize;
-  double rate = kDefaultRate;
+  refhost::FrameRate rate = kDefaultRate;
   int32_t duration = 1;
 };
 
 // The composition's size and rate from the first clip (or the options), its length from the
 // clips the request's length rule names.
-Frame compositionOf(const SplitRequest& request, const std::vector<Clip>& clips) {
+Frame compositionOf(const SplitRequest& request, const std::vector<Clip>& clips,
+                    std::vector<std::string>& notes) {
   Frame frame;
   const Clip& first = clips.front();
   if (first.info.width > 0 && first.info.height > 0)
     frame.size = {first.info.width, first.info.height};
   if (request.size) frame.size = *request.size;
-  frame.rate = request.fps.value_or(first.video && first.info.frameRate > 0 ? first.info.frameRate
-                                                                            : kDefaultRate);
+  frame.rate = chooseRate(request, clips, notes);
   // Stills and generated pictures have no length: they last as long as the composition. A
   // first clip without one leaves the length to the longest video.
   int32_t longest = 0, shortest = 0;
@@ -204,7 +235,7 @@ std::unique_ptr<refhost::Engine> regionEngine(const std::string& modulePath, con
   refhost::FrameSettings settings;
   settings.width = frame.size[0];
   settings.height = frame.size[1];
-  settings.frameRate = frame.rate;
+  settings.frameRate = frame.rate.perSecond();
   engine->setFrameSettings(settings);
   engine->start();
   engine->createInstance();
@@ -273,10 +304,10 @@ SplitScene buildSplitScene(const SplitRequest& request, const std::string& modul
   const std::vector<Clip> clips = readClips(request);
   const std::size_t layout = chooseLayout(request, clips.size());
   const LayoutInfo& info = layouts()[layout];
-  const Frame frame = compositionOf(request, clips);
+  SplitScene split;
+  const Frame frame = compositionOf(request, clips, split.notes);
   const LayoutPlan plan = planFor(request, layout, frame);
 
-  SplitScene split;
   if (static_cast<int32_t>(clips.size()) < info.regions)
     split.notes.push_back(std::string(info.name) + " shows " + std::to_string(info.regions) +
                           " pictures; the " + std::to_string(clips.size()) + " clip" +
@@ -306,7 +337,7 @@ SplitScene buildSplitScene(const SplitRequest& request, const std::string& modul
                                         (clips.size() == 1 ? "" : "s") + ", layout " + info.name},
                     {"width", frame.size[0]},
                     {"height", frame.size[1]},
-                    {"fps", frame.rate},
+                    {"fps", rateJson(frame.rate)},
                     {"duration", frame.duration},
                     {"source", clips.front().source},
                     {"layers", layers},
@@ -340,6 +371,16 @@ double parseNumber(const std::string& option, const std::string& text) {
   if (used == 0 || used != text.size() || !std::isfinite(value))
     throw UsageError("option '" + option + "' expects a number, got '" + text + "'");
   return value;
+}
+
+refhost::FrameRate parseFrameRate(const std::string& option, const std::string& text) {
+  const std::optional<refhost::FrameRate> rate = refhost::frameRateFromText(text);
+  if (!rate || rate->perSecond() < 0.001 || rate->perSecond() > 1000)
+    throw UsageError("option '" + option +
+                     "' expects a rate from 0.001 to 1000: a whole number, a decimal or a "
+                     "fraction (30, 29.97, 30000/1001), got '" +
+                     text + "'");
+  return *rate;
 }
 
 Point parsePoint(const std::string& option, const std::string& text) {
@@ -413,11 +454,7 @@ SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
   };
   if (auto* text = given("--layout")) request.layout = *text;
   if (auto* text = given("--size")) request.size = parseFrameSize("--size", *text);
-  if (auto* text = given("--fps")) {
-    request.fps = parseNumber("--fps", *text);
-    if (*request.fps < 0.001 || *request.fps > 1000)
-      throw UsageError("option '--fps' expects a rate from 0.001 to 1000, got '" + *text + "'");
-  }
+  if (auto* text = given("--fps")) request.fps = parseFrameRate("--fps", *text);
   if (auto* text = given("--duration")) request.length = parseLength("--duration", *text);
   if (auto* text = given("--angle")) request.layoutOptions.angle = parseNumber("--angle", *text);
   if (auto* text = given("--gap")) request.layoutOptions.gap = parseNumber("--gap", *text);

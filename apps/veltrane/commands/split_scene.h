@@ -13,6 +13,7 @@
 
 #include "cli/cli_support.h"
 #include "layouts/layouts.h"
+#include "refhost/media/frame_rate.h"
 
 namespace veltrane_cli {
 
@@ -35,7 +36,7 @@ struct SplitRequest {
   // "color:RRGGBB" for generated pictures.
   std::vector<std::string> clips;
   std::optional<std::array<int32_t, 2>> size;
-  std::optional<double> fps;
+  std::optional<refhost::FrameRate> fps;
   enum class Length { First, Longest, Shortest } length = Length::First;
   std::optional<std::string> layout;
   LayoutOptions layoutOptions;
@@ -45,7 +46,8 @@ struct SplitRequest {
 
 struct SplitScene {
   nlohmann::ordered_json document;  // a scene file's document
-  std::vector<std::string> notes;   // what the user should know (clips reused)
+  // What the user should know: clips shown again, the rate taken when the first clip has none.
+  std::vector<std::string> notes;
 };
 
 // Reads each clip to learn its size, rate, length and colour, and asks the module at
@@ -66,6 +68,9 @@ SplitRequest splitRequestFrom(const std::vector<std::string>& clips,
 // The parsers of split's options; each throws UsageError naming `option`.
 std::array<int32_t, 2> parseFrameSize(const std::string& option, const std::string& text);
 double parseNumber(const std::string& option, const std::string& text);
+// A rate as a whole number, a decimal or a fraction, from 0.001 to 1000 (see
+// refhost::frameRateFromText).
+refhost::FrameRate parseFrameRate(const std::string& option, const std::string& text);
 Point parsePoint(const std::string& option, const std::string& text);
 BorderSetting parseBorder(const std::string& option, const std::string& text);
 FrameNudge parseNudge(const std::string& option, const std::string& text);

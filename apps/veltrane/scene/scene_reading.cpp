@@ -1,6 +1,7 @@
 // Reading scene files: the composition and the parameter values as written.
 #include <algorithm>
 #include <cctype>
+#include <cmath>
 #include <filesystem>
 
 #include "refhost/core/params.h"
@@ -72,7 +73,7 @@ MediaSpec readSource(const JsonField& field, const std::string& baseDirectory) {
   }
   try {
     // Opened once to prove it decodes, and to learn what the composition needs to know of it.
-    spec.info = refhost::openMediaSource(spec, 25.0)->info();
+    spec.info = refhost::openMediaSource(spec, {25, 1})->info();
   } catch (const std::exception& error) {
     file.fail(std::string("a file that decodes (") + error.what() + ")");
   }
@@ -118,6 +119,24 @@ refhost::ColourDescription readColourSpace(const JsonField& field,
     colour.fullRange = name == "full";
   }
   return colour;
+}
+
+// Frames a second as a number (25, 29.97) or as text ("30000/1001", "29.97"), from 0.001 to
+// 1000; the drop-frame decimals name the /1001 rates. A number with more decimals than a person
+// writes (a rate saved as a float) is taken to the microsecond of frame time, then snapped to
+// the common rate it rounds.
+refhost::FrameRate readFrameRate(const JsonField& field) {
+  const char* expected = "a number from 0.001 to 1000, or text such as \"30000/1001\"";
+  std::optional<refhost::FrameRate> rate;
+  if (field.isString()) {
+    rate = refhost::frameRateFromText(field.string(expected));
+  } else {
+    const double value = field.numberIn(0.001, 1000);
+    rate = refhost::frameRateFromText(numberText(value));
+    if (!rate) rate = refhost::snappedToCommonRate({std::llround(value * 1001000), 1001000});
+  }
+  if (!rate || rate->perSecond() < 0.001 || rate->perSecond() > 1000) field.fail(expected);
+  return *rate;
 }
 
 std::string readGuid(const JsonField& field) {
@@ -191,7 +210,7 @@ Scene sceneFromJson(const nlohmann::ordered_json& document, const std::string& f
   refhost::Composition& composition = scene.composition;
   composition.width = top.member("width").integerIn(1, kLargestFrameSide);
   composition.height = top.member("height").integerIn(1, kLargestFrameSide);
-  composition.frameRate = top.member("fps").numberIn(0.001, 1000);
+  composition.frameRate = readFrameRate(top.member("fps"));
   composition.duration = top.member("duration").integerIn(1, kLongestScene);
   if (JsonField aspect = top.member("pixelAspect"); aspect.present())
     composition.pixelAspect = static_cast<float>(aspect.numberIn(0.01, 100));

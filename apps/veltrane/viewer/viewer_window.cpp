@@ -198,7 +198,7 @@ void ViewerWindow::waitForEvents() {
     glfwPollEvents();
   } else if (playing_) {
     double next = playStartTime_ + (session_->frame() - playStartFrame_ + 1) /
-                                       std::max(scene_.composition.frameRate, 0.001);
+                                       std::max(scene_.composition.frameRate.perSecond(), 0.001);
     glfwWaitEventsTimeout(std::max(next - glfwGetTime(), 0.0));
   } else if (previewing()) {
     // Woken when the pointer comes to rest, to show the frame at full size.
@@ -371,7 +371,8 @@ void ViewerWindow::advancePlayback() {
   if (!playing_) return;
   int32_t duration = std::max(scene_.composition.duration, 1);
   double elapsed = glfwGetTime() - playStartTime_;
-  auto advanced = static_cast<int64_t>(std::floor(elapsed * scene_.composition.frameRate));
+  auto advanced =
+      static_cast<int64_t>(std::floor(elapsed * scene_.composition.frameRate.perSecond()));
   auto frame = static_cast<int32_t>((playStartFrame_ + advanced) % duration);
   if (frame != session_->frame()) session_->setFrame(frame);
 }
@@ -395,7 +396,7 @@ ChromeState ViewerWindow::chromeState() const {
   ChromeState state;
   state.title = std::filesystem::path(scene_.file).filename().string();
   state.playing = playing_;
-  state.frameRate = scene_.composition.frameRate;
+  state.frameRate = scene_.composition.frameRate.perSecond();
   state.duration = scene_.composition.duration;
   state.layers = layers_;
   state.uiScale = uiScale_;

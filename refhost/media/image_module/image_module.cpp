@@ -12,10 +12,21 @@
 
 namespace {
 
+// The reason on one line: OpenImageIO gathers each error of a read on a line of its own ("PNG
+// read error: ...", "PNG library error"), which go into one, repeated lines once.
 int fail(char* error, std::size_t size, const std::string& reason) {
+  std::string line;
+  std::size_t start = 0;
+  while (start <= reason.size()) {
+    std::size_t end = std::min(reason.find('\n', start), reason.size());
+    const std::string part = reason.substr(start, end - start);
+    if (!part.empty() && line.find(part) == std::string::npos)
+      line += (line.empty() ? "" : "; ") + part;
+    start = end + 1;
+  }
   if (error && size > 0) {
-    std::size_t length = std::min(reason.size(), size - 1);
-    std::memcpy(error, reason.data(), length);
+    std::size_t length = std::min(line.size(), size - 1);
+    std::memcpy(error, line.data(), length);
     error[length] = '\0';
   }
   return 1;
@@ -57,9 +68,8 @@ int readAs(OIIO::ImageInput& input, OIIO::TypeDesc type, Sample opaque, std::siz
 
 }  // namespace
 
-extern "C" __attribute__((visibility("default"))) int refhostReadPicture(
-    const char* path, int32_t* width, int32_t* height, int32_t* halfFloats, void** pixels,
-    char* error, std::size_t errorSize) {
+extern "C" __attribute__((visibility("default"))) int refhostReadOrientedPicture(
+    const char* path, RefhostPicture* picture, char* error, std::size_t errorSize) {
   // The stored values are wanted as they are: no premultiplying of files with alpha.
   OIIO::ImageSpec config;
   config.attribute("oiio:UnassociatedAlpha", 1);
@@ -75,14 +85,17 @@ extern "C" __attribute__((visibility("default"))) int refhostReadPicture(
   // half floats; 8-bit files stay bytes, exactly as stored.
   const bool deep =
       spec.format.basetype != OIIO::TypeDesc::UINT8 && spec.format.basetype != OIIO::TypeDesc::INT8;
+  const int orientation = spec.get_int_attribute("Orientation", 1);
+  const int32_t width = spec.width, height = spec.height;
   const int result = deep ? readAs<uint16_t>(*input, OIIO::TypeDesc::HALF, uint16_t{0x3C00}, count,
-                                             channels, pixels, error, errorSize)
+                                             channels, &picture->pixels, error, errorSize)
                           : readAs<uint8_t>(*input, OIIO::TypeDesc::UINT8, uint8_t{255}, count,
-                                            channels, pixels, error, errorSize);
+                                            channels, &picture->pixels, error, errorSize);
   if (result != 0) return result;
-  *width = spec.width;
-  *height = spec.height;
-  *halfFloats = deep ? 1 : 0;
+  picture->width = width;
+  picture->height = height;
+  picture->halfFloats = deep ? 1 : 0;
+  picture->orientation = orientation >= 1 && orientation <= 8 ? orientation : 1;
   return 0;
 }
 

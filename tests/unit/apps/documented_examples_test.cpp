@@ -73,7 +73,7 @@ TEST(DocumentedExamples, EveryLayoutsPresetSceneIsWhatSplitMakes) {
     request.clips.assign(pictures.begin(), pictures.begin() + std::stoi(made[1]));
     request.layout = made[2];
     request.size = std::array<int32_t, 2>{640, 360};
-    request.fps = 25;
+    request.fps = refhost::FrameRate{25, 1};
     request.border = veltrane_cli::BorderSetting{4, {1, 1, 1}, 1};
     const json fresh =
         json::parse(veltrane_cli::buildSplitScene(request, VELTRANE_MODULE_PATH).document.dump());

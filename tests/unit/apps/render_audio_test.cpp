@@ -1,8 +1,9 @@
 // `veltrane render` carries sound: the audio of the frames rendered, timed by the composition's
 // clock whatever the file's rate, as long as the video and starting with it (checked with
 // ffprobe); copied where the container takes the codec, else encoded (AAC, Opus for WebM);
-// from the effect's own source, from another file or a layer's with --audio-from, and none
-// with --no-audio.
+// from the effect's own source, from another file, a layer's or a clip's with --audio-from,
+// several clips mixed with --audio, silent where a clip ends, and none with --no-audio or
+// when no clip has any, with a note saying why.
 #include <gtest/gtest.h>
 
 #include <nlohmann/json.hpp>
@@ -36,7 +37,18 @@ std::vector<Span> streamSpans(const std::string& path) {
   return spans;
 }
 
-TEST(RenderAudio, VideoOutputsCarryTheRenderedFramesSound) {
+// The mean volume of a file's sound from `from` seconds on, in dB.
+double meanVolume(const std::string& path, double from = 0) {
+  const std::string levels = commandOutput("ffmpeg -v info -ss " + std::to_string(from) + " -i " +
+                                           path + " -map 0:a -af volumedetect -f null - 2>&1");
+  const std::size_t at = levels.find("mean_volume: ");
+  EXPECT_NE(at, std::string::npos) << levels;
+  return at == std::string::npos ? 0 : std::stod(levels.substr(at + 13));
+}
+
+// Rendered scenes and splits of clips, each video's sound checked against its pictures' span
+// and for its codec and level; a silent one's note.
+TEST(RenderAudio, VideoOutputsCarryTheSoundAskedFor) {
   ScratchDirectory folder;
   // Three seconds of test picture at 25 fps; the tone sounds from the second second on.
   const std::string make =
@@ -45,58 +57,115 @@ TEST(RenderAudio, VideoOutputsCarryTheRenderedFramesSound) {
       ":eval=frame\" -c:v libx264 -c:a ";
   ASSERT_EQ(std::system((make + "aac " + folder.file("aac.mp4")).c_str()), 0);
   ASSERT_EQ(std::system((make + "pcm_s16le " + folder.file("pcm.mkv")).c_str()), 0);
+  // For splits: a quiet tone of 2 s, 3 s without sound, a loud tone of 4 s.
+  auto clip = [&](const char* name, const char* seconds, const std::string& sound) {
+    commandOutput("ffmpeg -v error -f lavfi -i testsrc=size=64x36:rate=25 " + sound + " -t " +
+                  seconds + " -c:v libx264 -c:a aac " + folder.file(name));
+    return folder.file(name);
+  };
+  const std::string quiet = clip("quiet.mp4", "2", "-f lavfi -i sine=440,volume=0.1");
+  const std::string none = clip("none.mp4", "3", ""),
+                    loud = clip("loud.mp4", "4", "-f lavfi -i sine=880");
+  const double kLoud = -40;  // the tone heard, in mean dB; below it only silence
   struct Case {
-    const char* source;  // the effect's own source; empty: a pattern, which has no sound
+    const char* source;  // a rendered scene's own source (empty: a pattern, without sound),
+    int fps;             // its rate; or a split (0) of the clips in `options`
     std::vector<std::string> options;
     const char* out;
-    const char* frames;
-    int fps;
-    const char* codec;  // of the audio written; empty: no audio
-    bool loud;
+    const char* codec;         // of the audio written; empty: no audio
+    double quietest, loudest;  // its mean volume in dB
+    std::string note;          // a line on stderr
   };
   const Case cases[] = {
-      {"aac.mp4", {}, "copied.mp4", "25-49", 25, "aac", true},
-      {"pcm.mkv", {}, "encoded.mp4", "25-49", 25, "aac", true},
-      {"pcm.mkv", {}, "copied.mov", "0-24", 25, "pcm_s16le", false},
-      {"pcm.mkv", {}, "opus.webm", "25-49", 25, "opus", true},
-      {"aac.mp4", {"--no-audio"}, "silent.mp4", "10-40", 25, "", false},
+      {"aac.mp4", 25, {"--frames", "25-49"}, "copied.mp4", "aac", kLoud, 0, ""},
+      {"pcm.mkv", 25, {"--frames", "25-49"}, "encoded.mp4", "aac", kLoud, 0, ""},
+      {"pcm.mkv", 25, {"--frames", "0-24"}, "copied.mov", "pcm_s16le", -200, kLoud, ""},
+      {"pcm.mkv", 25, {"--frames", "25-49"}, "opus.webm", "opus", kLoud, 0, ""},
+      {"aac.mp4",
+       25,
+       {"--frames", "10-40", "--no-audio"},
+       "silent.mp4",
+       "",
+       0,
+       0,
+       "has no sound: --no-audio"},
       // Frames 25-49 at 50 fps are the file's first second (silent), not its frames 25-49.
-      {"aac.mp4", {}, "fifty.mp4", "25-49", 50, "aac", false},
-      {"", {"--audio-from", folder.file("aac.mp4")}, "other.mkv", "25-49", 25, "aac", true},
+      {"aac.mp4", 50, {"--frames", "25-49"}, "fifty.mp4", "aac", -200, kLoud, ""},
+      {"",
+       25,
+       {"--frames", "25-49", "--audio-from", folder.file("aac.mp4")},
+       "other.mkv",
+       "aac",
+       kLoud,
+       0,
+       ""},
       // Layer B's file, not the own source's: its PCM is what the .mov copies.
-      {"aac.mp4", {"--audio-from", "layer", "B"}, "layer.mov", "30-60", 25, "pcm_s16le", true},
+      {"aac.mp4",
+       25,
+       {"--frames", "30-60", "--audio-from", "layer", "B"},
+       "layer.mov",
+       "pcm_s16le",
+       kLoud,
+       0,
+       ""},
+      // A split's clips by number: the first's by default, clip 3's, two mixed at a level
+      // between theirs, the sound as long as the longest clip (silent after the first clip's).
+      {"", 0, {quiet, none, loud}, "first.mp4", "aac", -45, -37, ""},
+      {"", 0, {quiet, none, loud, "--audio-from", "3"}, "third.mp4", "aac", -25, -17, ""},
+      {"", 0, {quiet, none, loud, "--audio", "mix"}, "mix.mp4", "aac", -31, -24, ""},
+      {"",
+       0,
+       {quiet, none, loud, "--audio", "1,3", "--duration", "longest"},
+       "both.mp4",
+       "aac",
+       -31,
+       -20,
+       ""},
+      {"", 0, {quiet, none, loud, "--duration", "longest"}, "padded.mp4", "aac", -48, -40, ""},
+      {"",
+       0,
+       {none, quiet},
+       "none.mp4",
+       "",
+       0,
+       0,
+       "has no sound: clip 1 (none.mp4) has no sound; --audio-from N or --audio mix takes the "
+       "sound of other clips"},
   };
   for (const Case& c : cases) {
-    nlohmann::json scene = smallScene("bars", 150);
-    scene["fps"] = c.fps;
-    if (*c.source) scene["source"] = {{"file", c.source}};
-    scene["layers"].push_back({{"guid", "bbbbbbbb-0000-4000-8000-000000000002"},
-                               {"name", "B"},
-                               {"source", {{"file", "pcm.mkv"}}}});
-    std::vector<std::string> args{
-        "render", writeScene(folder, scene), "-o", folder.file(c.out), "--frames", c.frames};
+    SCOPED_TRACE(c.out);
+    std::vector<std::string> args{"split"};
+    if (c.fps) {
+      nlohmann::json scene = smallScene("bars", 150);
+      scene["fps"] = c.fps;
+      if (*c.source) scene["source"] = {{"file", c.source}};
+      scene["layers"].push_back({{"guid", "bbbbbbbb-0000-4000-8000-000000000002"},
+                                 {"name", "B"},
+                                 {"source", {{"file", "pcm.mkv"}}}});
+      args = {"render", writeScene(folder, scene)};
+    }
     args.insert(args.end(), c.options.begin(), c.options.end());
+    args.insert(args.end(), {"-o", folder.file(c.out), "--quiet"});
     CliRun run = runCli(args);
     ASSERT_EQ(run.status, 0) << run.err;
+    EXPECT_NE(run.err.find(c.note), std::string::npos) << run.err;
     nlohmann::json streams = nlohmann::json::parse(
         commandOutput("ffprobe -v error -show_entries stream=codec_type,codec_name -of json " +
                       folder.file(c.out)))["streams"];
-    ASSERT_EQ(streams.size(), *c.codec ? 2u : 1u) << c.out;
+    ASSERT_EQ(streams.size(), *c.codec ? 2u : 1u);
     if (!*c.codec) continue;
-    EXPECT_EQ(streams[1]["codec_name"], c.codec) << c.out;
+    EXPECT_EQ(streams[1]["codec_name"], c.codec);
     // With the video at both ends, to whole packets: a copy cannot cut the packets at either
     // end (23 ms each here).
     const std::vector<Span> spans = streamSpans(folder.file(c.out));
-    ASSERT_EQ(spans.size(), 2u) << c.out;
-    EXPECT_NEAR(spans[1].start, spans[0].start, 0.05) << c.out;
-    EXPECT_NEAR(spans[1].end, spans[0].end, 0.05) << c.out;
-    std::string levels = commandOutput("ffmpeg -v info -i " + folder.file(c.out) +
-                                       " -map 0:a -af volumedetect -f null - 2>&1");
-    std::size_t at = levels.find("mean_volume: ");
-    ASSERT_NE(at, std::string::npos) << levels;
-    const double mean = std::stod(levels.substr(at + 13));
-    EXPECT_EQ(mean > -40, c.loud) << c.out << " mean volume " << mean;
+    ASSERT_EQ(spans.size(), 2u);
+    EXPECT_NEAR(spans[1].start, spans[0].start, 0.05);
+    EXPECT_NEAR(spans[1].end, spans[0].end, 0.05);
+    const double mean = meanVolume(folder.file(c.out));
+    EXPECT_GE(mean, c.quietest);
+    EXPECT_LE(mean, c.loudest);
   }
+  EXPECT_LT(meanVolume(folder.file("padded.mp4"), 2.5), -80) << "silence after the first clip";
 }
 
 }  // namespace

@@ -53,8 +53,8 @@ TEST(RenderCommand, EveryOutputKindCarriesTheFramesAskedInOrder) {
     for (const std::string& progress : {count + "  ", std::string(" fps "), std::string(" s left")})
       EXPECT_NE(run.err.find(progress), std::string::npos) << output << ": " << run.err;
   }
-  auto video = refhost::openMediaSource(refhost::MediaSpec::ofFile(folder.file("v.mkv")), 25);
-  auto all = refhost::openMediaSource(refhost::MediaSpec::ofFile(folder.file("all.mkv")), 25);
+  auto video = refhost::openMediaSource(refhost::MediaSpec::ofFile(folder.file("v.mkv")), {25, 1});
+  auto all = refhost::openMediaSource(refhost::MediaSpec::ofFile(folder.file("all.mkv")), {25, 1});
   ASSERT_EQ(video->frameCount(), 29);
   ASSERT_EQ(all->frameCount(), 30);
   for (int frame = 1; frame <= 29; ++frame) {

@@ -157,7 +157,7 @@ TEST(RenderEncoding, RefusesSettingsTheOutputCannotTakeInOneLine) {
        "option '--audio-from': expected 'layer' and the name of one of the scene's layers "
        "('Split Screen', 'A'), got 'Z'"},
       {{"-o", mp4, "--audio-from", "layer", "A"},
-       "option '--audio-from': layer 'A' shows no video file, so it has no sound"},
+       "option '--audio-from': clip 2 (a pattern) is generated, without sound"},
       {{"-o", mp4, "--audio-from", "layer"},
        "option '--audio-from': expected a layer's name after 'layer'"},
       {{"-o", folder.file("x.png"), "--audio-from", folder.file("sound.wav")},

@@ -1,13 +1,16 @@
 // `veltrane split` end to end: the frames a split renders are the frames `render` makes of the
 // scene it saves, clips of other proportions keep theirs, a layout with more regions than clips
-// says so, and bad input is one line with status 2 and nothing written.
+// says so, clips are read as FFmpeg reads them (rates, photos, damage), and bad input is one
+// line with status 2 and nothing written.
 #include <gtest/gtest.h>
 
 #include <filesystem>
 #include <nlohmann/json.hpp>
+#include <sstream>
 
 #include "cli_runner.h"
 #include "refhost/media/image_files.h"
+#include "support/spoiled_media.h"
 
 namespace {
 
@@ -72,15 +75,88 @@ TEST(SplitCommand, RendersWhatTheSceneItSavesRenders) {
   EXPECT_TRUE(portraitFramed) << params;
 }
 
-TEST(SplitCommand, ALayoutWithMoreRegionsThanClipsShowsThemAgainAndSaysSo) {
+// A layout with more regions than clips saying so; the first video's nominal rate (a
+// variable-rate clip's steady 30), a still first clip saying which rate it took (and shown
+// upright), --fps as a fraction or a drop-frame decimal, damage concealed with a warning or
+// refused with --strict, a damaged still refused: every message one line of our own, whatever
+// the libraries would have printed.
+TEST(SplitCommand, ReadsClipsAsFfmpegDoes) {
   ScratchDirectory folder;
-  CliRun run = runCli({"split", clip(folder, "a.mp4", "160x90"), "pattern:checker", "--layout",
-                       "grid-2x2", "-o", folder.file("out.png")});
-  ASSERT_EQ(run.status, 0) << run.err;
-  EXPECT_NE(run.err.find("veltrane split: note: grid-2x2 shows 4 pictures; the 2 clips given "
-                         "fill them again in order"),
-            std::string::npos)
-      << run.err;
+  const std::string a = clip(folder, "a.mp4", "160x90"),
+                    damaged = clip(folder, "bad.mp4", "160x90");
+  testsupport::spoilPacket(damaged, 14, testsupport::Spoiling::CutInHalf);
+  const std::string dropped = folder.file("dropped.mp4"), photo = folder.file("photo.jpg");
+  commandOutput(
+      "ffmpeg -v error -f lavfi -i testsrc2=size=64x36:rate=30 -t 2 -vf "
+      "\"select='not(eq(mod(n,20),19))'\" -fps_mode passthrough " +
+      dropped);
+  commandOutput("ffmpeg -v error -f lavfi -i testsrc2=size=160x90 -frames:v 1 " + photo);
+  testsupport::tagExifOrientation(photo, 6);
+  commandOutput("ffmpeg -v error -f lavfi -i testsrc2=size=160x90 -frames:v 1 " +
+                folder.file("whole.png"));
+  const std::string png = slurp(folder.file("whole.png")), spoilt = folder.file("spoilt.png");
+  writeText(spoilt, png.substr(0, png.size() / 2) + std::string(64, '\0') +
+                        png.substr(png.size() / 2 + 64));
+  const std::string out = folder.file("out.mp4");
+  const struct {
+    std::vector<std::string> args;
+    int status;
+    std::string line;   // one of the lines on stderr starts with it
+    const char* shown;  // width, height and rate of the video written
+  } cases[] = {
+      {{a, "pattern:checker", "--layout", "grid-2x2"},
+       0,
+       "veltrane split: note: grid-2x2 shows 4 pictures; the 2 clips given fill them again in "
+       "order",
+       "160,90,25/1"},
+      {{dropped}, 0, "", "64,36,30/1"},
+      {{photo, a},
+       0,
+       "veltrane split: note: clip 1 (photo.jpg) is a still: the frames run at 25 fps, the rate "
+       "of clip 2 (a.mp4); --fps R sets another rate",
+       "90,160,25/1"},
+      {{a, "--fps", "29.97"}, 0, "", "160,90,30000/1001"},
+      {{a, "--fps", "30000/1001"}, 0, "", "160,90,30000/1001"},
+      {{damaged},
+       0,
+       "veltrane split: warning: damaged frames were shown as the decoder concealed them: clip 1 "
+       "(bad.mp4): frame ",
+       "160,90,25/1"},
+      {{damaged, "--strict"}, 1, "veltrane split: clip 1 (bad.mp4): frame ", nullptr},
+      {{spoilt},
+       2,
+       "veltrane split: argument '" + spoilt +
+           "': expected a video or image file that shows a picture (cannot read image: its data "
+           "is damaged (",
+       nullptr},
+      {{a, "--fps", "30/0"},
+       2,
+       "veltrane split: option '--fps' expects a rate from 0.001 to 1000",
+       nullptr},
+  };
+  for (const auto& c : cases) {
+    std::vector<std::string> args{"split"};
+    args.insert(args.end(), c.args.begin(), c.args.end());
+    args.insert(args.end(), {"-o", out, "--frames", "0-24", "--no-audio", "--quiet"});
+    std::filesystem::remove(out);
+    CliRun run = runCli(args);
+    SCOPED_TRACE(c.line + "\n" + run.err);
+    EXPECT_EQ(run.status, c.status);
+    std::istringstream lines(run.err);
+    bool found = c.line.empty();
+    for (std::string line; std::getline(lines, line);) {
+      EXPECT_EQ(line.rfind("veltrane split: ", 0), 0u) << line;
+      found = found || line.rfind(c.line, 0) == 0;
+    }
+    EXPECT_TRUE(found);
+    EXPECT_EQ(std::filesystem::exists(out), c.shown != nullptr);
+    if (c.shown) {
+      EXPECT_EQ(commandOutput("ffprobe -v error -show_entries stream=width,height,r_frame_rate "
+                              "-of csv=p=0 " +
+                              out),
+                std::string(c.shown) + "\n");
+    }
+  }
 }
 
 TEST(SplitCommand, RefusesBadInputWithOneLineAndWritesNothing) {

@@ -25,14 +25,15 @@ TEST(Preview, HalfSizeScaledUpMatchesTheFullRenderEdgesAside) {
   engine.setFrameSettings({kWidth, kHeight, 25.0, 1.0f, 10, ""});
   // Smooth pictures, so that what differs is where the edges are.
   engine.setSourceFrames(
-      frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient), 25)));
+      frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient), {25, 1})));
   Layer other;
   other.guid = "0e000000-0000-4000-8000-00000000000b";
   other.name = "Teal";
   other.width = kWidth;
   other.height = kHeight;
   other.frameCount = 10;
-  other.source = frameSourceOf(openMediaSource(MediaSpec::ofColour({0.1f, 0.6f, 0.6f, 1}), 25));
+  other.source =
+      frameSourceOf(openMediaSource(MediaSpec::ofColour({0.1f, 0.6f, 0.6f, 1}), {25, 1}));
   engine.addLayer(other);
   engine.start();
   engine.createInstance();

@@ -103,7 +103,7 @@ TEST(RenderLoop, PicturesComeInOrderAndAFailureAnywhereStopsTheRunLeavingNothing
     std::unique_ptr<Engine> engine = engineOver(std::make_shared<PrefetchingSource>(
         std::make_shared<NumberedSource>(stage == Stage::Decoding ? 5 : -1), 3));
     auto sink = std::make_unique<AsyncFrameSink>(
-        openFrameSink(parseOutputTarget(folder + "/out_%04d.png"), 32, 18, 25.0), 2, 3);
+        openFrameSink(parseOutputTarget(folder + "/out_%04d.png"), 32, 18, {25, 1}), 2, 3);
     RenderRun run = framesFromTo(0, 11);
     std::vector<int32_t> written;
     int32_t started = 0;

@@ -68,7 +68,7 @@ TEST(TestPatterns, CounterShowsItsFrameInCodeAndDigits) {
 
 TEST(FrameSource, HandsGlTheBottomRowFirstAtAnySize) {
   FrameSource source =
-      frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient), 25.0));
+      frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient), {25, 1}));
   const std::vector<uint8_t> rows = source(0, 4, 3, PixelFormat::Rgba8);
   ASSERT_EQ(rows.size(), 4u * 3u * 4u);
   EXPECT_EQ(rows[1], 0);                  // green of the bottom row

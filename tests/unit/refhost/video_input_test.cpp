@@ -1,7 +1,8 @@
 // Video files read as players show them: small clips made by the ffmpeg command line, each
 // picture compared with what ffmpeg itself decodes for the same frame (colours by the stream's
 // own matrix and range, 10 bits kept, turned upright, at square pixels), frames chosen by
-// presentation time at constant and variable rates, and HDR refused.
+// presentation time at constant and variable rates; and every kind of file read by what it
+// holds, photos upright, damage concealed and counted, HDR refused.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -14,6 +15,7 @@
 #include "refhost/media/media_source.h"
 #include "refhost/media/video_reader.h"
 #include "support/child_process.h"
+#include "support/spoiled_media.h"
 #include "support/temp_paths.h"
 
 namespace refhost {
@@ -21,6 +23,7 @@ namespace {
 
 using testsupport::ChildProcess;
 using testsupport::ScratchDirectory;
+using testsupport::Spoiling;
 
 std::string readFile(const std::string& path) {
   std::ostringstream bytes;
@@ -80,7 +83,7 @@ constexpr Tolerance kHalfFloats{1.0, 2.0};
 void expectShownAlike(VideoReader& reader, const std::string& theirs, int frame, PixelFormat format,
                       const std::string& name) {
   const RgbaImage ours =
-      reader.frameAt(frame / 25.0, reader.info().width, reader.info().height, format);
+      reader.frameAt(frame, {25, 1}, reader.info().width, reader.info().height, format);
   const std::size_t pixels = static_cast<std::size_t>(ours.width) * ours.height;
   const bool deep = format == PixelFormat::RgbaHalf;
   const std::size_t start = pixels * 3 * (deep ? 2 : 1) * frame;
@@ -217,7 +220,7 @@ TEST(VideoInput, TenBitsKeepTheirLevelsAsHalfFloats) {
                   "-frames:v", "1", "-c:v", "libx264", "-qp", "0", path});
   VideoReader reader(path);
   EXPECT_EQ(reader.info().bitDepth, 10);
-  const RgbaImage picture = reader.frameAt(0, 1024, 4, PixelFormat::RgbaHalf);
+  const RgbaImage picture = reader.frameAt(0, {25, 1}, 1024, 4, PixelFormat::RgbaHalf);
   std::set<float> levels;
   for (int32_t x = 0; x < 1024; ++x) levels.insert(picture.channel(x, 1, 1));
   EXPECT_GE(levels.size(), 700u);
@@ -267,9 +270,9 @@ TEST(VideoInput, FramesAreChosenByPresentationTime) {
     ffmpeg(folder, arguments);
     VideoReader reader(path);
     if (!clip.times) {
-      EXPECT_DOUBLE_EQ(reader.info().frameRate, clip.rate) << clip.name;
+      EXPECT_EQ(reader.info().frameRate, (FrameRate{clip.rate, 1})) << clip.name;
       EXPECT_NEAR(reader.info().duration, clip.duration, 1e-9) << clip.name;
-      EXPECT_EQ(openMediaSource(MediaSpec::ofFile(path), 25.0)->frameCount(),
+      EXPECT_EQ(openMediaSource(MediaSpec::ofFile(path), {25, 1})->frameCount(),
                 clip.compositionFrames)
           << clip.name;
     }
@@ -284,39 +287,140 @@ TEST(VideoInput, FramesAreChosenByPresentationTime) {
       if (n < 11) asked.push_back({(presented(n) + presented(n + 1)) / 2, n});
     }
     std::shuffle(asked.begin(), asked.end(), std::mt19937(7));
+    // Asked as frames of a rate that counts every time here in whole ticks.
+    constexpr FrameRate kTicks{6000, 1};
     for (const auto& [seconds, frame] : asked)
-      EXPECT_EQ(frameShown(reader.frameAt(seconds, 8, 8)), frame) << clip.name << " at " << seconds;
+      EXPECT_EQ(frameShown(reader.frameAt(std::llround(seconds * 6000), kTicks, 8, 8)), frame)
+          << clip.name << " at " << seconds;
   }
 }
 
-TEST(VideoInput, HdrAndWideGamutAreRefusedInOneLine) {
+// A photo of four coloured quarters (red, green above; blue, white below), stored turned so
+// that the EXIF orientation turns it upright again.
+void makePhoto(const ScratchDirectory& folder, const std::string& name, int orientation) {
+  const char* stored[] = {"",           "null",        "hflip",       "hflip,vflip",
+                          "vflip",      "transpose=0", "transpose=2", "transpose=3",
+                          "transpose=1"};
+  ffmpeg(folder, {"-f", "lavfi", "-i",
+                  "nullsrc=s=64x48,format=rgb24,geq=r='255*eq(gte(X,W/2),gte(Y,H/2))':"
+                  "g='255*gte(X,W/2)':b='255*gte(Y,H/2)'," +
+                      std::string(stored[orientation]),
+                  "-frames:v", "1", "-q:v", "2", folder.file(name)});
+  testsupport::tagExifOrientation(folder.file(name), orientation);
+}
+
+// Every kind of file FFmpeg decodes, read by what it holds whatever its name: its size upright,
+// whether it moves, its nominal rate and length at that rate, the frames its decoder found
+// damaged (concealed, not fatal), or the one line that refuses it (damage beyond use, no
+// picture, colours the host cannot show).
+TEST(VideoInput, FilesAreReadByWhatTheyHold) {
   ScratchDirectory folder;
+  const std::string testPicture = "testsrc2=size=160x96:rate=25";
+  const std::string x264 = "-c:v libx264 -pix_fmt yuv420p -g 10";
+  makeClip(folder, "phone.3gp", "160x96", x264, 10);
+  ffmpeg(folder, {"-f", "lavfi", "-i", testPicture, "-f", "lavfi", "-i", "sine", "-frames:v", "10",
+                  "-c:v", "libx264", "-c:a", "aac", "-shortest", folder.file("camera.mts")});
+  makeClip(folder, "animated.gif", "64x36", "-r 10", 5);
+  makeClip(folder, "animated.webp", "64x36", "-r 10 -c:v libwebp_anim -loop 0", 5);
+  makeClip(folder, "one.gif", "64x36", "", 1);
+  // 30 fps with every twentieth frame dropped, and 30 fps slowed to 10 for a second.
+  for (const auto& [name, kept] :
+       {std::pair<const char*, const char*>{"dropped.mp4", "not(eq(mod(n,20),19))"},
+        {"slowed.mp4", "lt(n,30)+gte(n,60)+not(mod(n,3))"}})
+    ffmpeg(folder, {"-f", "lavfi", "-i", "testsrc2=size=64x36:rate=30", "-t", "4", "-vf",
+                    std::string("select='") + kept + "'", "-fps_mode", "passthrough",
+                    "-video_track_timescale", "90000", folder.file(name)});
+  for (const char* name : {"cut.mp4", "overwritten.mp4"}) {
+    makeClip(folder, name, "160x96", x264, 30);
+    testsupport::spoilPacket(folder.file(name), 14,
+                             *name == 'c' ? Spoiling::CutInHalf : Spoiling::Overwritten);
+  }
+  for (int orientation : {1, 3, 6, 8})
+    makePhoto(folder, "photo" + std::to_string(orientation) + ".jpg", orientation);
+  makeClip(folder, "whole.jpg", "160x96", "", 1);
+  makeClip(folder, "whole.png", "160x96", "", 1);
+  const std::string jpeg = readFile(folder.file("whole.jpg")),
+                    png = readFile(folder.file("whole.png"));
+  std::ofstream(folder.file("half.jpg"), std::ios::binary) << jpeg.substr(0, jpeg.size() / 2);
+  std::ofstream(folder.file("spoilt.png"), std::ios::binary)
+      << png.substr(0, png.size() / 2) + std::string(64, '\0') + png.substr(png.size() / 2 + 64);
+  ffmpeg(folder, {"-f", "lavfi", "-i", "sine", "-t", "1", folder.file("sound.mp4")});
+  const std::string bt2020 = "-pix_fmt yuv420p10le -color_primaries bt2020 -colorspace bt2020nc";
+  makeClip(folder, "pq.mov", "64x36", bt2020 + " -color_trc smpte2084", 1);
+  makeClip(folder, "hlg.mp4", "64x36", bt2020 + " -color_trc arib-std-b67", 1);
+  makeClip(folder, "wide.mp4", "64x36", bt2020 + " -color_trc bt709", 1);
+
   const struct {
     const char* name;
-    const char* transfer;
-    const char* carries;
-  } clips[] = {
-      {"pq.mov", "smpte2084",
+    int32_t width, height;
+    FrameRate rate;   // nominal; none for a still
+    int32_t frames;   // at that rate
+    int32_t damaged;  // frames the decoder found damaged, read through once
+    bool sound;
+    const char* line;  // the refusal, after the path
+  } files[] = {
+      {"phone.3gp", 160, 96, {25, 1}, 10, 0, false, nullptr},
+      {"camera.mts", 160, 96, {25, 1}, 10, 0, true, nullptr},
+      {"animated.gif", 64, 36, {10, 1}, 5, 0, false, nullptr},
+      {"animated.webp", 64, 36, {10, 1}, 5, 0, false, nullptr},
+      {"one.gif", 64, 36, {}, 0, 0, false, nullptr},
+      {"dropped.mp4", 64, 36, {30, 1}, 119, 0, false, nullptr},
+      {"slowed.mp4", 64, 36, {30, 1}, 120, 0, false, nullptr},
+      {"cut.mp4", 160, 96, {25, 1}, 30, 1, false, nullptr},
+      {"overwritten.mp4", 160, 96, {25, 1}, 30, 1, false, nullptr},
+      {"photo1.jpg", 64, 48, {}, 0, 0, false, nullptr},
+      {"photo3.jpg", 64, 48, {}, 0, 0, false, nullptr},
+      {"photo6.jpg", 64, 48, {}, 0, 0, false, nullptr},
+      {"photo8.jpg", 64, 48, {}, 0, 0, false, nullptr},
+      {"half.jpg", 160, 96, {}, 0, 1, false, nullptr},
+      {"spoilt.png", 0, 0, {}, 0, 0, false, "cannot read image: its data is damaged ("},
+      {"sound.mp4", 0, 0, {}, 0, 0, false, "it holds sound but no picture"},
+      // The host renders SDR BT.709 and BT.601, without tone or gamut mapping.
+      {"pq.mov",
+       0,
+       0,
+       {},
+       0,
+       0,
+       false,
        "HDR video (transfer smpte2084, primaries bt2020, matrix bt2020nc) is not shown by this "
        "host: it renders in SDR BT.709/BT.601; convert it first (for example with ffmpeg's "
        "zscale and tonemap filters)"},
-      {"hlg.mp4", "arib-std-b67", "HDR video (transfer arib-std-b67, primaries bt2020, matrix"},
-      {"wide.mp4", "bt709", "wide-gamut video (primaries bt2020, matrix bt2020nc) is not shown"},
+      {"hlg.mp4", 0, 0, {}, 0, 0, false, "HDR video (transfer arib-std-b67, primaries bt2020"},
+      {"wide.mp4", 0, 0, {}, 0, 0, false, "wide-gamut video (primaries bt2020, matrix bt2020nc)"},
   };
-  for (const auto& clip : clips) {
-    const std::string path = folder.file(clip.name);
-    makeClip(folder, clip.name, "64x36",
-             std::string("-pix_fmt yuv420p10le -color_primaries bt2020 -colorspace bt2020nc ") +
-                 "-color_trc " + clip.transfer,
-             1);
+  for (const auto& file : files) {
+    SCOPED_TRACE(file.name);
+    MediaSpec spec = MediaSpec::ofFile(folder.file(file.name));
+    std::shared_ptr<MediaSource> source;
     try {
-      VideoReader reader(path);
-      ADD_FAILURE() << clip.name << " opened";
+      source = openMediaSource(spec, file.rate);
+      EXPECT_FALSE(file.line) << "opened";
     } catch (const std::runtime_error& error) {
       const std::string message = error.what();
-      EXPECT_EQ(message.rfind(path + ": " + clip.carries, 0), 0u) << message;
+      EXPECT_EQ(message.rfind(spec.path + ": " + (file.line ? file.line : "?"), 0), 0u) << message;
       EXPECT_EQ(message.find('\n'), std::string::npos) << message;
+      continue;
     }
+    const MediaInfo info = source->info();
+    EXPECT_EQ(info.width, file.width);
+    EXPECT_EQ(info.height, file.height);
+    EXPECT_EQ(info.video, file.rate.valid());
+    EXPECT_EQ(info.frameRate, file.rate);
+    EXPECT_EQ(info.hasAudio, file.sound);
+    EXPECT_EQ(source->frameCount(), file.frames);
+    for (int32_t frame = 0; frame < std::max(file.frames, 1); ++frame) {
+      const RgbaImage picture = source->frame(frame, info.width, info.height, PixelFormat::Rgba8);
+      // The photos show their quarters where they belong.
+      if (std::string(file.name).rfind("photo", 0) != 0) continue;
+      const Rgba8 quarters[] = {
+          {255, 0, 0, 255}, {0, 255, 0, 255}, {0, 0, 255, 255}, {255, 255, 255, 255}};
+      for (int q = 0; q < 4; ++q)
+        for (int c = 0; c < 3; ++c)
+          EXPECT_NEAR(picture.pixel(16 + 32 * (q % 2), 12 + 24 * (q / 2))[c], quarters[q][c], 24)
+              << "quarter " << q;
+    }
+    EXPECT_EQ(spec.damage->count(), file.damaged);
   }
 }
 
