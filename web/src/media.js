@@ -2,14 +2,9 @@
 // WebAssembly host by the names its scene gives them. What a file is comes from its content,
 // never its name. Video frames are decoded ahead of a render (the host asks for them
 // synchronously): a frame the render asked for and did not find is a miss, decoded before the
-// render is done again.
-import {
-  ALL_FORMATS,
-  AudioSampleSink,
-  BlobSource,
-  CanvasSink,
-  Input,
-} from '../vendor/mediabunny.js';
+// render is done again. A decoded frame is kept as the host takes it, RGBA bytes as stored
+// with the turn that shows it, converted once by the decoder's own copy (no canvas between).
+import { ALL_FORMATS, AudioSampleSink, BlobSource, Input, VideoSampleSink } from '../vendor/mediabunny.js';
 
 export const kVideoKind = 1;
 const kStill = 2;
@@ -59,8 +54,9 @@ async function openVideo(name, blob) {
     height: video.displayHeight,
     frameRate: stats.averagePacketRate || 25,
     duration: Math.max(end - first, 0),
-    sink: new CanvasSink(video),
-    frames: new Map(),
+    sink: new VideoSampleSink(video),
+    frames: new Map(), // time key -> picture
+    last: null, // the picture decoded last, which the next time may show again
     used: new Set(),
     sequence: null,
   };
@@ -75,7 +71,8 @@ async function openStill(name, blob) {
     return null;
   }
   const canvas = new OffscreenCanvas(bitmap.width, bitmap.height);
-  const context = canvas.getContext('2d');
+  // Read back once: kept in the CPU's memory, not the GPU's.
+  const context = canvas.getContext('2d', { willReadFrequently: true });
   context.drawImage(bitmap, 0, 0);
   const pixels = context.getImageData(0, 0, bitmap.width, bitmap.height).data;
   bitmap.close();
@@ -86,8 +83,6 @@ export class MediaLibrary {
   constructor() {
     this.entries = new Map(); // path in the page's file system -> entry
     this.misses = [];
-    this.scratch = new OffscreenCanvas(1, 1);
-    this.scratchContext = this.scratch.getContext('2d', { willReadFrequently: true });
   }
 
   // Decodes enough of the file to know what it is; throws MediaProblem naming `name`.
@@ -120,28 +115,18 @@ export class MediaLibrary {
     };
   }
 
-  // The frame shown `seconds` into the clip at the size, rows from the bottom as GL keeps them.
-  videoRows(path, seconds, width, height) {
+  // The picture shown `seconds` into the clip ({width, height, rotation, flip, pixels}), or
+  // null before any of the clip is decoded.
+  videoFrame(path, seconds) {
     const entry = this.entries.get(path);
     const key = timeKey(seconds);
-    let canvas = entry.frames.get(key);
-    if (!canvas) {
+    let picture = entry.frames.get(key);
+    if (!picture) {
       this.misses.push({ path, seconds });
-      canvas = nearestFrame(entry, key);
+      picture = nearestFrame(entry, key);
     }
     entry.used.add(key);
-    if (this.scratch.width !== width || this.scratch.height !== height) {
-      this.scratch.width = width;
-      this.scratch.height = height;
-    }
-    const context = this.scratchContext;
-    context.setTransform(1, 0, 0, 1, 0, 0);
-    context.clearRect(0, 0, width, height);
-    if (canvas) {
-      context.setTransform(1, 0, 0, -1, 0, height);
-      context.drawImage(canvas, 0, 0, width, height);
-    }
-    return context.getImageData(0, 0, width, height).data;
+    return picture;
   }
 
   imagePixels(path) {
@@ -168,10 +153,9 @@ export class MediaLibrary {
       const entry = this.entries.get(path);
       const key = timeKey(seconds);
       if (entry.frames.has(key)) continue;
-      const wrapped =
-        (await entry.sink.getCanvas(decoderTime(entry, seconds))) ??
-        (await entry.sink.getCanvas(entry.first));
-      if (wrapped) entry.frames.set(key, wrapped.canvas);
+      const sample =
+        (await entry.sink.getSample(decoderTime(entry, seconds))) ?? (await entry.sink.getSample(entry.first));
+      if (sample) entry.frames.set(key, await pictureOf(entry, sample));
     }
     this.forgetUnused();
   }
@@ -183,7 +167,7 @@ export class MediaLibrary {
       entry.sequence = {
         times,
         next: 0,
-        iterator: entry.sink.canvasesAtTimestamps(times.map((t) => decoderTime(entry, t))),
+        iterator: entry.sink.samplesAtTimestamps(times.map((t) => decoderTime(entry, t))),
       };
     }
   }
@@ -194,7 +178,7 @@ export class MediaLibrary {
       if (!sequence || sequence.next >= sequence.times.length) continue;
       const { value } = await sequence.iterator.next();
       const key = timeKey(sequence.times[sequence.next++]);
-      if (value) entry.frames.set(key, value.canvas);
+      if (value) entry.frames.set(key, await pictureOf(entry, value));
     }
     this.forgetUnused();
   }
@@ -232,14 +216,31 @@ export class MediaLibrary {
   }
 }
 
+// The sample's pixels as RGBA bytes in sRGB, converted from the decoder's own format with the
+// stream's colour description; the sample is closed. A time that shows the same frame as the
+// one before shares its picture.
+async function pictureOf(entry, sample) {
+  try {
+    if (entry.last?.timestamp === sample.timestamp) return entry.last;
+    const width = sample.codedWidth;
+    const height = sample.codedHeight;
+    const pixels = new Uint8Array(width * height * 4);
+    await sample.copyTo(pixels, { format: 'RGBA', colorSpace: 'srgb' });
+    entry.last = { timestamp: sample.timestamp, width, height, rotation: sample.rotation, flip: sample.flip, pixels };
+    return entry.last;
+  } finally {
+    sample.close();
+  }
+}
+
 // Until the frame is decoded, the one nearest in time stands in for it.
 function nearestFrame(entry, key) {
   let best = null;
   let distance = Infinity;
-  for (const [at, canvas] of entry.frames) {
+  for (const [at, picture] of entry.frames) {
     if (Math.abs(at - key) < distance) {
       distance = Math.abs(at - key);
-      best = canvas;
+      best = picture;
     }
   }
   return best;

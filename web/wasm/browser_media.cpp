@@ -1,18 +1,20 @@
 // The page's side of the host's media files: the clips and photos a person dropped were decoded
 // by the browser (web/src/media.js), which answers here, synchronously, by the names a scene
 // gives them. What a file is (moving pictures or a still) is what the browser's decoders made
-// of its content. Pictures arrive upright (EXIF orientation and a clip's display rotation
-// applied by the browser) in RGB at 8 bits a channel.
+// of its content. Pictures arrive in RGB at 8 bits a channel: photos upright (the browser
+// applies their EXIF orientation), clip frames as stored with the turn that shows them.
 #include "browser_media.h"
 
 #include <emscripten.h>
 
+#include <algorithm>
 #include <cmath>
 #include <stdexcept>
 #include <string>
 
 #include "refhost/media/image_files.h"
 #include "refhost/media/moving_pictures.h"
+#include "refhost/media/orientation.h"
 #include "refhost/media/video_reader.h"
 #include "refhost/media/video_source.h"
 
@@ -31,10 +33,19 @@ EM_JS(int, pageMediaDescribe, (const char* path, double* facts, char* problem, i
                found.hasAudio ? 1 : 0], facts >> 3);
   return found.kind;
 });
-// The picture shown `seconds` into the clip at the size, bottom row first.
-EM_JS(void, pageVideoRows, (const char* path, double seconds, int width, int height,
-                            unsigned char* rows), {
-  HEAPU8.set(Module.veltraneMedia.videoRows(UTF8ToString(path), seconds, width, height), rows);
+// The decoded frame shown `seconds` into the clip: its stored size and how it is turned to be
+// shown (clockwise degrees, then a mirror), or 0 while none is decoded. The next call copies it.
+EM_JS(int, pageVideoFrame, (const char* path, double seconds, int* shape), {
+  const picture = Module.veltraneMedia.videoFrame(UTF8ToString(path), seconds);
+  Module.veltraneFrame = picture;
+  if (!picture) return 0;
+  HEAP32.set([picture.width, picture.height, picture.rotation, picture.flip ? 1 : 0], shape >> 2);
+  return 1;
+});
+// The frame pageVideoFrame found, RGBA, top row first.
+EM_JS(void, pageCopyVideoFrame, (unsigned char* pixels), {
+  HEAPU8.set(Module.veltraneFrame.pixels, pixels);
+  Module.veltraneFrame = null;
 });
 // The still image at its own size, top row first.
 EM_JS(void, pageImagePixels, (const char* path, unsigned char* pixels), {
@@ -63,6 +74,31 @@ PageFacts describe(const std::string& path) {
   out.info.duration = facts[3];
   out.info.hasAudio = facts[4] != 0;
   return out;
+}
+
+// The EXIF orientation that shows a frame turned `degrees` clockwise, then mirrored left to
+// right when `mirrored`, as the browser's decoders describe a clip's display matrix.
+refhost::Orientation orientationOfTurn(int degrees, bool mirrored) {
+  switch (degrees) {
+    case 90:
+      return refhost::orientationOfExif(mirrored ? 5 : 6);
+    case 180:
+      return refhost::orientationOfExif(mirrored ? 4 : 3);
+    case 270:
+      return refhost::orientationOfExif(mirrored ? 7 : 8);
+    default:
+      return refhost::orientationOfExif(mirrored ? 2 : 1);
+  }
+}
+
+// The picture stretched to the size. Each halving step averages two pixels into one, so a
+// picture more than twice the size loses no detail to the final bilinear step's sampling, as a
+// mipmapped draw would show it.
+refhost::RgbaImage stretched(refhost::RgbaImage picture, int32_t width, int32_t height) {
+  while (picture.width > 2 * width || picture.height > 2 * height)
+    picture = refhost::resized(picture, std::max(width, picture.width / 2),
+                               std::max(height, picture.height / 2));
+  return refhost::resized(picture, width, height);
 }
 
 }  // namespace
@@ -98,12 +134,20 @@ const MediaInfo& VideoReader::info() const { return decoder_->info; }
 
 std::vector<uint8_t> VideoReader::glRowsAt(int64_t frame, FrameRate rate, int32_t width,
                                            int32_t height, PixelFormat format) {
-  RgbaImage picture(width, height, PixelFormat::Rgba8);
   const double seconds =
       rate.valid() ? static_cast<double>(frame) * rate.denominator / rate.numerator : 0;
-  pageVideoRows(decoder_->path.c_str(), seconds, width, height, picture.pixels.data());
-  if (format == PixelFormat::Rgba8) return std::move(picture.pixels);
-  return converted(picture, format).pixels;
+  int32_t shape[4] = {0, 0, 0, 0};
+  // Until the page has decoded a frame of the clip, the picture is transparent.
+  if (!pageVideoFrame(decoder_->path.c_str(), seconds, shape))
+    return RgbaImage(width, height, format).pixels;
+  RgbaImage picture(shape[0], shape[1], PixelFormat::Rgba8);
+  pageCopyVideoFrame(picture.pixels.data());
+  const Orientation turn = orientationOfTurn(shape[2], shape[3] != 0);
+  if (!turn.rowOrderOnly() || turn.d < 0) picture = upright(picture, turn);
+  if (picture.width != width || picture.height != height)
+    picture = stretched(std::move(picture), width, height);
+  if (format != PixelFormat::Rgba8) picture = converted(picture, format);
+  return flipRows(picture.pixels, width, height);
 }
 
 RgbaImage VideoReader::frameAt(int64_t frame, FrameRate rate, int32_t width, int32_t height,
