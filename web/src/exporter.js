@@ -47,16 +47,17 @@ export async function exportVideo(page, options = {}, onProgress = () => {}, sig
       if (signal?.aborted) throw new DOMException('export cancelled', 'AbortError');
       await page.media.advance();
       await page.render(first + i, 1);
-      const { data } = page.picture();
-      const sample = new VideoSample(data, {
+      // The frame copies the picture out of the WebAssembly's memory once; the sample wraps it.
+      const frame = new VideoFrame(page.pictureView().data, {
         format: 'RGBA',
         codedWidth: width,
         codedHeight: height,
-        timestamp: page.frameSeconds(i),
-        duration: page.frameSeconds(1),
+        timestamp: 0,
       });
+      const sample = new VideoSample(frame, { timestamp: page.frameSeconds(i), duration: page.frameSeconds(1) });
       await video.add(sample);
       sample.close();
+      frame.close();
       const seconds = (performance.now() - started) / 1000;
       const rate = (i + 1) / Math.max(seconds, 1e-6);
       onProgress({ done: i + 1, total, fps: rate, secondsLeft: (total - i - 1) / rate });

@@ -222,8 +222,15 @@ export class Page {
 
   // The picture last rendered: RGBA bytes, top row first.
   picture() {
+    const { width, height, data } = this.pictureView();
+    return { width, height, data: new Uint8Array(data) };
+  }
+
+  // The same as a view of the WebAssembly's memory, without a copy: valid until the next call
+  // into it (an export hands it to the encoder, which copies it at once).
+  pictureView() {
     const width = this.session.pictureWidth();
     const height = this.session.pictureHeight();
-    return { width, height, data: new Uint8Array(this.session.readPicture()) };
+    return { width, height, data: this.session.readPicture() };
   }
 }

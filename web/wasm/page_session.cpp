@@ -193,7 +193,10 @@ int32_t PageSession::pictureHeight() const { return picture_ ? picture_->context
 
 const std::vector<uint8_t>& PageSession::readPicture() {
   const int32_t width = pictureWidth(), height = pictureHeight();
-  std::vector<uint8_t> rows(static_cast<std::size_t>(width) * height * 4);
+  const std::size_t rowBytes = static_cast<std::size_t>(width) * 4;
+  // Both buffers keep their storage from frame to frame: an export reads every frame.
+  rows_.resize(rowBytes * height);
+  readBack_.resize(rows_.size());
   if (picture_) {
     // WebGL reads textures back only through a framebuffer.
     GLuint framebuffer = 0;
@@ -202,11 +205,11 @@ const std::vector<uint8_t>& PageSession::readPicture() {
     glFramebufferTexture2D(GL_FRAMEBUFFER, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D,
                            picture_->context().output.id, 0);
     glPixelStorei(GL_PACK_ALIGNMENT, 1);
-    glReadPixels(0, 0, width, height, GL_RGBA, GL_UNSIGNED_BYTE, rows.data());
+    glReadPixels(0, 0, width, height, GL_RGBA, GL_UNSIGNED_BYTE, rows_.data());
     glBindFramebuffer(GL_FRAMEBUFFER, 0);
     glDeleteFramebuffers(1, &framebuffer);
   }
-  readBack_ = refhost::flipRows(rows, width, height);
+  refhost::copyRowsFlipped(rows_.data(), readBack_.data(), rowBytes, height);
   return readBack_;
 }
 

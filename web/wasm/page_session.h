@@ -62,7 +62,8 @@ class PageSession {
   std::string render(int32_t divisor);
   // The last picture with the overlay over it, on the canvas.
   void present();
-  // The last picture's RGBA bytes, top row first (empty before a render).
+  // The last picture's RGBA bytes, top row first (empty before a render), valid until the
+  // next call.
   const std::vector<uint8_t>& readPicture();
   int32_t pictureWidth() const;
   int32_t pictureHeight() const;
@@ -82,6 +83,7 @@ class PageSession {
   int32_t canvasWidth_ = 1;
   int32_t canvasHeight_ = 1;
   double density_ = 1;
+  std::vector<uint8_t> rows_;  // as GL reads them, bottom row first
   std::vector<uint8_t> readBack_;
 };
 
