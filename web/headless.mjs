@@ -83,6 +83,7 @@ export async function openPage({ width = 1400, height = 860, served = [] } = {})
   return {
     page,
     renderer,
+    pid: browser.process().pid,
     origin,
     problems,
     requests,
