@@ -1,16 +1,12 @@
-// How a stored picture is turned to be shown upright at its display size: a stream's display
-// matrix (right angles and flips, as players honour it without a rotate filter), and the
-// sample aspect ratio that widens or narrows it.
+// How a stored picture is turned to be shown upright: right angles and flips, as players honour
+// a stream's display matrix without a rotate filter and viewers a photo's EXIF orientation.
 #pragma once
 
 #include <algorithm>
-#include <array>
 #include <cstddef>
 #include <cstdint>
 
 #include "refhost/media/rgba_image.h"
-
-struct AVStream;
 
 namespace refhost {
 
@@ -24,23 +20,12 @@ struct Orientation {
   bool rowOrderOnly() const { return a == 1 && b == 0 && c == 0; }
 };
 
-// The orientation the stream's display matrix asks for; upright when it has none, or one that
-// is no right angle.
-Orientation orientationOf(const AVStream* video);
-
 // The orientation of a photo's EXIF orientation tag, 1 (as stored) to 8; upright for any
 // other value.
 Orientation orientationOfExif(int tag);
 
 // The picture turned as the orientation says, top row first.
 RgbaImage upright(const RgbaImage& stored, const Orientation& orientation);
-
-// The size a picture stored at storedWidth x storedHeight is shown at: turned, then its width
-// scaled by the sample aspect ratio (sarNumerator / sarDenominator, ignored unless both are
-// positive) at its height, as players size their window.
-std::array<int32_t, 2> displaySize(int32_t storedWidth, int32_t storedHeight,
-                                   const Orientation& orientation, int sarNumerator,
-                                   int sarDenominator);
 
 // Calls shown(i, s) for every displayed pixel: i counts the `width` x `height` displayed pixels
 // in GL's row order (bottom row first); s is the index of the stored pixel it shows, of the

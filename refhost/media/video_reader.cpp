@@ -18,8 +18,8 @@ extern "C" {
 
 #include "refhost/media/ffmpeg_utilities.h"
 #include "refhost/media/frame_conversion.h"
-#include "refhost/media/orientation.h"
 #include "refhost/media/stream_colour.h"
+#include "refhost/media/stream_orientation.h"
 
 namespace refhost {
 namespace {

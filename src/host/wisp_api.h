@@ -239,6 +239,9 @@ struct PluginRegistration {
   char* identifier;  // narrow, room for 100 characters
 };
 
+// A browser page links the module in, built in one go with its host: the record never crosses
+// between separately built binaries there, and WebAssembly's pointers are 4 bytes.
+#ifndef __EMSCRIPTEN__
 static_assert(sizeof(void*) == 8, "the registration layout is defined for 64-bit hosts");
 static_assert(offsetof(PluginRegistration, kind) == 0, "kind offset");
 static_assert(offsetof(PluginRegistration, guid) == 4, "guid offset");
@@ -252,6 +255,7 @@ static_assert(offsetof(PluginRegistration, interfaceWord) == 88, "interface word
 static_assert(offsetof(PluginRegistration, interfaceRevision) == 92, "revision offset");
 static_assert(offsetof(PluginRegistration, identifier) == 104, "identifier offset");
 static_assert(sizeof(PluginRegistration) == 112, "registration record size");
+#endif
 
 // Buffer sizes of the registration record, in characters.
 enum : std::size_t {

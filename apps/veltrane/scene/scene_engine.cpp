@@ -56,6 +56,7 @@ void noteUnusedInputZero(const refhost::EffectVocabulary& roles,
 std::unique_ptr<refhost::Engine> startScene(const Scene& scene, SceneEngineOptions options) {
   refhost::EngineOptions engineOptions;
   engineOptions.modulePath = options.modulePath;
+  engineOptions.entryPoints = options.entryPoints;
   engineOptions.profile = options.profile;
   engineOptions.context = std::move(options.context);
   engineOptions.makeContext = refhost::makeHeadlessContext;

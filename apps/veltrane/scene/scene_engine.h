@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <memory>
 #include <nlohmann/json.hpp>
+#include <optional>
 #include <set>
 #include <string>
 
@@ -16,6 +17,8 @@ namespace veltrane_cli {
 
 struct SceneEngineOptions {
   std::string modulePath;
+  // A module linked into the program (a browser page) instead of the file at modulePath.
+  std::optional<refhost::ModuleEntryPoints> entryPoints;
   refhost::GlProfile profile = refhost::GlProfile::Core;
   int32_t hostId = 0;
   // A window's context to draw in, or null for the engine's own.

@@ -8,7 +8,6 @@
 #include <stdexcept>
 
 #include "layouts/layouts.h"
-#include "scene/scene_engine.h"
 #include "viewer/panel_values.h"
 
 namespace veltrane_viewer {
@@ -27,14 +26,28 @@ std::string directoryOf(const std::string& path) {
 
 }  // namespace
 
-ViewerSession::ViewerSession(const veltrane_cli::Scene& scene, const std::string& modulePath,
-                             refhost::GlProfile profile,
-                             std::unique_ptr<refhost::GlContext> context, int32_t frame)
-    : scene_(scene) {
+namespace {
+
+veltrane_cli::SceneEngineOptions moduleOptions(const std::string& modulePath,
+                                               refhost::GlProfile profile,
+                                               std::unique_ptr<refhost::GlContext> context) {
   veltrane_cli::SceneEngineOptions options;
   options.modulePath = modulePath;
   options.profile = profile;
   options.context = std::move(context);
+  return options;
+}
+
+}  // namespace
+
+ViewerSession::ViewerSession(const veltrane_cli::Scene& scene, const std::string& modulePath,
+                             refhost::GlProfile profile,
+                             std::unique_ptr<refhost::GlContext> context, int32_t frame)
+    : ViewerSession(scene, moduleOptions(modulePath, profile, std::move(context)), frame) {}
+
+ViewerSession::ViewerSession(const veltrane_cli::Scene& scene,
+                             veltrane_cli::SceneEngineOptions options, int32_t frame)
+    : scene_(scene) {
   engine_ = veltrane_cli::startScene(scene_, std::move(options));
   setFrame(frame);
   saved_ = snapshot();

@@ -15,6 +15,7 @@
 #include "layouts/layouts.h"
 #include "refhost/engine.h"
 #include "scene/scene_document.h"
+#include "scene/scene_engine.h"
 #include "viewer/view_mapping.h"
 
 namespace veltrane_viewer {
@@ -34,6 +35,9 @@ class ViewerSession {
   // error naming the module or the message that failed.
   ViewerSession(const veltrane_cli::Scene& scene, const std::string& modulePath,
                 refhost::GlProfile profile, std::unique_ptr<refhost::GlContext> context,
+                int32_t frame);
+  // The same with the engine's options given whole (a module linked into the program).
+  ViewerSession(const veltrane_cli::Scene& scene, veltrane_cli::SceneEngineOptions options,
                 int32_t frame);
   ViewerSession(const ViewerSession&) = delete;
   ViewerSession& operator=(const ViewerSession&) = delete;
