@@ -207,7 +207,8 @@ bool EffectService::render(int position, int length, const LayerResolver& layers
   {
     // The editor's thread may be writing these properties while this one reads them.
     mlt_service_lock(service_);
-    reading = readParams(properties, renderer->panel(), position, length, layers);
+    reading = readParams(properties, renderer->panel(), position, length,
+                         FrameSize{request.compositionWidth, request.compositionHeight}, layers);
     request.layout = readLayoutChoice(properties, position, length, &layoutProblem);
     mlt_service_unlock(service_);
   }

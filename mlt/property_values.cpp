@@ -139,7 +139,7 @@ std::optional<std::string> problemWith(const Param& param, std::string_view text
 
 // The value at the position of a property whose every key passed the check.
 ParamValue valueAt(mlt_properties properties, const Param& param, int position, int length,
-                   const LayerResolver& layers) {
+                   const FrameSize& frame, const LayerResolver& layers) {
   const char* id = param.id.c_str();
   switch (param.kind) {
     case ParamKind::Float:
@@ -156,6 +156,11 @@ ParamValue valueAt(mlt_properties properties, const Param& param, int position, 
     }
     case ParamKind::Point: {
       mlt_rect rect = mlt_properties_anim_get_rect(properties, id, position, length);
+      // A rectangle with a size (Kdenlive's, dragged on its monitor) is measured from the
+      // frame's top-left corner, y down; the point is its centre.
+      if (rect.w > 0 && rect.h > 0)
+        return ParamValue::ofPoint(static_cast<float>(rect.x + rect.w / 2 - frame.width / 2.0),
+                                   static_cast<float>(frame.height / 2.0 - rect.y - rect.h / 2));
       return ParamValue::ofPoint(static_cast<float>(rect.x), static_cast<float>(rect.y));
     }
     case ParamKind::Color: {
@@ -194,7 +199,7 @@ std::vector<std::string_view> keyValues(std::string_view text) {
 }
 
 ParamReading readParams(mlt_properties properties, const refhost::ParamPanel& panel, int position,
-                        int length, const LayerResolver& layers) {
+                        int length, const FrameSize& frame, const LayerResolver& layers) {
   ParamReading reading;
   reading.values.reserve(panel.params().size());
   for (const Param& param : panel.params()) {
@@ -211,7 +216,7 @@ ParamReading readParams(mlt_properties properties, const refhost::ParamPanel& pa
       reading.refusals.push_back(Refusal{param.id, text, *problem});
       reading.values.push_back(param.defaultValue);
     } else {
-      reading.values.push_back(valueAt(properties, param, position, length, layers));
+      reading.values.push_back(valueAt(properties, param, position, length, frame, layers));
     }
   }
   return reading;

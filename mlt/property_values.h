@@ -5,6 +5,7 @@
 
 #include <framework/mlt.h>
 
+#include <cstdint>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -27,6 +28,12 @@ struct ParamReading {
   std::vector<Refusal> refusals;
 };
 
+// The composition's size, in which a rectangle's position is measured.
+struct FrameSize {
+  int32_t width = 0;
+  int32_t height = 0;
+};
+
 // The values of an MLT animation string, one per key ("0=15;100|=75" holds 15 and 75); a
 // string without keys is its own single value.
 std::vector<std::string_view> keyValues(std::string_view text);
@@ -35,8 +42,10 @@ std::vector<std::string_view> keyValues(std::string_view text);
 // long. An unset property gives the declared default; so does a refused one, reported in
 // `refusals`. Numbers, angles, points and colours follow MLT's keyframes ("0=15;100=75");
 // choices, booleans and layers hold MLT's key at or before the position. A layer's name becomes
-// the GUID of the track `layers` resolves it to.
+// the GUID of the track `layers` resolves it to. A point given as a rectangle with a size
+// ("x y w h", as Kdenlive writes one) is the rectangle's centre, measured from the top-left
+// corner of a `frame`-sized picture, y down.
 ParamReading readParams(mlt_properties properties, const refhost::ParamPanel& panel, int position,
-                        int length, const LayerResolver& layers);
+                        int length, const FrameSize& frame, const LayerResolver& layers);
 
 }  // namespace veltrane_mlt

@@ -99,7 +99,7 @@ TEST(MeltBridge, RefusedValuesLogOnceAndRenderWithTheDefault) {
       {"borderWidth", "300", "expected a number from 0 to 200"},
       {"numberOfCuts", "two", "expected a whole number from 1 to 8"},
       {"cutType", "Diagonal", "expected one of Local, Radial"},
-      {"inputLayer1", "upper", "expected own or lower"},
+      {"inputLayer1", "upper", "expected own, lower, track:K"},
       {"cutDirection_0", "0=15;19=steep", "expected an angle in degrees"},
       {"borderColor", "pink", "expected a colour"},
       {"cutPosition_0", "10", "expected a point"},
