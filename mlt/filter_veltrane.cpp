@@ -55,12 +55,15 @@ mlt_service attachedTo(mlt_filter filter) {
       mlt_properties_get_data(MLT_FILTER_PROPERTIES(filter), "service", nullptr));
 }
 
-// The tractor the filter is attached to, if it is.
+// The tractor the filter is attached to, if it is. The tractor at the root of an MLT document
+// calls itself a producer named after the document's reader; what makes it a tractor is the
+// multitrack it holds.
 mlt_tractor tractorOf(mlt_filter filter) {
   mlt_service service = attachedTo(filter);
-  return service && mlt_service_identify(service) == mlt_service_tractor_type
-             ? reinterpret_cast<mlt_tractor>(service)
-             : nullptr;
+  const bool tractor =
+      service && (mlt_service_identify(service) == mlt_service_tractor_type ||
+                  mlt_properties_get_data(MLT_SERVICE_PROPERTIES(service), "multitrack", nullptr));
+  return tractor ? reinterpret_cast<mlt_tractor>(service) : nullptr;
 }
 
 // Where the frame lies in the producer the filter is attached to (or, for a filter placed on a
@@ -91,31 +94,43 @@ std::string noteName(mlt_filter filter, const char* what) {
   return prefix + std::string(what);
 }
 
-// The tractor's frame of track `track`, which it keeps on the frame it makes.
+// The tractor's frame of track `track`: it keeps the frame of every track on the frame it
+// makes, in track order, under names made of its id and a number ("mlt_tractor 46_2"; MLT
+// before 7 wrote "_46_2").
 mlt_frame tractorTrackFrame(mlt_tractor tractor, mlt_frame frame, int track) {
   const char* id = mlt_properties_get(MLT_TRACTOR_PROPERTIES(tractor), "_unique_id");
   if (!id) return nullptr;
-  const std::string label = "_" + std::string(id) + "_" + std::to_string(track);
-  return static_cast<mlt_frame>(
-      mlt_properties_get_data(MLT_FRAME_PROPERTIES(frame), label.c_str(), nullptr));
+  const std::string prefix = "mlt_tractor " + std::string(id) + "_";
+  mlt_properties properties = MLT_FRAME_PROPERTIES(frame);
+  int seen = 0;
+  for (int i = 0; i < mlt_properties_count(properties); ++i) {
+    const char* name = mlt_properties_get_name(properties, i);
+    if (!name || std::strncmp(name, prefix.c_str(), prefix.size()) != 0) continue;
+    if (seen++ == track)
+      return static_cast<mlt_frame>(mlt_properties_get_data_at(properties, i, nullptr));
+  }
+  return nullptr;
 }
 
-// The tracks' pictures a filter on a tractor shows, at the tractor's position.
-void addTractorTracks(mlt_filter filter, mlt_tractor tractor, mlt_frame frame,
-                      const LayerResolver& layers, RenderRequest& request,
-                      std::map<int, std::vector<uint8_t>>& pictures) {
-  EffectService& effect = effectOf(filter);
-  mlt_multitrack multitrack = mlt_tractor_multitrack(tractor);
-  const int32_t at = static_cast<int32_t>(mlt_frame_get_position(frame));
-  for (int track : effect.namedTracks(layers)) {
+// Copies of the pictures of the tracks the inputs name, at width x height, taken from the
+// frames the tractor keeps. They are taken before the tractor's own picture: making it blends
+// the tracks into their frames' pictures.
+std::map<int, std::vector<uint8_t>> tractorTrackPictures(mlt_filter filter, mlt_tractor tractor,
+                                                         mlt_frame frame,
+                                                         const LayerResolver& layers, int32_t width,
+                                                         int32_t height) {
+  std::map<int, std::vector<uint8_t>> pictures;
+  for (int track : effectOf(filter).namedTracks(layers)) {
     mlt_frame trackFrame = tractorTrackFrame(tractor, frame, track);
     if (!trackFrame || mlt_frame_is_test_card(trackFrame)) continue;
-    const uint8_t* picture = pictureOf(trackFrame, request.width, request.height, pictures[track]);
+    std::vector<uint8_t> resized;
+    const uint8_t* picture = pictureOf(trackFrame, width, height, resized);
     if (!picture) continue;
-    request.tracks[track] =
-        effect.trackPictures(track, at, picture, request.width, request.height,
-                             mlt_multitrack_track(multitrack, track), trackFrame);
+    pictures[track] = resized.empty()
+                          ? std::vector<uint8_t>(picture, picture + std::size_t(width) * height * 4)
+                          : std::move(resized);
   }
+  return pictures;
 }
 
 int filterImage(mlt_frame frame, uint8_t** image, mlt_image_format* format, int* width, int* height,
@@ -125,6 +140,15 @@ int filterImage(mlt_frame frame, uint8_t** image, mlt_image_format* format, int*
   mlt_properties noted = MLT_FRAME_PROPERTIES(frame);
   const mlt_position position = mlt_filter_get_position(filter, frame);
   const mlt_position length = mlt_filter_get_length2(filter, frame);
+
+  mlt_tractor tractor = tractorOf(filter);
+  LayerResolver layers = tractorResolver(tractor ? mlt_tractor_multitrack(tractor) : nullptr, -1);
+  std::map<int, std::vector<uint8_t>> pictures;
+  mlt_profile profile = mlt_service_profile(MLT_FILTER_SERVICE(filter));
+  int32_t asked[2] = {*width > 0 ? *width : (profile ? profile->width : 0),
+                      *height > 0 ? *height : (profile ? profile->height : 0)};
+  if (tractor && asked[0] > 0 && asked[1] > 0)
+    pictures = tractorTrackPictures(filter, tractor, frame, layers, asked[0], asked[1]);
 
   *format = mlt_image_rgba;
   int error = mlt_frame_get_image(frame, image, format, width, height, 1);
@@ -138,7 +162,6 @@ int filterImage(mlt_frame frame, uint8_t** image, mlt_image_format* format, int*
   fillComposition(MLT_FILTER_SERVICE(filter), request);
   auto producer = static_cast<mlt_producer>(
       mlt_properties_get_data(noted, noteName(filter, "producer").c_str(), nullptr));
-  mlt_tractor tractor = tractorOf(filter);
   // On a tractor the own picture is everything composited: shifts reach the kept pictures,
   // never a copy of the tractor, which would hold this filter too.
   request.own = effect.trackPictures(
@@ -152,9 +175,14 @@ int filterImage(mlt_frame frame, uint8_t** image, mlt_image_format* format, int*
     Fetching guard(filter);
     return other(at, pictureWidth, pictureHeight);
   };
-  LayerResolver layers = tractorResolver(tractor ? mlt_tractor_multitrack(tractor) : nullptr, -1);
-  std::map<int, std::vector<uint8_t>> pictures;
-  if (tractor) addTractorTracks(filter, tractor, frame, layers, request, pictures);
+  const int32_t at = static_cast<int32_t>(mlt_frame_get_position(frame));
+  for (auto& [track, picture] : pictures) {
+    if (asked[0] != w || asked[1] != h)
+      picture = stretched(picture.data(), asked[0], asked[1], w, h);
+    request.tracks[track] =
+        effect.trackPictures(track, at, picture.data(), w, h,
+                             mlt_multitrack_track(mlt_tractor_multitrack(tractor), track), frame);
+  }
 
   auto* out = static_cast<uint8_t*>(mlt_pool_alloc(static_cast<int>(size)));
   if (!effect.render(static_cast<int>(position), static_cast<int>(length), layers, request, out)) {

@@ -157,8 +157,10 @@ ParamValue valueAt(mlt_properties properties, const Param& param, int position, 
     case ParamKind::Point: {
       mlt_rect rect = mlt_properties_anim_get_rect(properties, id, position, length);
       // A rectangle with a size (Kdenlive's, dragged on its monitor) is measured from the
-      // frame's top-left corner, y down; the point is its centre.
-      if (rect.w > 0 && rect.h > 0)
+      // frame's top-left corner, y down; the point is its centre. MLT leaves a size it was not
+      // given at the smallest positive double.
+      constexpr double kNoSize = 1e-9;
+      if (rect.w > kNoSize && rect.h > kNoSize)
         return ParamValue::ofPoint(static_cast<float>(rect.x + rect.w / 2 - frame.width / 2.0),
                                    static_cast<float>(frame.height / 2.0 - rect.y - rect.h / 2));
       return ParamValue::ofPoint(static_cast<float>(rect.x), static_cast<float>(rect.y));

@@ -66,10 +66,12 @@ const char* const kLowerGuid = "d3e00000-0000-4000-8000-000000000001";
 
 const Clips& clips() {
   static const Clips made = [] {
-    Clips result{scratch().file("upper.mov"), scratch().file("lower.mov")};
+    Clips result{scratch().file("upper.mov"), scratch().file("lower.mov"),
+                 scratch().file("third.mov"), scratch().file("fourth.mov")};
     const std::string size = std::to_string(kWidth) + "x" + std::to_string(kHeight);
     for (const auto& [path, source] :
-         {std::pair{result.upper, "testsrc2"}, std::pair{result.lower, "mandelbrot"}}) {
+         {std::pair{result.upper, "testsrc2"}, std::pair{result.lower, "mandelbrot"},
+          std::pair{result.third, "smptebars"}, std::pair{result.fourth, "rgbtestsrc"}}) {
       if (run({"ffmpeg", "-v", "error", "-y", "-f", "lavfi", "-i",
                std::string(source) + "=size=" + size + ":rate=25", "-frames:v",
                std::to_string(kFrames), "-c:v", "png", path},
@@ -117,6 +119,18 @@ MeltRun runMelt(const std::string& document, const std::vector<std::string>& env
   return result;
 }
 
+std::string splitScene(const std::vector<std::string>& clips,
+                       const std::vector<std::string>& options) {
+  testsupport::ScratchDirectory folder;
+  std::vector<std::string> argv{VELTRANE_CLI_PATH, "split", "--plugin", VELTRANE_MODULE_PATH};
+  argv.insert(argv.end(), clips.begin(), clips.end());
+  argv.insert(argv.end(), options.begin(), options.end());
+  argv.insert(argv.end(), {"--save-scene", folder.file("scene.json")});
+  if (run(argv, folder.file("split.log")) != 0)
+    throw std::runtime_error("veltrane split failed: " + readText(folder.file("split.log")));
+  return readText(folder.file("scene.json"));
+}
+
 std::vector<refhost::RgbaImage> renderScene(const std::string& sceneText) {
   testsupport::ScratchDirectory folder;
   writeText(folder.file("scene.json"), sceneText);
@@ -149,6 +163,8 @@ std::string document(const std::string& name, const std::map<std::string, std::s
   std::map<std::string, std::string> all = marks;
   all["@LOWER@"] = clips().lower;
   all["@UPPER@"] = clips().upper;
+  all["@THIRD@"] = clips().third;
+  all["@FOURTH@"] = clips().fourth;
   for (const auto& [mark, value] : all) {
     for (std::size_t at; (at = text.find(mark)) != std::string::npos;)
       text.replace(at, mark.size(), value);
