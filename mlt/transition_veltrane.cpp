@@ -4,6 +4,7 @@
 // frame, puts its picture on the lower track's frame and hides the others, so that neither the
 // tractor nor a later transition shows them again.
 #include <algorithm>
+#include <cstdio>
 #include <cstring>
 #include <memory>
 #include <set>
@@ -16,7 +17,6 @@ namespace veltrane_mlt {
 namespace {
 
 const char* const kStateProperty = "_veltrane_state";
-const char* const kFrameProperty = "_veltrane_composition";
 
 // What the transition holds between MLT's calls for the tracks of one composition frame.
 struct Composition {
@@ -28,13 +28,20 @@ struct Composition {
 
 // Handed from the frame's making to its picture, on the lower track's frame.
 struct ComposedFrame {
-  mlt_transition transition = nullptr;
   mlt_frame upper = nullptr;
   std::map<int, mlt_frame> tracks;  // every track shown, the lower and upper included
   int lowerTrack = 0;
   int upperTrack = 0;
   LayerResolver layers;
 };
+
+// The lower track's frame carries what each composition on it needs under a name of its own: in
+// a chain, several stack their pictures on the same frame.
+std::string composedName(mlt_transition transition) {
+  char name[48];
+  std::snprintf(name, sizeof name, "_veltrane.%p", static_cast<void*>(transition));
+  return name;
+}
 
 Composition& compositionOf(mlt_transition transition) {
   return *static_cast<Composition*>(
@@ -43,10 +50,9 @@ Composition& compositionOf(mlt_transition transition) {
 
 int compositionImage(mlt_frame lowerFrame, uint8_t** image, mlt_image_format* format, int* width,
                      int* height, int) {
-  mlt_frame_pop_service(lowerFrame);
-  auto* composed = static_cast<ComposedFrame*>(
-      mlt_properties_get_data(MLT_FRAME_PROPERTIES(lowerFrame), kFrameProperty, nullptr));
-  mlt_transition transition = composed->transition;
+  auto transition = static_cast<mlt_transition>(mlt_frame_pop_service(lowerFrame));
+  auto* composed = static_cast<ComposedFrame*>(mlt_properties_get_data(
+      MLT_FRAME_PROPERTIES(lowerFrame), composedName(transition).c_str(), nullptr));
   Composition& composition = compositionOf(transition);
   const mlt_position at = mlt_frame_get_position(lowerFrame);
   const mlt_position position = mlt_transition_get_position(transition, lowerFrame);
@@ -135,7 +141,6 @@ void collectTracks(mlt_transition transition, Composition& composition) {
     return;
 
   auto composed = std::make_unique<ComposedFrame>();
-  composed->transition = transition;
   composed->upper = upper;
   composed->lowerTrack = lowerTrack;
   composed->upperTrack = upperTrack;
@@ -144,7 +149,7 @@ void collectTracks(mlt_transition transition, Composition& composition) {
     if (frameOf(track)) composed->tracks[track] = frameOf(track);
   }
   mlt_properties_set_data(
-      MLT_FRAME_PROPERTIES(lower), kFrameProperty, composed.release(), 0,
+      MLT_FRAME_PROPERTIES(lower), composedName(transition).c_str(), composed.release(), 0,
       [](void* data) { delete static_cast<ComposedFrame*>(data); }, nullptr);
   mlt_frame_push_service(lower, transition);
   mlt_frame_push_get_image(lower, compositionImage);
