@@ -92,10 +92,20 @@ std::vector<uint8_t> TrackHistory::find(int track, int32_t position, int32_t wid
       return kept->picture.pixels;
   }
   if (!canSeek(producer) || !clipCanSeek(like)) return {};
+  if (below_) {
+    if (!belowCopy_ || belowCopy_->source() != below_)
+      belowCopy_ = std::make_unique<BelowCopy>(below_);
+    if (belowCopy_->ready()) return belowCopy_->pictureAt(track, position, width, height, like);
+  }
   std::unique_ptr<Reader>& reader = readers_[track];
   if (!reader) reader = std::make_unique<Reader>(producer);
   // A producer that cannot be copied is sought itself, as a last resort.
   return pictureAt(reader->copy ? reader->copy : producer, position, width, height, like);
+}
+
+void TrackHistory::readThrough(mlt_service below) {
+  std::lock_guard<std::mutex> lock(mutex_);
+  below_ = below;
 }
 
 std::size_t TrackHistory::keptBytes() const {

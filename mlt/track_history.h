@@ -14,6 +14,8 @@
 #include <mutex>
 #include <vector>
 
+#include "below_copy.h"
+
 namespace veltrane_mlt {
 
 // A picture: RGBA rows, top row first.
@@ -45,6 +47,10 @@ class TrackHistory {
   std::vector<uint8_t> find(int track, int32_t position, int32_t width, int32_t height,
                             mlt_producer producer, mlt_frame like);
 
+  // Read pictures through a copy of what lies below `below` (a transition's input) rather
+  // than copies of the tracks alone, so that they come out composited; null: tracks alone.
+  void readThrough(mlt_service below);
+
   std::size_t keptBytes() const;
 
  private:
@@ -60,6 +66,8 @@ class TrackHistory {
   mutable std::mutex mutex_;
   std::deque<Kept> kept_;
   std::map<int, std::unique_ptr<Reader>> readers_;
+  mlt_service below_ = nullptr;
+  std::unique_ptr<BelowCopy> belowCopy_;
 };
 
 // A producer of its own that plays what `producer` plays (MLT's XML written and read back), or

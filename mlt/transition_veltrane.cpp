@@ -77,6 +77,7 @@ int compositionImage(mlt_frame lowerFrame, uint8_t** image, mlt_image_format* fo
   request.height = h;
   fillComposition(MLT_TRANSITION_SERVICE(transition), request);
   EffectService& effect = composition.effect;
+  effect.history().readThrough(transition->producer);
   // The track pictures as the services below made them: a shifted input shows what lies
   // below, composited, wherever the kept pictures reach.
   auto trackPictures = [&](int track, mlt_frame frame, const uint8_t* current) {

@@ -199,32 +199,40 @@ TEST(MeltBridge, ATrackThatCannotSeekShowsWhatItPlayedAndNothingAhead) {
 }
 
 // Two pairs of tracks split, then joined by a composition whose every picture is its lower
-// input shifted back: it shows the first pair's split, composited, three frames late, and
-// nothing of the tracks it consumed.
+// input shifted: it shows the first pair's split, composited, three frames late or early
+// (kept pictures back, a copy of what lies below ahead), and nothing of the tracks it
+// consumed.
 TEST(MeltBridge, AShiftedLowerInputInAChainShowsWhatLiesBelowComposited) {
-  const std::string upperTracks =
-      "<track producer=\"track2\"/><track producer=\"track3\"/>"
-      "<transition><property name=\"mlt_service\">veltrane</property>"
-      "<property name=\"a_track\">2</property><property name=\"b_track\">3</property>"
-      "<property name=\"layout\">horizontal-2</property>"
-      "<property name=\"inputLayer1\">lower</property></transition>";
-  const std::string joined =
-      "<transition><property name=\"mlt_service\">veltrane</property>"
-      "<property name=\"a_track\">0</property><property name=\"b_track\">2</property>"
-      "<property name=\"inputLayer0\">lower</property><property "
-      "name=\"inputLayer1\">lower</property>"
-      "<property name=\"inputFrameShift0\">-3</property>"
-      "<property name=\"inputFrameShift1\">-3</property>"
-      "<property name=\"borderWidth\">0</property></transition>";
-  MeltRun chain =
-      runMelt(document("chain.mlt", {{"@UPPER_TRACKS@", upperTracks}, {"@JOINED@", joined}}));
-  MeltRun below = runMelt(document("chain.mlt", {{"@UPPER_TRACKS@", ""}, {"@JOINED@", ""}}));
-  ASSERT_EQ(chain.status, 0) << chain.log;
-  ASSERT_EQ(chain.frames.size(), std::size_t(kFrames)) << chain.log;
-  ASSERT_EQ(below.frames.size(), std::size_t(kFrames)) << below.log;
-  for (int frame = 3; frame < kFrames; ++frame)
-    EXPECT_LE(largestDifference(chain.frames[frame], below.frames[frame - 3]), kTolerance)
-        << "frame " << frame;
+  for (int shift : {-3, 3}) {
+    SCOPED_TRACE("shift " + std::to_string(shift));
+    const std::string upperTracks =
+        "<track producer=\"track2\"/><track producer=\"track3\"/>"
+        "<transition><property name=\"mlt_service\">veltrane</property>"
+        "<property name=\"a_track\">2</property><property name=\"b_track\">3</property>"
+        "<property name=\"layout\">horizontal-2</property>"
+        "<property name=\"inputLayer1\">lower</property></transition>";
+    const std::string joined =
+        "<transition><property name=\"mlt_service\">veltrane</property>"
+        "<property name=\"a_track\">0</property><property name=\"b_track\">2</property>"
+        "<property name=\"inputLayer0\">lower</property><property "
+        "name=\"inputLayer1\">lower</property>"
+        "<property name=\"inputFrameShift0\">" +
+        std::to_string(shift) +
+        "</property>"
+        "<property name=\"inputFrameShift1\">" +
+        std::to_string(shift) +
+        "</property>"
+        "<property name=\"borderWidth\">0</property></transition>";
+    MeltRun chain =
+        runMelt(document("chain.mlt", {{"@UPPER_TRACKS@", upperTracks}, {"@JOINED@", joined}}));
+    MeltRun below = runMelt(document("chain.mlt", {{"@UPPER_TRACKS@", ""}, {"@JOINED@", ""}}));
+    ASSERT_EQ(chain.status, 0) << chain.log;
+    ASSERT_EQ(chain.frames.size(), std::size_t(kFrames)) << chain.log;
+    ASSERT_EQ(below.frames.size(), std::size_t(kFrames)) << below.log;
+    for (int frame = std::max(0, -shift); frame < std::min(kFrames, kFrames - shift); ++frame)
+      EXPECT_LE(largestDifference(chain.frames[frame], below.frames[frame + shift]), kTolerance)
+          << "frame " << frame;
+  }
 }
 
 }  // namespace
