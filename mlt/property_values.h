@@ -34,6 +34,9 @@ struct FrameSize {
   int32_t height = 0;
 };
 
+// The text without the white space around it.
+std::string_view trimmed(std::string_view text);
+
 // The values of an MLT animation string, one per key ("0=15;100|=75" holds 15 and 75); a
 // string without keys is its own single value.
 std::vector<std::string_view> keyValues(std::string_view text);

@@ -5,6 +5,7 @@
 #include <charconv>
 #include <cstdio>
 
+#include "property_values.h"
 #include "refhost/engine.h"
 
 namespace veltrane_mlt {
@@ -12,14 +13,6 @@ namespace veltrane_mlt {
 const char* const kOwnLayerGuid = "10e0e700-0000-4000-8000-000000000001";
 
 namespace {
-
-std::string_view trimmed(std::string_view text) {
-  while (!text.empty() && std::isspace(static_cast<unsigned char>(text.front())))
-    text.remove_prefix(1);
-  while (!text.empty() && std::isspace(static_cast<unsigned char>(text.back())))
-    text.remove_suffix(1);
-  return text;
-}
 
 std::string lowered(std::string_view text) {
   std::string out(text);

@@ -229,7 +229,7 @@ constexpr char kPanelBody[] = R"QML(
 
     Component {
         id: listControl
-        ComboBox {
+        Shotcut.ComboBox {
             property var setting
             objectName: setting ? 'control:' + setting.name : ''
             textRole: 'text'

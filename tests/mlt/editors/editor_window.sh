@@ -4,10 +4,12 @@
 # Shotcut on a two-track project (the filter on its Output track), each made from the tests'
 # fixtures with clips of one colour each. The editor runs in a private home with the module and
 # its descriptions from the build tree; screenshots are taken until the picture is there or a
-# minute has passed. The last screenshot stays in OUT when the check fails.
-#   editor_window.sh kdenlive|shotcut MLT_REPOSITORY MLT_DATA OUT
+# minute has passed. The last screenshot stays in OUT when the check fails; with `panel`, OUT
+# gets a picture of the window with the effect's panel open once the check passes (for the
+# docs: scripts/editor-screenshot).
+#   editor_window.sh kdenlive|shotcut MLT_REPOSITORY MLT_DATA OUT [panel]
 set -euo pipefail
-editor=$1 repository=$2 data=$3 out=$4
+editor=$1 repository=$2 data=$3 out=$4 panel=${5:-}
 here=$(cd "$(dirname "$0")" && pwd)
 fixtures=$here/../data
 for tool in "$editor" Xvfb xdotool import convert ffmpeg python3; do
@@ -51,7 +53,14 @@ else
   sed "${sized[@]}" -e "s#@UPPER@#$work/blue.mov#" -e "s#@LOWER@#$work/red.mov#" \
     -e "s|@PROPERTIES@|$properties|" "$fixtures/shotcut_split.mlt" >"$project"
   layout=diagonal
-  mkdir -p "$work/share/shotcut/qml/filters/veltrane"
+  # Shotcut finds its filters only in share/shotcut beside its program: a copy of the program
+  # in a folder of ours, with Shotcut's own share linked in and the filter added.
+  mkdir -p "$work/bin" "$work/share/shotcut/qml/filters/veltrane"
+  cp "$(command -v shotcut)" "$work/bin/shotcut"
+  for entry in /usr/share/shotcut/* /usr/share/shotcut/qml/* /usr/share/shotcut/qml/filters/*; do
+    link=$work/share/${entry#/usr/share/}
+    [[ -e $link ]] || ln -s "$entry" "$link"
+  done
   cp "$data/veltrane/meta.qml" "$data/veltrane/ui.qml" "$work/share/shotcut/qml/filters/veltrane/"
 fi
 
@@ -70,10 +79,28 @@ if [[ $editor == kdenlive ]]; then
   dbus-run-session -- bash -c 'echo $$ >"$1"; exec kdenlive "$2"' _ "$work/app.pid" "$project" \
     >"$work/editor.log" 2>&1 &
 else
-  bash -c 'echo $$ >"$1"; exec shotcut "$2"' _ "$work/app.pid" "$project" >"$work/editor.log" 2>&1 &
+  bash -c 'echo $$ >"$1"; exec "$2" "$3"' _ "$work/app.pid" "$work/bin/shotcut" "$project" \
+    >"$work/editor.log" 2>&1 &
 fi
 for _ in $(seq 100); do [[ -s $work/app.pid ]] && break; sleep 0.1; done
 app=$(cat "$work/app.pid")
+
+# The window at the screen's size, the effect selected and its panel shown: Kdenlive's
+# composition on the timeline (its stack below the monitor), Shotcut's Output track and its
+# Filters panel. The places clicked are those of each editor's first layout at 1600x1000.
+show_panel() {
+  local window
+  window=$(xdotool search --onlyvisible --class "$editor" 2>/dev/null | tail -1)
+  xdotool windowmove --sync "$window" 0 0 windowsize --sync "$window" 1600 1000
+  sleep 3
+  if [[ $editor == shotcut ]]; then
+    xdotool mousemove "${SHOTCUT_OUTPUT_X:-30}" "${SHOTCUT_OUTPUT_Y:-796}" click 1
+    sleep 1
+    xdotool mousemove "${SHOTCUT_FILTERS_X:-795}" "${SHOTCUT_FILTERS_Y:-52}" click 1
+  fi
+  sleep 4
+  import -window root "$out"
+}
 
 for _ in $(seq 30); do
   sleep 2
@@ -85,7 +112,10 @@ for _ in $(seq 30); do
   done
   import -window root "$work/shot.png" 2>/dev/null || continue
   convert "$work/shot.png" "$work/shot.ppm"
-  if python3 "$here/monitor_pixels.py" "$work/shot.ppm" "$layout"; then exit 0; fi
+  if python3 "$here/monitor_pixels.py" "$work/shot.ppm" "$layout"; then
+    [[ -n $panel ]] && show_panel
+    exit 0
+  fi
 done
 cp "$work/shot.png" "$out"
 echo "the split never showed in $editor's monitor; the last screenshot is $out" >&2
