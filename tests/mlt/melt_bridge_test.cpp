@@ -52,12 +52,6 @@ TEST(MeltBridge, RendersWhatTheReferenceHostRenders) {
        "\"cutType\": \"Radial\", \"numberOfCuts\": 3, \"cutPosition_global\": [10, -5], "
        "\"cutDirection_0\": 30, \"cutDirection_1\": 150, \"cutDirection_2\": 270, "
        "\"inputFrameShift2\": -3, \"inputFrameShift3\": 4"},
-      {"a project as Kdenlive saves it", document("kdenlive_project.mlt"),
-       "\"numberOfCuts\": 2, \"cutPosition_1\": [-30, 10], \"cutDirection_1\": {\"keys\": "
-       "[[0, 100], [19, 140]]}, \"inputLayer1\": " +
-           lower +
-           ", \"inputFrameShift2\": -3, "
-           "\"borderColor\": [1, 1, 1]"},
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.name);
