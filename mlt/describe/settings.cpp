@@ -55,41 +55,45 @@ std::vector<std::pair<std::string, std::string>> trackChoices(bool transition) {
   return choices;
 }
 
+// An angle in degrees, keyframable, shown from -360 to 360.
+void makeAngle(Setting& setting) {
+  setting.kind = Kind::Angle;
+  setting.minimum = -360;
+  setting.maximum = 360;
+  setting.decimals = 1;
+  setting.unit = "°";
+  setting.animated = true;
+}
+
+// One of the bridge's own settings, in the Layout group.
+Setting layoutSetting(const char* property, const char* name, const std::string& fallback,
+                      const std::string& editorDefault, const char* description) {
+  Setting setting;
+  setting.property = property;
+  setting.group = "Layout";
+  setting.name = name;
+  setting.fallback = fallback;
+  setting.editorDefault = editorDefault;
+  setting.description = description;
+  return setting;
+}
+
 std::vector<Setting> layoutSettings() {
-  Setting layout;
-  layout.property = veltrane_mlt::kLayoutProperty;
-  layout.group = "Layout";
-  layout.name = "Layout";
+  Setting layout = layoutSetting(
+      veltrane_mlt::kLayoutProperty, "Layout", "none", veltrane_cli::layouts().front().name,
+      "A layout of veltrane split; its cuts replace the cut settings below");
   layout.kind = Kind::List;
-  layout.fallback = "none";
-  layout.editorDefault = veltrane_cli::layouts().front().name;
   layout.choices.emplace_back("none", "Cuts as set below");
   for (const veltrane_cli::LayoutInfo& info : veltrane_cli::layouts())
     layout.choices.emplace_back(info.name, info.menuName);
-  layout.description = "A layout of veltrane split; its cuts replace the cut settings below";
-
-  Setting angle;
-  angle.property = veltrane_mlt::kLayoutAngleProperty;
-  angle.group = "Layout";
-  angle.name = "Turn";
-  angle.kind = Kind::Angle;
-  angle.minimum = -360;
-  angle.maximum = 360;
-  angle.decimals = 1;
-  angle.unit = "°";
-  angle.animated = true;
-  angle.fallback = angle.editorDefault = "0";
-  angle.description = "Degrees the layout's cuts are turned by, about the frame's centre";
-
-  Setting framing;
-  framing.property = veltrane_mlt::kFramePicturesProperty;
-  framing.group = "Layout";
-  framing.name = "Frame pictures on their regions";
+  Setting angle =
+      layoutSetting(veltrane_mlt::kLayoutAngleProperty, "Turn", "0", "0",
+                    "Degrees the layout's cuts are turned by, about the frame's centre");
+  makeAngle(angle);
+  Setting framing = layoutSetting(
+      veltrane_mlt::kFramePicturesProperty, "Frame pictures on their regions", "0", "1",
+      "Each picture moved and scaled to fill its region, as veltrane split frames it");
   framing.kind = Kind::Bool;
-  framing.fallback = "0";
-  framing.editorDefault = "1";
-  framing.description =
-      "Each picture moved and scaled to fill its region, as veltrane split frames it";
   return {layout, angle, framing};
 }
 
@@ -124,12 +128,7 @@ Setting settingOf(const refhost::ParamPanel& panel, const refhost::EffectVocabul
       setting.animated = true;
       break;
     case ParamKind::Angle:
-      setting.kind = Kind::Angle;
-      setting.minimum = -360;
-      setting.maximum = 360;
-      setting.decimals = 1;
-      setting.unit = "°";
-      setting.animated = true;
+      makeAngle(setting);
       break;
     case ParamKind::Point:
       setting.kind = Kind::Point;
