@@ -86,7 +86,7 @@ for _ in $(seq 100); do [[ -s $work/app.pid ]] && break; sleep 0.1; done
 app=$(cat "$work/app.pid")
 
 # The window at the screen's size, the effect selected and its panel shown: Kdenlive's
-# composition on the timeline (its stack below the monitor), Shotcut's Output track and its
+# composition on the timeline and its Effect/Composition Stack, Shotcut's Output track and its
 # Filters panel. The places clicked are those of each editor's first layout at 1600x1000.
 show_panel() {
   local window
@@ -97,6 +97,10 @@ show_panel() {
     xdotool mousemove "${SHOTCUT_OUTPUT_X:-30}" "${SHOTCUT_OUTPUT_Y:-796}" click 1
     sleep 1
     xdotool mousemove "${SHOTCUT_FILTERS_X:-795}" "${SHOTCUT_FILTERS_Y:-52}" click 1
+  else
+    xdotool mousemove "${KDENLIVE_COMPOSITION_X:-175}" "${KDENLIVE_COMPOSITION_Y:-568}" click 1
+    sleep 1
+    xdotool mousemove "${KDENLIVE_STACK_X:-1362}" "${KDENLIVE_STACK_Y:-952}" click 1
   fi
   sleep 4
   import -window root "$out"
