@@ -115,9 +115,10 @@ MeltRun runMelt(const std::string& document, const std::vector<std::string>& env
   const std::size_t frameBytes = std::size_t(kWidth) * kHeight * 4;
   std::error_code ignored;
   // melt 7.12 now and then stops reading frames while its main loop waits on for ever: once
-  // after the last frame, and, more rarely on a busy machine, before the first (its consumer's
-  // thread gone, nothing written). Either way the run is stopped: with every frame out and
-  // two seconds more it counts, with none in a minute it is run once more. The log says so.
+  // after the last frame, and, rarely on a busy machine, before the first (its consumer's
+  // thread gone, nothing written; or it ends at once, having written nothing). A run with every
+  // frame out and two seconds more is stopped and counts; one that wrote no frame (in a minute,
+  // or when it ended) is run once more. The log says which.
   for (int attempt = 0; attempt < 2; ++attempt) {
     // Every frame rendered, however long one takes: a busy machine drops none.
     testsupport::ChildProcess melt(
@@ -138,8 +139,10 @@ MeltRun runMelt(const std::string& document, const std::vector<std::string>& env
       result.log += "\n[melt went on waiting after the last frame and was stopped]";
       break;
     }
-    if (melt.pid() > 0 && tenth >= 600 && attempt == 0) {
-      result.log += "\n[melt wrote no frame in a minute; run again]\n";
+    const std::uintmax_t written = std::filesystem::file_size(out, ignored);
+    if (attempt == 0 && (written == 0 || written == std::uintmax_t(-1))) {
+      result.log +=
+          "\n[melt wrote no frame (status " + std::to_string(result.status) + "); run again]\n";
       continue;
     }
     if (result.status != 0) result.log += "\n[melt's status " + std::to_string(result.status) + "]";
