@@ -119,6 +119,7 @@ MeltRun runMelt(const std::string& document, const std::vector<std::string>& env
   // thread gone, nothing written; or it ends at once, having written nothing). A run with every
   // frame out and two seconds more is stopped and counts; one that wrote no frame (in a minute,
   // or when it ended) is run once more. The log says which.
+  std::string retried;  // what the first run came to, when it was run again
   for (int attempt = 0; attempt < 2; ++attempt) {
     // Every frame rendered, however long one takes: a busy machine drops none.
     testsupport::ChildProcess melt(
@@ -133,7 +134,7 @@ MeltRun runMelt(const std::string& document, const std::vector<std::string>& env
       if (written >= kFrames * frameBytes && ++complete > 20) break;
       if (tenth >= 600 && (written == 0 || written == std::uintmax_t(-1))) break;
     }
-    result.log += readText(folder.file("melt.log"));
+    result.log = readText(folder.file("melt.log"));
     if (melt.pid() > 0 && complete > 20) {
       result.status = 0;
       result.log += "\n[melt went on waiting after the last frame and was stopped]";
@@ -141,13 +142,14 @@ MeltRun runMelt(const std::string& document, const std::vector<std::string>& env
     }
     const std::uintmax_t written = std::filesystem::file_size(out, ignored);
     if (attempt == 0 && (written == 0 || written == std::uintmax_t(-1))) {
-      result.log +=
-          "\n[melt wrote no frame (status " + std::to_string(result.status) + "); run again]\n";
+      retried =
+          "[melt wrote no frame (status " + std::to_string(result.status) + ") and ran again]";
       continue;
     }
     if (result.status != 0) result.log += "\n[melt's status " + std::to_string(result.status) + "]";
     break;
   }
+  if (!retried.empty()) result.log += "\n" + retried;
   const std::string raw = readText(out);
   for (std::size_t at = 0; frameBytes && at + frameBytes <= raw.size(); at += frameBytes) {
     refhost::RgbaImage frame(kWidth, kHeight);
