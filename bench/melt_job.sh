@@ -6,12 +6,19 @@
 # nearest they come to a split). melt runs with one render thread (real_time=-1, every frame
 # kept) and with two (real_time=-2: the bridge then runs an engine per thread). Prints the
 # median wall and CPU seconds and peak resident MB of RUNS runs each.
-# Usage: bench/melt_job.sh [RUNS] (default 3). Inputs are made in $BENCH_JOB_DIR when given
-# (kept and reused, and shared with scripts/bench-job), else in a temporary folder.
+# Then, at 640x360 (100 frames, four 8-second clips with a keyframe every 2 seconds, two render
+# threads): the two tracks with no shift and with a 25-frame shift forward and back on the own
+# region, and a 2x2 grid of four tracks from one composition (layout grid-2x2, pictures
+# framed), each against `veltrane render` of the same scene (the grid as `veltrane split`
+# makes it).
+# Usage: bench/melt_job.sh [RUNS] [all|tracks] (default 3 all; tracks runs the 640x360 rows
+# only). Inputs are made in $BENCH_JOB_DIR when given (kept and reused, and shared with
+# scripts/bench-job), else in a temporary folder.
 set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 build_dir=${BUILD_DIR:-$root/build}
 runs=${1:-3}
+rows=${2:-all}
 BUILD_DIR=$build_dir BUILD_TARGETS="veltrane veltrane_cli mltveltrane" "$root/scripts/build" \
   >/dev/null
 export MLT_REPOSITORY=$build_dir/mlt/repository MLT_DATA=$build_dir/mlt/data
@@ -19,9 +26,9 @@ export MLT_REPOSITORY=$build_dir/mlt/repository MLT_DATA=$build_dir/mlt/data
 source "$root/bench/whole_jobs.sh"
 enter_work_folder
 encode=(-c:v libx264 -crf 18 -preset fast -pix_fmt yuv420p)
-[[ -f in0.mp4 ]] || ffmpeg -v error -y -f lavfi -i "testsrc2=size=1920x1080:rate=25" \
+[[ -f in0.mp4 || $rows != all ]] || ffmpeg -v error -y -f lavfi -i "testsrc2=size=1920x1080:rate=25" \
   -f lavfi -i "sine=frequency=440:sample_rate=48000" -c:a aac -t 8 "${encode[@]}" in0.mp4
-[[ -f in1.mp4 ]] || ffmpeg -v error -y -f lavfi -i "testsrc=size=1920x1080:rate=25" -t 8 \
+[[ -f in1.mp4 || $rows != all ]] || ffmpeg -v error -y -f lavfi -i "testsrc=size=1920x1080:rate=25" -t 8 \
   "${encode[@]}" in1.mp4
 
 # in0 above the cut (the own source, the upper track), in1 below (a layer, the lower track).
@@ -75,7 +82,8 @@ measure() {
   local frames
   frames=$(ffprobe -v error -count_frames -select_streams v -show_entries stream=nb_read_frames \
     -of csv=p=0 "$output")
-  [[ $frames == 200 ]] || { echo "$name made $frames frames, not 200" >&2; exit 1; }
+  [[ $frames == "${measure_frames:-200}" ]] ||
+    { echo "$name made $frames frames, not ${measure_frames:-200}" >&2; exit 1; }
   read -r w u s m <"$name.time"
   wall[$name]+="$w "
   cpu[$name]+="$(awk -v u="$u" -v s="$s" 'BEGIN { printf "%.2f", u + s }') "
@@ -84,6 +92,8 @@ measure() {
 median() { tr ' ' '\n' <<<"$1" | sed '/^$/d' | sort -g | awk '{ v[NR] = $1 } END { print v[int((NR + 1) / 2)] }'; }
 melt_h264=(vcodec=libx264 crf=18 preset=fast pix_fmt=yuv420p an=1)
 
+names=()
+if [[ $rows == all ]]; then
 names=(melt-veltrane-1 melt-veltrane-2 render melt-composite-1 melt-qtblend-1)
 for run in $(seq "$runs"); do
   echo "== run $run of $runs" >&2
@@ -102,16 +112,24 @@ done
 # How far melt's picture through the bridge is from veltrane render's (PSNR, all planes).
 psnr=$(ffmpeg -v info -i mv1.mp4 -i render.mp4 -lavfi psnr -f null - 2>&1 |
   sed -n 's/.*average:\([0-9.inf]*\).*/\1/p' | tail -1)
+fi
+source "$root/bench/melt_tracks.sh"
 
 printf "\n%-28s %8s %8s %8s\n" "medians of $runs" "wall s" "cpu s" "peak MB"
 for name in "${names[@]}"; do
   printf "%-28s %8s %8s %8s\n" "$name" "$(median "${wall[$name]}")" "$(median "${cpu[$name]}")" \
     "$(median "${memory[$name]}")"
 done
-render_wall=$(median "${wall[render]}")
-for name in melt-veltrane-1 melt-veltrane-2; do
-  echo "$name / render: $(awk -v a="$(median "${wall[$name]}")" -v b="$render_wall" \
-    'BEGIN { printf "%.2f", a / b }')x wall"
-done
-echo "melt through the bridge against veltrane render: PSNR $psnr dB"
+ratio() { awk -v a="$(median "${wall[$1]}")" -v b="$(median "${wall[$2]}")" \
+  'BEGIN { printf "%.2f", a / b }'; }
+if [[ $rows == all ]]; then
+  for name in melt-veltrane-1 melt-veltrane-2; do
+    echo "$name / render: $(ratio "$name" render)x wall"
+  done
+  echo "melt through the bridge against veltrane render: PSNR $psnr dB"
+fi
+echo "melt, 25-frame shift forward / no shift: $(ratio melt-shift+25 melt-shift0)x wall"
+echo "melt, 25-frame shift back / no shift: $(ratio melt-shift-25 melt-shift0)x wall"
+echo "melt / render, 25-frame shift forward: $(ratio melt-shift+25 render-shift+25)x wall"
+echo "melt / render, four-track grid: $(ratio melt-grid-4 render-grid-4)x wall"
 echo "$(nproc) cores, load average $(cut -d' ' -f1-3 /proc/loadavg) at the end"

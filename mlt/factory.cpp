@@ -27,10 +27,11 @@ mlt_properties metadata(mlt_service_type, const char*, void* fileName) {
 }  // namespace
 
 extern "C" __attribute__((visibility("default"))) MLT_REPOSITORY {
-  MLT_REGISTER(mlt_service_transition_type, "veltrane", transition);
-  MLT_REGISTER(mlt_service_filter_type, "veltrane", filter);
-  MLT_REGISTER_METADATA(mlt_service_transition_type, "veltrane", metadata,
+  using veltrane_mlt::kServiceName;
+  MLT_REGISTER(mlt_service_transition_type, kServiceName, transition);
+  MLT_REGISTER(mlt_service_filter_type, kServiceName, filter);
+  MLT_REGISTER_METADATA(mlt_service_transition_type, kServiceName, metadata,
                         const_cast<char*>("transition_veltrane.yml"));
-  MLT_REGISTER_METADATA(mlt_service_filter_type, "veltrane", metadata,
+  MLT_REGISTER_METADATA(mlt_service_filter_type, kServiceName, metadata,
                         const_cast<char*>("filter_veltrane.yml"));
 }

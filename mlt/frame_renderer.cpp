@@ -8,6 +8,7 @@
 #include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
 #include "track_frames.h"
+#include "track_layers.h"
 
 namespace veltrane_mlt {
 namespace {
@@ -41,8 +42,7 @@ bool sameSettings(const refhost::FrameSettings& a, const refhost::FrameSettings&
 
 }  // namespace
 
-FrameRenderer::FrameRenderer(const std::string& modulePath, bool withLowerTrack)
-    : withLowerTrack_(withLowerTrack) {
+FrameRenderer::FrameRenderer(const std::string& modulePath) {
   std::unique_ptr<refhost::GlContext> context;
   try {
     context = refhost::makeHeadlessContext(refhost::GlProfile::Core);
@@ -55,25 +55,16 @@ FrameRenderer::FrameRenderer(const std::string& modulePath, bool withLowerTrack)
   engine_ = std::make_unique<refhost::Engine>(std::move(options));
 
   auto ownRows = [this](int32_t frame, int32_t width, int32_t height, refhost::PixelFormat) {
-    return request_ ? rowsOf(request_->own, frame, width, height) : std::vector<uint8_t>();
+    return request_ ? rowsOf(&request_->own, frame, width, height) : std::vector<uint8_t>();
   };
   engine_->setSourceFrames(ownRows);
   // The layer picker lists the track the effect sits on first, as the host lists its own
-  // layer; choosing it means the own source.
+  // layer; choosing it means the own source. The tracks follow as inputs name them.
   refhost::Layer own;
   own.guid = kOwnLayerGuid;
   own.name = "This track";
   own.source = ownRows;
   engine_->addLayer(own);
-  if (withLowerTrack_) {
-    refhost::Layer lower;
-    lower.guid = kLowerLayerGuid;
-    lower.name = "Lower track";
-    lower.source = [this](int32_t frame, int32_t width, int32_t height, refhost::PixelFormat) {
-      return request_ ? rowsOf(request_->lower, frame, width, height) : std::vector<uint8_t>();
-    };
-    engine_->addLayer(lower);
-  }
   engine_->start();
   engine_->createInstance();
   for (const refhost::Param& param : engine_->panel().params())
@@ -88,10 +79,12 @@ FrameRenderer::~FrameRenderer() {
   }
 }
 
-std::vector<uint8_t> FrameRenderer::rowsOf(const TrackPictures& track, int32_t position,
+std::vector<uint8_t> FrameRenderer::rowsOf(const TrackPictures* shown, int32_t position,
                                            int32_t width, int32_t height) const {
   // Called by the host from inside the plug-in's render: nothing may be thrown through it. An
   // empty answer is a frame the host does not have, which the effect shows as such.
+  if (!shown) return {};
+  const TrackPictures& track = *shown;
   try {
     const std::size_t rowBytes = static_cast<std::size_t>(width) * 4;
     std::vector<uint8_t> other;
@@ -126,17 +119,35 @@ void FrameRenderer::applyComposition(const RenderRequest& request) {
 
   // The frame number is the own track's position, and a transition's tracks share their
   // positions (the composition's): every layer starts at frame 0 and plays its track's frames.
-  const TrackPictures* tracks[] = {&request.own, &request.lower};
-  for (std::size_t i = 0; i < engine_->layers().size() && i < 2; ++i) {
-    refhost::Layer layer = engine_->layers()[i];
-    const int32_t frameCount = std::max(1, tracks[i]->length);
+  std::vector<std::pair<std::size_t, const TrackPictures*>> shown{{0, &request.own}};
+  for (const auto& [track, pictures] : request.tracks) {
+    auto found = trackLayers_.find(track);
+    if (found == trackLayers_.end()) {
+      refhost::Layer layer;
+      layer.guid = trackGuid(track);
+      layer.name = "Track " + std::to_string(track);
+      layer.source = [this, track = track](int32_t frame, int32_t width, int32_t height,
+                                           refhost::PixelFormat) {
+        if (!request_) return std::vector<uint8_t>();
+        auto pictures = request_->tracks.find(track);
+        return rowsOf(pictures == request_->tracks.end() ? nullptr : &pictures->second, frame,
+                      width, height);
+      };
+      engine_->addLayer(layer);
+      found = trackLayers_.emplace(track, engine_->layers().size() - 1).first;
+    }
+    shown.emplace_back(found->second, &pictures);
+  }
+  for (const auto& [index, pictures] : shown) {
+    refhost::Layer layer = engine_->layers()[index];
+    const int32_t frameCount = std::max(1, pictures->length);
     if (layer.frameCount == frameCount && layer.width == request.compositionWidth &&
         layer.height == request.compositionHeight)
       continue;
     layer.frameCount = frameCount;
     layer.width = request.compositionWidth;
     layer.height = request.compositionHeight;
-    engine_->setLayer(i, layer);
+    engine_->setLayer(index, layer);
   }
 }
 
@@ -156,7 +167,9 @@ void FrameRenderer::render(const RenderRequest& request, uint8_t* out) {
   } current{request_};
   request_ = &request;
   applyComposition(request);
-  applyValues(request.values);
+  std::vector<refhost::ParamValue> values = request.values;
+  layouts_.apply(*engine_, request.layout, values);
+  applyValues(values);
 
   const int32_t width = request.width, height = request.height;
   const std::size_t rowBytes = static_cast<std::size_t>(width) * 4;

@@ -4,10 +4,12 @@
 
 #include <cstdint>
 #include <functional>
+#include <map>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "layout_choice.h"
 #include "refhost/engine.h"
 #include "refhost/pipeline/frame_readback.h"
 
@@ -34,22 +36,26 @@ struct RenderRequest {
   int32_t compositionHeight = 0;
   double frameRate = 25.0;
   float pixelAspect = 1.0f;
-  TrackPictures own;    // the effect's own source; its position is the frame number
-  TrackPictures lower;  // the layer "lower" names; used only where the renderer has one
+  TrackPictures own;  // the effect's own source; its position is the frame number
+  // The tractor's tracks the inputs name (the layers of trackGuid), by index; their positions
+  // count as the own source's.
+  std::map<int, TrackPictures> tracks;
   std::vector<refhost::ParamValue> values;  // every parameter, in declaration order
+  LayoutChoice layout;                      // applied over `values`
 };
 
 class FrameRenderer {
  public:
   // Makes a GL context and makes it current on this thread, loads the module and creates the
-  // effect's instance; a transition's renderer lists the lower track as a layer. Throws
-  // std::runtime_error: GlUnavailable when no OpenGL 4.1 context can be made.
-  FrameRenderer(const std::string& modulePath, bool withLowerTrack);
+  // effect's instance. Throws std::runtime_error: GlUnavailable when no OpenGL 4.1 context can
+  // be made.
+  explicit FrameRenderer(const std::string& modulePath);
   ~FrameRenderer();
   FrameRenderer(const FrameRenderer&) = delete;
   FrameRenderer& operator=(const FrameRenderer&) = delete;
 
   const refhost::ParamPanel& panel() const { return engine_->panel(); }
+  const refhost::EffectVocabulary& vocabulary() const { return engine_->vocabulary(); }
 
   // Renders the frame into `out` (width x height RGBA, top row first). Needs this renderer's
   // context current (any BorrowedThread scope on this thread will do: the host makes it
@@ -62,15 +68,16 @@ class FrameRenderer {
   };
 
  private:
-  std::vector<uint8_t> rowsOf(const TrackPictures& track, int32_t position, int32_t width,
+  std::vector<uint8_t> rowsOf(const TrackPictures* track, int32_t position, int32_t width,
                               int32_t height) const;
   void applyComposition(const RenderRequest& request);
   void applyValues(const std::vector<refhost::ParamValue>& values);
 
   std::unique_ptr<refhost::Engine> engine_;
-  bool withLowerTrack_;
   const RenderRequest* request_ = nullptr;  // the frame being rendered, for the frame sources
-  std::vector<uint8_t> upload_;             // the own picture turned bottom row first
+  std::map<int, std::size_t> trackLayers_;  // the engine's layer of each track shown so far
+  LayoutApplier layouts_;
+  std::vector<uint8_t> upload_;  // the own picture turned bottom row first
   // Kept from frame to frame while the size stays: a new one would allocate its buffer anew.
   std::unique_ptr<refhost::FrameReadback> readback_;
   std::vector<refhost::ParamValue> applied_;

@@ -11,22 +11,11 @@
 
 namespace veltrane_mlt {
 
-const char* const kLowerLayerGuid = "10e0e700-0000-4000-8000-000000000002";
-const char* const kOwnLayerGuid = "10e0e700-0000-4000-8000-000000000001";
-
 namespace {
 
 using refhost::Param;
 using refhost::ParamKind;
 using refhost::ParamValue;
-
-std::string_view trimmed(std::string_view text) {
-  while (!text.empty() && std::isspace(static_cast<unsigned char>(text.front())))
-    text.remove_prefix(1);
-  while (!text.empty() && std::isspace(static_cast<unsigned char>(text.back())))
-    text.remove_suffix(1);
-  return text;
-}
 
 bool sameWord(std::string_view a, std::string_view b) {
   return a.size() == b.size() && std::equal(a.begin(), a.end(), b.begin(), [](char x, char y) {
@@ -51,24 +40,6 @@ std::string numberText(double value) {
   char buffer[32];
   std::snprintf(buffer, sizeof buffer, "%g", value);
   return buffer;
-}
-
-// The values of an MLT animation string, one per key ("0=15;100|=75" holds 15 and 75); a
-// string without keys is its own single value.
-std::vector<std::string_view> keyValues(std::string_view text) {
-  std::vector<std::string_view> values;
-  if (text.find('=') == std::string_view::npos) return {text};
-  while (!text.empty()) {
-    std::size_t end = text.find(';');
-    std::string_view item = text.substr(0, end);
-    if (!trimmed(item).empty()) {
-      std::size_t equals = item.find('=');
-      values.push_back(equals == std::string_view::npos ? item : item.substr(equals + 1));
-    }
-    if (end == std::string_view::npos) break;
-    text.remove_prefix(end + 1);
-  }
-  return values;
 }
 
 bool isColour(std::string_view text) {
@@ -119,13 +90,6 @@ std::optional<int32_t> boolOf(std::string_view text) {
   return std::nullopt;
 }
 
-std::optional<std::string> layerOf(std::string_view text) {
-  text = trimmed(text);
-  if (sameWord(text, "own")) return std::string(refhost::kNoLayer);
-  if (sameWord(text, "lower")) return std::string(kLowerLayerGuid);
-  return std::nullopt;
-}
-
 // What the module would refuse in one value's text, or nothing when it is fine.
 std::optional<std::string> problemWith(const Param& param, std::string_view text) {
   switch (param.kind) {
@@ -159,14 +123,15 @@ std::optional<std::string> problemWith(const Param& param, std::string_view text
              std::to_string(param.choices.size() - 1);
     }
     case ParamKind::Layer:
-      if (layerOf(text)) return std::nullopt;
-      return std::string("expected own or lower");
+      if (parseLayerName(text)) return std::nullopt;
+      return std::string("expected own, lower, track:K (a track's index) or track:NAME");
   }
   return std::nullopt;
 }
 
 // The value at the position of a property whose every key passed the check.
-ParamValue valueAt(mlt_properties properties, const Param& param, int position, int length) {
+ParamValue valueAt(mlt_properties properties, const Param& param, int position, int length,
+                   const FrameSize& frame, const LayerResolver& layers) {
   const char* id = param.id.c_str();
   switch (param.kind) {
     case ParamKind::Float:
@@ -183,6 +148,13 @@ ParamValue valueAt(mlt_properties properties, const Param& param, int position, 
     }
     case ParamKind::Point: {
       mlt_rect rect = mlt_properties_anim_get_rect(properties, id, position, length);
+      // A rectangle with a size (Kdenlive's, dragged on its monitor) is measured from the
+      // frame's top-left corner, y down; the point is its centre. MLT leaves a size it was not
+      // given at the smallest positive double.
+      constexpr double kNoSize = 1e-9;
+      if (rect.w > kNoSize && rect.h > kNoSize)
+        return ParamValue::ofPoint(static_cast<float>(rect.x + rect.w / 2 - frame.width / 2.0),
+                                   static_cast<float>(frame.height / 2.0 - rect.y - rect.h / 2));
       return ParamValue::ofPoint(static_cast<float>(rect.x), static_cast<float>(rect.y));
     }
     case ParamKind::Color: {
@@ -198,13 +170,38 @@ ParamValue valueAt(mlt_properties properties, const Param& param, int position, 
   std::string_view held = text ? text : "";
   if (param.kind == ParamKind::Bool) return ParamValue::ofInt(boolOf(held).value_or(0));
   if (param.kind == ParamKind::Choice) return ParamValue::ofInt(choiceOf(param, held).value_or(0));
-  return ParamValue::ofLayer(layerOf(held).value_or(refhost::kNoLayer));
+  std::optional<LayerName> layer = parseLayerName(held);
+  return ParamValue::ofLayer(trackGuid(layer && layers ? layers(*layer) : -1));
 }
 
 }  // namespace
 
+std::string_view trimmed(std::string_view text) {
+  while (!text.empty() && std::isspace(static_cast<unsigned char>(text.front())))
+    text.remove_prefix(1);
+  while (!text.empty() && std::isspace(static_cast<unsigned char>(text.back())))
+    text.remove_suffix(1);
+  return text;
+}
+
+std::vector<std::string_view> keyValues(std::string_view text) {
+  std::vector<std::string_view> values;
+  if (text.find('=') == std::string_view::npos) return {text};
+  while (!text.empty()) {
+    std::size_t end = text.find(';');
+    std::string_view item = text.substr(0, end);
+    if (!trimmed(item).empty()) {
+      std::size_t equals = item.find('=');
+      values.push_back(equals == std::string_view::npos ? item : item.substr(equals + 1));
+    }
+    if (end == std::string_view::npos) break;
+    text.remove_prefix(end + 1);
+  }
+  return values;
+}
+
 ParamReading readParams(mlt_properties properties, const refhost::ParamPanel& panel, int position,
-                        int length) {
+                        int length, const FrameSize& frame, const LayerResolver& layers) {
   ParamReading reading;
   reading.values.reserve(panel.params().size());
   for (const Param& param : panel.params()) {
@@ -221,7 +218,7 @@ ParamReading readParams(mlt_properties properties, const refhost::ParamPanel& pa
       reading.refusals.push_back(Refusal{param.id, text, *problem});
       reading.values.push_back(param.defaultValue);
     } else {
-      reading.values.push_back(valueAt(properties, param, position, length));
+      reading.values.push_back(valueAt(properties, param, position, length, frame, layers));
     }
   }
   return reading;

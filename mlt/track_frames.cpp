@@ -5,18 +5,21 @@
 
 namespace veltrane_mlt {
 
-mlt_producer multitrackTrack(mlt_service service, int index) {
+mlt_multitrack multitrackOf(mlt_service service) {
   // A tractor's field chains its filters and transitions one after another in front of the
   // multitrack; the first input of each leads down to it.
   for (int depth = 0; service && depth < 1000; ++depth) {
-    if (mlt_service_identify(service) == mlt_service_multitrack_type) {
-      mlt_multitrack multitrack = reinterpret_cast<mlt_multitrack>(service);
-      if (index < 0 || index >= mlt_multitrack_count(multitrack)) return nullptr;
-      return mlt_multitrack_track(multitrack, index);
-    }
+    if (mlt_service_identify(service) == mlt_service_multitrack_type)
+      return reinterpret_cast<mlt_multitrack>(service);
     service = mlt_service_producer(service);
   }
   return nullptr;
+}
+
+mlt_producer multitrackTrack(mlt_service service, int index) {
+  mlt_multitrack multitrack = multitrackOf(service);
+  if (!multitrack || index < 0 || index >= mlt_multitrack_count(multitrack)) return nullptr;
+  return mlt_multitrack_track(multitrack, index);
 }
 
 bool canSeek(mlt_producer producer) {
@@ -91,6 +94,20 @@ std::vector<uint8_t> pictureAt(mlt_producer producer, int32_t position, int32_t 
   }
   mlt_frame_close(frame);
   return picture;
+}
+
+const uint8_t* pictureOf(mlt_frame frame, int32_t width, int32_t height,
+                         std::vector<uint8_t>& resized) {
+  mlt_image_format format = mlt_image_rgba;
+  int frameWidth = width, frameHeight = height;
+  uint8_t* image = nullptr;
+  if (mlt_frame_get_image(frame, &image, &format, &frameWidth, &frameHeight, 0) || !image ||
+      format != mlt_image_rgba || frameWidth <= 0 || frameHeight <= 0)
+    return nullptr;
+  if (frameWidth == width && frameHeight == height) return image;
+  resized = refhost::resizedPixels(image, frameWidth, frameHeight, refhost::PixelFormat::Rgba8,
+                                   width, height);
+  return resized.data();
 }
 
 }  // namespace veltrane_mlt

@@ -17,6 +17,10 @@ struct TrackTime {
   int32_t length = 0;    // frames the producer plays
 };
 
+// The multitrack a transition (or a filter planted in a tractor) draws its frames from, found
+// by following the service's inputs; null when there is none.
+mlt_multitrack multitrackOf(mlt_service service);
+
 // Track `index` of the multitrack a transition (or a filter planted in a tractor) draws its
 // frames from, found by following the service's inputs; null when there is none.
 mlt_producer multitrackTrack(mlt_service service, int index);
@@ -34,5 +38,10 @@ bool clipCanSeek(mlt_frame frame);
 // deinterlaced as the consumer asked for `like` (the frame in hand), so that it matches it.
 std::vector<uint8_t> pictureAt(mlt_producer producer, int32_t position, int32_t width,
                                int32_t height, mlt_frame like);
+
+// The frame's picture as RGBA at width x height (stretched into `resized` when it comes at
+// another size); null when it has none.
+const uint8_t* pictureOf(mlt_frame frame, int32_t width, int32_t height,
+                         std::vector<uint8_t>& resized);
 
 }  // namespace veltrane_mlt

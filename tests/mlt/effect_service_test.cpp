@@ -36,7 +36,7 @@ class Filter {
     mlt_properties_set(MLT_FILTER_PROPERTIES(filter_), kModuleProperty, VELTRANE_MODULE_PATH);
     for (const auto& [name, value] : properties)
       mlt_properties_set(MLT_FILTER_PROPERTIES(filter_), name.c_str(), value.c_str());
-    effect_ = std::make_unique<EffectService>(MLT_FILTER_SERVICE(filter_), false, "the picture");
+    effect_ = std::make_unique<EffectService>(MLT_FILTER_SERVICE(filter_), "the picture");
   }
   ~Filter() {
     effect_.reset();
@@ -52,7 +52,7 @@ class Filter {
     request.compositionHeight = compositionHeight;
     request.own.current = picture.data();
     std::vector<uint8_t> out(picture.size());
-    EXPECT_TRUE(effect_->render(0, 1, request, out.data()));
+    EXPECT_TRUE(effect_->render(0, 1, tractorResolver(nullptr, -1), request, out.data()));
     return out;
   }
 

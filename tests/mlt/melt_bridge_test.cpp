@@ -52,12 +52,6 @@ TEST(MeltBridge, RendersWhatTheReferenceHostRenders) {
        "\"cutType\": \"Radial\", \"numberOfCuts\": 3, \"cutPosition_global\": [10, -5], "
        "\"cutDirection_0\": 30, \"cutDirection_1\": 150, \"cutDirection_2\": 270, "
        "\"inputFrameShift2\": -3, \"inputFrameShift3\": 4"},
-      {"a project as Kdenlive saves it", document("kdenlive_project.mlt"),
-       "\"numberOfCuts\": 2, \"cutPosition_1\": [-30, 10], \"cutDirection_1\": {\"keys\": "
-       "[[0, 100], [19, 140]]}, \"inputLayer1\": " +
-           lower +
-           ", \"inputFrameShift2\": -3, "
-           "\"borderColor\": [1, 1, 1]"},
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.name);
@@ -99,7 +93,7 @@ TEST(MeltBridge, RefusedValuesLogOnceAndRenderWithTheDefault) {
       {"borderWidth", "300", "expected a number from 0 to 200"},
       {"numberOfCuts", "two", "expected a whole number from 1 to 8"},
       {"cutType", "Diagonal", "expected one of Local, Radial"},
-      {"inputLayer1", "upper", "expected own or lower"},
+      {"inputLayer1", "upper", "expected own, lower, track:K"},
       {"cutDirection_0", "0=15;19=steep", "expected an angle in degrees"},
       {"borderColor", "pink", "expected a colour"},
       {"cutPosition_0", "10", "expected a point"},
@@ -181,14 +175,58 @@ TEST(MeltBridge, FindsTheModuleOrPassesTheUpperTrackThrough) {
   }
 }
 
-TEST(MeltBridge, AShiftIntoATrackThatCannotSeekShowsNoFrame) {
-  MeltRun melt = runMelt(
-      tractorDocument({{"inputFrameShift1", "-2"}}, "<property name=\"seekable\">0</property>"));
-  // What the effect shows where the host has no frame: the shift beyond the clip's start.
-  std::vector<refhost::RgbaImage> reference = renderScene(scene("\"inputFrameShift1\": -100000"));
-  ASSERT_EQ(melt.frames.size(), reference.size()) << melt.log;
-  for (std::size_t frame = 0; frame < reference.size(); frame += 6)
-    EXPECT_LE(largestDifference(melt.frames[frame], reference[frame]), kTolerance);
+// A track that cannot be sought (live capture) still shows, shifted back, the pictures it
+// played; ahead of them it has none, and the effect shows what it shows for a missing frame.
+TEST(MeltBridge, ATrackThatCannotSeekShowsWhatItPlayedAndNothingAhead) {
+  const std::pair<const char*, const char*> shifts[] = {{"-2", "-2"}, {"2", "-100000"}};
+  for (const auto& [shift, shown] : shifts) {
+    SCOPED_TRACE(std::string("shift ") + shift);
+    MeltRun melt = runMelt(
+        tractorDocument({{"inputFrameShift1", shift}}, "<property name=\"seekable\">0</property>"));
+    std::vector<refhost::RgbaImage> reference =
+        renderScene(scene(std::string("\"inputFrameShift1\": ") + shown));
+    ASSERT_EQ(melt.frames.size(), reference.size()) << melt.log;
+    for (std::size_t frame = 0; frame < reference.size(); frame += 3)
+      EXPECT_LE(largestDifference(melt.frames[frame], reference[frame]), kTolerance)
+          << "frame " << frame;
+  }
+}
+
+// Two pairs of tracks split, then joined by a composition whose every picture is its lower
+// input shifted: it shows the first pair's split, composited, three frames late or early
+// (kept pictures back, a copy of what lies below ahead), and nothing of the tracks it
+// consumed.
+TEST(MeltBridge, AShiftedLowerInputInAChainShowsWhatLiesBelowComposited) {
+  for (int shift : {-3, 3}) {
+    SCOPED_TRACE("shift " + std::to_string(shift));
+    const std::string upperTracks =
+        "<track producer=\"track2\"/><track producer=\"track3\"/>"
+        "<transition><property name=\"mlt_service\">veltrane</property>"
+        "<property name=\"a_track\">2</property><property name=\"b_track\">3</property>"
+        "<property name=\"layout\">horizontal-2</property>"
+        "<property name=\"inputLayer1\">lower</property></transition>";
+    const std::string joined =
+        "<transition><property name=\"mlt_service\">veltrane</property>"
+        "<property name=\"a_track\">0</property><property name=\"b_track\">2</property>"
+        "<property name=\"inputLayer0\">lower</property><property "
+        "name=\"inputLayer1\">lower</property>"
+        "<property name=\"inputFrameShift0\">" +
+        std::to_string(shift) +
+        "</property>"
+        "<property name=\"inputFrameShift1\">" +
+        std::to_string(shift) +
+        "</property>"
+        "<property name=\"borderWidth\">0</property></transition>";
+    MeltRun chain =
+        runMelt(document("chain.mlt", {{"@UPPER_TRACKS@", upperTracks}, {"@JOINED@", joined}}));
+    MeltRun below = runMelt(document("chain.mlt", {{"@UPPER_TRACKS@", ""}, {"@JOINED@", ""}}));
+    ASSERT_EQ(chain.status, 0) << chain.log;
+    ASSERT_EQ(chain.frames.size(), std::size_t(kFrames)) << chain.log;
+    ASSERT_EQ(below.frames.size(), std::size_t(kFrames)) << below.log;
+    for (int frame = std::max(0, -shift); frame < std::min(kFrames, kFrames - shift); ++frame)
+      EXPECT_LE(largestDifference(chain.frames[frame], below.frames[frame + shift]), kTolerance)
+          << "frame " << frame;
+  }
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 
 #include <climits>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <memory>
 #include <sstream>
@@ -28,10 +29,9 @@ void writeText(const std::string& path, const std::string& text) {
   std::ofstream(path, std::ios::binary) << text;
 }
 
-// Runs a program with the environment the bridge's tests give it: the build tree's MLT folders,
-// never the developer's own module, and `extra` variables over what is inherited.
-int run(const std::vector<std::string>& argv, const std::string& errPath,
-        const std::vector<std::string>& extra = {}) {
+// The environment the bridge's tests give a program: the build tree's MLT folders, never the
+// developer's own module, and `extra` variables over what is inherited.
+std::vector<std::string> environmentWith(const std::vector<std::string>& extra) {
   std::vector<std::string> environment = {std::string("MLT_REPOSITORY=") + VELTRANE_MLT_REPOSITORY,
                                           std::string("MLT_DATA=") + VELTRANE_MLT_DATA};
   environment.insert(environment.end(), extra.begin(), extra.end());
@@ -44,6 +44,12 @@ int run(const std::vector<std::string>& argv, const std::string& errPath,
     for (const std::string& given : environment) replaced |= named(given) == named(variable);
     if (!replaced) environment.push_back(variable);
   }
+  return environment;
+}
+
+int run(const std::vector<std::string>& argv, const std::string& errPath,
+        const std::vector<std::string>& extra = {}) {
+  const std::vector<std::string> environment = environmentWith(extra);
   testsupport::ChildProcess child(argv, "/dev/null", errPath, &environment);
   return child.wait(120);
 }
@@ -66,10 +72,12 @@ const char* const kLowerGuid = "d3e00000-0000-4000-8000-000000000001";
 
 const Clips& clips() {
   static const Clips made = [] {
-    Clips result{scratch().file("upper.mov"), scratch().file("lower.mov")};
+    Clips result{scratch().file("upper.mov"), scratch().file("lower.mov"),
+                 scratch().file("third.mov"), scratch().file("fourth.mov")};
     const std::string size = std::to_string(kWidth) + "x" + std::to_string(kHeight);
     for (const auto& [path, source] :
-         {std::pair{result.upper, "testsrc2"}, std::pair{result.lower, "mandelbrot"}}) {
+         {std::pair{result.upper, "testsrc2"}, std::pair{result.lower, "mandelbrot"},
+          std::pair{result.third, "smptebars"}, std::pair{result.fourth, "rgbtestsrc"}}) {
       if (run({"ffmpeg", "-v", "error", "-y", "-f", "lavfi", "-i",
                std::string(source) + "=size=" + size + ":rate=25", "-frames:v",
                std::to_string(kFrames), "-c:v", "png", path},
@@ -102,19 +110,65 @@ MeltRun runMelt(const std::string& document, const std::vector<std::string>& env
   variables.push_back("ASAN_OPTIONS=detect_leaks=0:intercept_tls_get_addr=0");
 #endif
   MeltRun result;
-  result.status =
-      run({"melt", folder.file("document.mlt"), "-consumer", "avformat:" + folder.file("out.rgba"),
-           "f=rawvideo", "vcodec=rawvideo", "pix_fmt=rgba"},
-          folder.file("melt.log"), variables);
-  result.log = readText(folder.file("melt.log"));
-  const std::string raw = readText(folder.file("out.rgba"));
+  const std::string out = folder.file("out.rgba");
+  const std::vector<std::string> whole = environmentWith(variables);
   const std::size_t frameBytes = std::size_t(kWidth) * kHeight * 4;
+  std::error_code ignored;
+  // melt 7.12 now and then stops reading frames while its main loop waits on for ever: once
+  // after the last frame, and, rarely on a busy machine, before the first (its consumer's
+  // thread gone, nothing written; or it ends at once, having written nothing). A run with every
+  // frame out and two seconds more is stopped and counts; one that wrote no frame (in a minute,
+  // or when it ended) is run once more. The log says which.
+  std::string retried;  // what the first run came to, when it was run again
+  for (int attempt = 0; attempt < 2; ++attempt) {
+    // Every frame rendered, however long one takes: a busy machine drops none.
+    testsupport::ChildProcess melt(
+        {"melt", folder.file("document.mlt"), "-consumer", "avformat:" + out, "f=rawvideo",
+         "vcodec=rawvideo", "pix_fmt=rgba", "real_time=-1"},
+        "/dev/null", folder.file("melt.log"), &whole);
+    int complete = 0;
+    int tenth = 0;
+    for (; tenth < 1200 && melt.pid() > 0; ++tenth) {
+      result.status = melt.wait(0.1);
+      const std::uintmax_t written = std::filesystem::file_size(out, ignored);
+      if (written >= kFrames * frameBytes && ++complete > 20) break;
+      if (tenth >= 600 && (written == 0 || written == std::uintmax_t(-1))) break;
+    }
+    result.log = readText(folder.file("melt.log"));
+    if (melt.pid() > 0 && complete > 20) {
+      result.status = 0;
+      result.log += "\n[melt went on waiting after the last frame and was stopped]";
+      break;
+    }
+    const std::uintmax_t written = std::filesystem::file_size(out, ignored);
+    if (attempt == 0 && (written == 0 || written == std::uintmax_t(-1))) {
+      retried =
+          "[melt wrote no frame (status " + std::to_string(result.status) + ") and ran again]";
+      continue;
+    }
+    if (result.status != 0) result.log += "\n[melt's status " + std::to_string(result.status) + "]";
+    break;
+  }
+  if (!retried.empty()) result.log += "\n" + retried;
+  const std::string raw = readText(out);
   for (std::size_t at = 0; frameBytes && at + frameBytes <= raw.size(); at += frameBytes) {
     refhost::RgbaImage frame(kWidth, kHeight);
     frame.pixels.assign(raw.begin() + at, raw.begin() + at + frameBytes);
     result.frames.push_back(std::move(frame));
   }
   return result;
+}
+
+std::string splitScene(const std::vector<std::string>& clips,
+                       const std::vector<std::string>& options) {
+  testsupport::ScratchDirectory folder;
+  std::vector<std::string> argv{VELTRANE_CLI_PATH, "split", "--plugin", VELTRANE_MODULE_PATH};
+  argv.insert(argv.end(), clips.begin(), clips.end());
+  argv.insert(argv.end(), options.begin(), options.end());
+  argv.insert(argv.end(), {"--save-scene", folder.file("scene.json")});
+  if (run(argv, folder.file("split.log")) != 0)
+    throw std::runtime_error("veltrane split failed: " + readText(folder.file("split.log")));
+  return readText(folder.file("scene.json"));
 }
 
 std::vector<refhost::RgbaImage> renderScene(const std::string& sceneText) {
@@ -149,6 +203,8 @@ std::string document(const std::string& name, const std::map<std::string, std::s
   std::map<std::string, std::string> all = marks;
   all["@LOWER@"] = clips().lower;
   all["@UPPER@"] = clips().upper;
+  all["@THIRD@"] = clips().third;
+  all["@FOURTH@"] = clips().fourth;
   for (const auto& [mark, value] : all) {
     for (std::size_t at; (at = text.find(mark)) != std::string::npos;)
       text.replace(at, mark.size(), value);

@@ -18,10 +18,13 @@ constexpr int kFrames = 20;
 
 // Two 20-frame clips stored losslessly as RGB (PNG in QuickTime), made once with FFmpeg's test
 // sources, so that melt and the reference host read exactly the same pixels: `upper` changes
-// every frame (a time shift shows), `lower` is another picture.
+// every frame (a time shift shows), `lower` is another picture; `third` and `fourth` fill the
+// tracks of a four-way split.
 struct Clips {
   std::string upper;
   std::string lower;
+  std::string third;
+  std::string fourth;
 };
 const Clips& clips();
 
@@ -37,6 +40,11 @@ struct MeltRun {
 // MLT_REPOSITORY and MLT_DATA pointing at the build tree's module folders; `environment` holds
 // more NAME=value variables for melt.
 MeltRun runMelt(const std::string& document, const std::vector<std::string>& environment = {});
+
+// The scene `veltrane split` makes of `clips` (the first the own source) with `options`
+// (e.g. {"--layout", "grid-2x2"}), as its --save-scene writes it.
+std::string splitScene(const std::vector<std::string>& clips,
+                       const std::vector<std::string>& options);
 
 // Renders `scene` (a scene document) with `veltrane render`, every frame.
 std::vector<refhost::RgbaImage> renderScene(const std::string& scene);

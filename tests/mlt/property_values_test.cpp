@@ -46,7 +46,8 @@ struct Case {
 };
 
 TEST(PropertyValues, ReadsOrRefusesEveryKind) {
-  const ParamValue lower = ParamValue::ofLayer(kLowerLayerGuid);
+  const ParamValue lower = ParamValue::ofLayer(trackGuid(4));
+  const ParamValue third = ParamValue::ofLayer(trackGuid(2));
   const Case cases[] = {
       {"width", nullptr, 0, ParamValue::ofFloat(2)},
       {"width", "", 0, ParamValue::ofFloat(2)},
@@ -65,7 +66,10 @@ TEST(PropertyValues, ReadsOrRefusesEveryKind) {
       {"angle", "0=15;10=75", 5, ParamValue::ofFloat(45)},
       {"angle", "north", 0, std::nullopt, "expected an angle in degrees"},
       {"point", "10 -20", 0, ParamValue::ofPoint(10, -20)},
-      {"point", "10 -20 30 40", 0, ParamValue::ofPoint(10, -20)},
+      {"point", "10 -20 0 0 1", 0, ParamValue::ofPoint(10, -20)},
+      // A 100x50 frame: a rectangle's centre, from the top-left corner, y down.
+      {"point", "0 0 100 50 1", 0, ParamValue::ofPoint(0, 0)},
+      {"point", "30 5 40 20", 0, ParamValue::ofPoint(0, 10)},
       {"point", "0=0 0;10=10 20", 5, ParamValue::ofPoint(5, 10)},
       {"point", "10", 0, std::nullopt, "expected a point"},
       {"colour", "#ff8000", 0, ParamValue::ofColor(1, 128 / 255.0f, 0)},
@@ -80,14 +84,32 @@ TEST(PropertyValues, ReadsOrRefusesEveryKind) {
       {"mode", "2", 0, std::nullopt, "expected one of Local, Radial or an index from 0 to 1"},
       {"layer", "own", 0, ParamValue::ofLayer(refhost::kNoLayer)},
       {"layer", "LOWER", 0, lower},
-      {"layer", "upper", 0, std::nullopt, "expected own or lower"},
+      {"layer", " Track:2 ", 0, third},
+      {"layer", "track:V3", 0, third},
+      {"layer", "0=own;6=track:2", 7, third},
+      {"layer", "track:12", 0, ParamValue::ofLayer(refhost::kNoLayer)},  // no such track
+      {"layer", "track:", 0, std::nullopt, "expected own, lower, track:K"},
+      {"layer", "upper", 0, std::nullopt, "expected own, lower, track:K"},
   };
   const refhost::ParamPanel declared = panel();
   for (const Case& c : cases) {
     SCOPED_TRACE(std::string(c.id) + " = " + (c.text ? c.text : "(unset)"));
     mlt_properties properties = mlt_properties_new();
     if (c.text) mlt_properties_set(properties, c.id, c.text);
-    ParamReading reading = readParams(properties, declared, c.position, 11);
+    // Five tracks, "lower" the fifth; names stand for the track two.
+    const LayerResolver tracks = [](const LayerName& name) {
+      switch (name.kind) {
+        case LayerName::Kind::Lower:
+          return 4;
+        case LayerName::Kind::TrackIndex:
+          return name.track < 5 ? name.track : -1;
+        case LayerName::Kind::TrackName:
+          return name.trackName == "V3" ? 2 : -1;
+        default:
+          return -1;
+      }
+    };
+    ParamReading reading = readParams(properties, declared, c.position, 11, {100, 50}, tracks);
     const Param& p = *declared.find(std::string_view(c.id));
     const ParamValue& value =
         reading.values.at(static_cast<std::size_t>(&p - &declared.params()[0]));
