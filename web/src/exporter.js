@@ -20,8 +20,14 @@ const kContainers = {
 
 // Options: container "mp4" (default) or "webm", first and last frame (the whole composition by
 // default), audio (default true). `onProgress({done, total, fps, secondsLeft})` is told after
-// every frame; `signal` (an AbortSignal) cancels.
-export async function exportVideo(page, options = {}, onProgress = () => {}, signal = null) {
+// every frame; `signal` (an AbortSignal) cancels. The export has the page to itself from the
+// moment it is asked for: it starts once the scene opening before it is open, and the page's
+// preview waits until it ends, so every frame it reads is one it rendered itself.
+export function exportVideo(page, options = {}, onProgress = () => {}, signal = null) {
+  return page.exclusive((render) => encode(page, render, options, onProgress, signal));
+}
+
+async function encode(page, render, options, onProgress, signal) {
   const container = kContainers[options.container ?? 'mp4'];
   if (!container) throw new PageProblem(`export: container "${options.container}": expected "mp4" or "webm"`);
   const { width, height, fps, duration } = page.info;
@@ -42,18 +48,17 @@ export async function exportVideo(page, options = {}, onProgress = () => {}, sig
   const times = Array.from({ length: total }, (_, i) => page.frameSeconds(first + i));
   page.media.startSequence(times);
   const started = performance.now();
+  const shown = page.session.frame();
   try {
     for (let i = 0; i < total; ++i) {
       if (signal?.aborted) throw new DOMException('export cancelled', 'AbortError');
       await page.media.advance();
-      await page.render(first + i, 1);
       // The frame copies the picture out of the WebAssembly's memory once; the sample wraps it.
-      const frame = new VideoFrame(page.pictureView().data, {
-        format: 'RGBA',
-        codedWidth: width,
-        codedHeight: height,
-        timestamp: 0,
-      });
+      const frame = await render(
+        first + i,
+        1,
+        ({ data }) => new VideoFrame(data, { format: 'RGBA', codedWidth: width, codedHeight: height, timestamp: 0 }),
+      );
       const sample = new VideoSample(frame, { timestamp: page.frameSeconds(i), duration: page.frameSeconds(1) });
       await video.add(sample);
       sample.close();
@@ -74,6 +79,7 @@ export async function exportVideo(page, options = {}, onProgress = () => {}, sig
     await output.cancel();
     throw error;
   } finally {
+    page.session.setFrame(shown);
     await page.media.stopSequence();
   }
   return new Blob([output.target.buffer], { type: container.type });

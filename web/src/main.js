@@ -171,6 +171,8 @@ class Controller {
   }
 
   key(event, down) {
+    // An export renders the values as they were when it started: no undo or step meanwhile.
+    if (this.exporting) return;
     const typing = ['INPUT', 'SELECT', 'TEXTAREA'].includes(document.activeElement?.tagName);
     if (down && (event.ctrlKey || event.metaKey) && event.key.toLowerCase() === 'z' && !typing) {
       event.preventDefault();
@@ -202,6 +204,7 @@ class Controller {
     const link = $('export-download');
     const controller = new AbortController();
     this.exporting = controller;
+    if (this.playing) this.play(); // the export has the page to itself: playing would only wait
     $('export-start').disabled = true;
     link.hidden = true;
     const options = { container: $('export-container').value, audio: $('export-audio').checked };

@@ -1,6 +1,7 @@
 // The page's scene: the WebAssembly session in the canvas's context, the media the scene names,
 // and the renders (decoding what a render missed and rendering again). Opening anything that
-// fails leaves the open scene as it was and throws one line naming the file.
+// fails leaves the open scene as it was and throws one line naming the file. Openings, renders
+// and exports take turns on the session, so that none of them sees another's scene or picture.
 import createVeltrane from '../veltrane.js';
 import { installWebGlSeams } from './webgl_seams.js';
 import { MediaLibrary, MediaProblem, kVideoKind } from './media.js';
@@ -48,12 +49,29 @@ export class Page {
     this.folder = null;
     this.opened = 0;
     this.sourcePath = null; // the effect's own source, when it is a file: the sound of exports
+    this.turns = Promise.resolve(); // settles when the last task given a turn has ended
+  }
+
+  // ---- Turns -----------------------------------------------------------------------------------
+  // Runs `task` once every task given a turn before it has ended, and gives the next its turn
+  // when it ends. A render awaits its clips' decoding, and an export awaits its encoder between
+  // renders: the other work of the page (the preview, playing, a scene opening) waits meanwhile,
+  // so a picture is read from the render that made it, of the scene the task started with.
+  // `task(render)` renders with `render(n, divisor, read)` in its own turn.
+  exclusive(task) {
+    const turn = this.turns.then(() => task((n, divisor, read) => this.#render(n, divisor, read)));
+    this.turns = turn.catch(() => {});
+    return turn;
   }
 
   // ---- Opening ---------------------------------------------------------------------------------
   // A scene document (object or text) named `name`; its file sources come from `files` (name ->
   // Blob) or, failing that, are fetched relative to `baseUrl`.
-  async openScene(scene, { name = 'scene.json', files = new Map(), baseUrl = null } = {}) {
+  openScene(scene, options) {
+    return this.exclusive(() => this.#openScene(scene, options));
+  }
+
+  async #openScene(scene, { name = 'scene.json', files = new Map(), baseUrl = null } = {}) {
     const text = typeof scene === 'string' ? scene : JSON.stringify(scene, null, 2);
     let document = null;
     try {
@@ -85,11 +103,13 @@ export class Page {
     return this.info;
   }
 
-  async openUrl(url) {
-    const response = await fetch(url);
-    if (!response.ok) throw new PageProblem(`${url}: cannot be read (${response.status})`);
-    const name = baseName(new URL(url, location.href).pathname) || 'scene.json';
-    return this.openScene(await response.text(), { name, baseUrl: new URL(url, location.href) });
+  openUrl(url) {
+    return this.exclusive(async () => {
+      const response = await fetch(url);
+      if (!response.ok) throw new PageProblem(`${url}: cannot be read (${response.status})`);
+      const name = baseName(new URL(url, location.href).pathname) || 'scene.json';
+      return this.#openScene(await response.text(), { name, baseUrl: new URL(url, location.href) });
+    });
   }
 
   async fetchFile(file, baseUrl) {
@@ -101,8 +121,11 @@ export class Page {
   // Clips and photos dropped together (at most nine): the first is the effect's own source,
   // the others layers, the composition sized and timed as `veltrane split` makes it, each
   // picture kept at its proportions and framed on its region of the default layout.
-  async openClips(fileList) {
-    const clips = [...fileList];
+  openClips(fileList) {
+    return this.exclusive(() => this.#openClips([...fileList]));
+  }
+
+  async #openClips(clips) {
     if (clips.length > kMostClips) {
       throw new PageProblem(
         `${clips.length} files dropped: at most ${kMostClips} clips or photos (one for each input)`,
@@ -148,7 +171,7 @@ export class Page {
       params: {},
     };
     const files = new Map(clips.map((clip) => [clip.name, clip]));
-    await this.openScene(scene, { name: 'split.json', files });
+    await this.#openScene(scene, { name: 'split.json', files });
     this.applyLayout(this.info.layouts.findIndex((l) => l.name === this.info.defaultLayout));
     // Every layer input shows one clip: the layout chose which region shows which.
     return this.info;
@@ -195,11 +218,21 @@ export class Page {
     this.session.setCanvasSize(width, height, density);
   }
 
-  // Renders frame `n` at 1 / divisor of its size, decoding what it missed and rendering again.
-  async render(n, divisor = 1) {
-    this.session.setFrame(n);
+  // Renders frame `n` at 1 / divisor of its size in a turn of its own; resolves to what
+  // `read(picture)` makes of the picture, when given (see #render).
+  render(n, divisor = 1, read = null) {
+    return this.exclusive((render) => render(n, divisor, read));
+  }
+
+  // Renders frame `n` at 1 / divisor of its size, decoding what it missed and rendering again,
+  // and returns `read({width, height, data})` when given (the picture is read back only then):
+  // RGBA bytes, top row first, in a view of the WebAssembly's memory that is valid only while
+  // `read` runs (the next call into the WebAssembly may move its memory).
+  async #render(n, divisor, read) {
     let failure = '';
     for (let attempt = 0; attempt < kMostRenderAttempts; ++attempt) {
+      // Set at each attempt: the timeline moves the frame while the clips are decoded.
+      this.session.setFrame(n);
       this.media.beginRender();
       failure = this.session.render(divisor);
       const misses = this.media.takeMisses();
@@ -207,6 +240,7 @@ export class Page {
       await this.media.prepare(misses);
     }
     if (failure) throw new PageProblem(failure);
+    return read ? read(this.#pictureView()) : undefined;
   }
 
   // Where composition frame `n` lies in seconds, exactly as the host computes it from the
@@ -220,15 +254,7 @@ export class Page {
     this.session.present();
   }
 
-  // The picture last rendered: RGBA bytes, top row first.
-  picture() {
-    const { width, height, data } = this.pictureView();
-    return { width, height, data: new Uint8Array(data) };
-  }
-
-  // The same as a view of the WebAssembly's memory, without a copy: valid until the next call
-  // into it (an export hands it to the encoder, which copies it at once).
-  pictureView() {
+  #pictureView() {
     const width = this.session.pictureWidth();
     const height = this.session.pictureHeight();
     return { width, height, data: this.session.readPicture() };
