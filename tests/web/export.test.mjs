@@ -1,11 +1,13 @@
 // Clips opened in the page as a person opens them (the file chooser) and exported in both
 // containers: FFmpeg's probe reads back the size, frame count, rate and the first clip's sound.
+// The export is asked for in the step that gives the clips and starts playing: it must export
+// the clips' scene, not the one open before, while the preview keeps asking for renders.
 // Nothing is fetched from anywhere while the page works.
 import assert from 'node:assert/strict';
 import { execFileSync } from 'node:child_process';
-import { mkdtempSync, rmSync, writeFileSync } from 'node:fs';
+import { mkdtempSync, readFileSync, rmSync, writeFileSync } from 'node:fs';
 import { tmpdir } from 'node:os';
-import { join } from 'node:path';
+import { basename, join } from 'node:path';
 import { after, before, test } from 'node:test';
 import { openPage } from '../../web/headless.mjs';
 
@@ -33,9 +35,6 @@ before(async () => {
     'sine=frequency=440:duration=2', '-c:v', 'libx264', '-pix_fmt', 'yuv420p', '-c:a', 'aac', '-shortest', clips[0]);
   ffmpeg('-f', 'lavfi', '-i', 'smptebars=size=256x256:rate=30:duration=3', '-c:v', 'libx264', '-pix_fmt', 'yuv420p', clips[1]);
   browser = await openPage();
-  const chooser = await browser.page.$('#open-clips');
-  await chooser.uploadFile(...clips);
-  await browser.page.waitForFunction(() => window.veltrane.info()?.layers.length === 3, { timeout: 30000 });
 });
 after(async () => {
   await browser?.close();
@@ -48,15 +47,33 @@ const containers = [
 ];
 
 for (const { container, video } of containers) {
-  test(`two clips export as ${container} with the first clip's size, length, rate and sound`, async () => {
+  test(`two clips exported as ${container} as they open: the first one's size, length, rate and sound`, async () => {
+    // A scene of another size and length open before, which an export that did not wait for
+    // the clips would write.
+    await browser.page.evaluate(() =>
+      window.veltrane.open({ width: 64, height: 36, fps: 25, duration: 5, source: { pattern: 'bars' } }),
+    );
     const loadedRequests = browser.requests.length;
-    const base64 = await browser.page.evaluate(async (format) => {
-      const blob = await window.veltrane.export({ container: format });
-      const bytes = new Uint8Array(await blob.arrayBuffer());
-      let text = '';
-      for (let i = 0; i < bytes.length; i += 0x8000) text += String.fromCharCode(...bytes.subarray(i, i + 0x8000));
-      return btoa(text);
-    }, container);
+    const files = clips.map((file) => ({ name: basename(file), base64: readFileSync(file).toString('base64') }));
+    const base64 = await browser.page.evaluate(async (format, files) => {
+      const chooser = document.getElementById('open-clips');
+      const transfer = new DataTransfer();
+      for (const { name, base64 } of files) {
+        transfer.items.add(new File([Uint8Array.from(atob(base64), (c) => c.charCodeAt(0))], name));
+      }
+      chooser.files = transfer.files;
+      document.getElementById('play').click();
+      chooser.dispatchEvent(new Event('change'));
+      try {
+        const blob = await window.veltrane.export({ container: format });
+        const bytes = new Uint8Array(await blob.arrayBuffer());
+        let text = '';
+        for (let i = 0; i < bytes.length; i += 0x8000) text += String.fromCharCode(...bytes.subarray(i, i + 0x8000));
+        return btoa(text);
+      } finally {
+        document.getElementById('play').click();
+      }
+    }, container, files);
     const file = join(scratch, `split.${container}`);
     writeFileSync(file, Buffer.from(base64, 'base64'));
     const streams = probe(file);
