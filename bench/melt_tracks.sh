@@ -59,12 +59,12 @@ for run in $(seq "$runs"); do
       -consumer avformat:ms.mp4 real_time=-2 "${melt_h264[@]}"
   done
   for shift in 0 +25; do
-    measure_frames=100 measure render-shift$shift rs.mp4 "$build_dir/bin/veltrane" render \
+    measure_frames=100 measure render-shift$shift rs.mp4 "$build_dir/bin/veltrane" render -y \
       --plugin "$build_dir/lib/veltrane.so" small-shift${shift#+}.json -o rs.mp4 --no-audio --quiet
   done
   measure_frames=100 measure melt-grid-4 mg.mp4 melt small-grid.mlt -consumer avformat:mg.mp4 \
     real_time=-2 "${melt_h264[@]}"
-  measure_frames=100 measure render-grid-4 rg.mp4 "$build_dir/bin/veltrane" render \
+  measure_frames=100 measure render-grid-4 rg.mp4 "$build_dir/bin/veltrane" render -y \
     --plugin "$build_dir/lib/veltrane.so" small-grid.json -o rg.mp4 --no-audio --quiet
 done
 names+=(melt-shift0 melt-shift+25 melt-shift-25 render-shift0 render-shift+25 melt-grid-4

@@ -1,9 +1,10 @@
 // The MLT module: registers the transition and the filter named "veltrane" and the metadata
-// that editors read to list them.
+// that editors read to list them, and guards the start of the encoder they render with.
 #include <framework/mlt.h>
 
 #include <string>
 
+#include "consumer_start_guard.h"
 #include "mlt_services.h"
 
 namespace {
@@ -34,4 +35,7 @@ extern "C" __attribute__((visibility("default"))) MLT_REPOSITORY {
                         const_cast<char*>("transition_veltrane.yml"));
   MLT_REGISTER_METADATA(mlt_service_filter_type, kServiceName, metadata,
                         const_cast<char*>("filter_veltrane.yml"));
+  // MLT loads every module of its repository when it starts, so this guards every melt job, and
+  // every render of an editor, in a process that has the module installed.
+  veltrane_mlt::guardEncoderStarts();
 }

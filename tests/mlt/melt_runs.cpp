@@ -1,17 +1,17 @@
 // melt and `veltrane render` as the bridge's tests run them.
 #include "melt_runs.h"
 
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <chrono>
 #include <climits>
 #include <cstdlib>
-#include <filesystem>
 #include <fstream>
-#include <memory>
 #include <sstream>
 #include <stdexcept>
 
 #include "refhost/media/image_files.h"
-#include "support/child_process.h"
-#include "support/temp_paths.h"
 
 extern char** environ;
 
@@ -99,64 +99,63 @@ std::vector<std::string> MeltRun::bridgeLines() const {
   return lines;
 }
 
-MeltRun runMelt(const std::string& document, const std::vector<std::string>& environment) {
-  testsupport::ScratchDirectory folder;
-  writeText(folder.file("document.mlt"), document);
+// How long a melt run may take, counted from its start: many times what the slowest run here
+// takes on a busy machine.
+constexpr int kLongestSeconds = 120;
+
+MeltJob::MeltJob(const std::string& document, const std::vector<std::string>& environment) {
+  writeText(folder_.file("document.mlt"), document);
   std::vector<std::string> variables = environment;
 #ifdef VELTRANE_MELT_PRELOAD
-  // A sanitized module in melt: the runtime goes first, and what MLT itself keeps at exit is
-  // not the module's to answer for.
-  variables.push_back(std::string("LD_PRELOAD=") + VELTRANE_MELT_PRELOAD);
+  // A sanitized module in melt: the runtime goes first, before what a test preloads, and what
+  // MLT itself keeps at exit is not the module's to answer for.
+  std::string preload = VELTRANE_MELT_PRELOAD;
+  const auto preloads = [](const std::string& variable) {
+    return variable.rfind("LD_PRELOAD=", 0) == 0;
+  };
+  for (const std::string& variable : variables)
+    if (preloads(variable)) preload += " " + variable.substr(variable.find('=') + 1);
+  variables.erase(std::remove_if(variables.begin(), variables.end(), preloads), variables.end());
+  variables.push_back("LD_PRELOAD=" + preload);
   variables.push_back("ASAN_OPTIONS=detect_leaks=0:intercept_tls_get_addr=0");
 #endif
-  MeltRun result;
-  const std::string out = folder.file("out.rgba");
   const std::vector<std::string> whole = environmentWith(variables);
+  deadline_ = Clock::now() + std::chrono::seconds(kLongestSeconds);
+  // Every frame rendered, however long one takes: a busy machine drops none.
+  melt_ = std::make_unique<testsupport::ChildProcess>(
+      std::vector<std::string>{"melt", folder_.file("document.mlt"), "-consumer",
+                               "avformat:" + folder_.file("out.rgba"), "f=rawvideo",
+                               "vcodec=rawvideo", "pix_fmt=rgba", "real_time=-1"},
+      "/dev/null", folder_.file("melt.log"), &whole);
+}
+
+MeltRun MeltJob::finish() {
+  const double left = std::chrono::duration<double>(deadline_ - Clock::now()).count();
+  MeltRun result;
+  const int status = melt_->wait(std::max(0.0, left));
+  const bool ended = melt_->pid() <= 0;
+  melt_.reset();  // stops melt if it is still running
+  result.log = readText(folder_.file("melt.log"));
+  if (!ended)
+    result.log +=
+        "\n[melt did not end in " + std::to_string(kLongestSeconds) + " s and was stopped]";
+  else if (status != 0)
+    result.log += "\n[melt's status " + std::to_string(status) + "]";
+  const std::string raw = readText(folder_.file("out.rgba"));
   const std::size_t frameBytes = std::size_t(kWidth) * kHeight * 4;
-  std::error_code ignored;
-  // melt 7.12 now and then stops reading frames while its main loop waits on for ever: once
-  // after the last frame, and, rarely on a busy machine, before the first (its consumer's
-  // thread gone, nothing written; or it ends at once, having written nothing). A run with every
-  // frame out and two seconds more is stopped and counts; one that wrote no frame (in a minute,
-  // or when it ended) is run once more. The log says which.
-  std::string retried;  // what the first run came to, when it was run again
-  for (int attempt = 0; attempt < 2; ++attempt) {
-    // Every frame rendered, however long one takes: a busy machine drops none.
-    testsupport::ChildProcess melt(
-        {"melt", folder.file("document.mlt"), "-consumer", "avformat:" + out, "f=rawvideo",
-         "vcodec=rawvideo", "pix_fmt=rgba", "real_time=-1"},
-        "/dev/null", folder.file("melt.log"), &whole);
-    int complete = 0;
-    int tenth = 0;
-    for (; tenth < 1200 && melt.pid() > 0; ++tenth) {
-      result.status = melt.wait(0.1);
-      const std::uintmax_t written = std::filesystem::file_size(out, ignored);
-      if (written >= kFrames * frameBytes && ++complete > 20) break;
-      if (tenth >= 600 && (written == 0 || written == std::uintmax_t(-1))) break;
-    }
-    result.log = readText(folder.file("melt.log"));
-    if (melt.pid() > 0 && complete > 20) {
-      result.status = 0;
-      result.log += "\n[melt went on waiting after the last frame and was stopped]";
-      break;
-    }
-    const std::uintmax_t written = std::filesystem::file_size(out, ignored);
-    if (attempt == 0 && (written == 0 || written == std::uintmax_t(-1))) {
-      retried =
-          "[melt wrote no frame (status " + std::to_string(result.status) + ") and ran again]";
-      continue;
-    }
-    if (result.status != 0) result.log += "\n[melt's status " + std::to_string(result.status) + "]";
-    break;
-  }
-  if (!retried.empty()) result.log += "\n" + retried;
-  const std::string raw = readText(out);
-  for (std::size_t at = 0; frameBytes && at + frameBytes <= raw.size(); at += frameBytes) {
+  for (std::size_t at = 0; at + frameBytes <= raw.size(); at += frameBytes) {
     refhost::RgbaImage frame(kWidth, kHeight);
     frame.pixels.assign(raw.begin() + at, raw.begin() + at + frameBytes);
     result.frames.push_back(std::move(frame));
   }
+  EXPECT_TRUE(ended && status == 0 && result.frames.size() == std::size_t(kFrames))
+      << "melt wrote " << result.frames.size() << " of " << kFrames << " frames\n"
+      << result.log;
   return result;
+}
+
+MeltRun runMelt(const std::string& document, const std::vector<std::string>& environment) {
+  return MeltJob(document, environment).finish();
 }
 
 std::string splitScene(const std::vector<std::string>& clips,

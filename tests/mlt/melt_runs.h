@@ -2,11 +2,15 @@
 // scenes they should equal, for the bridge's tests.
 #pragma once
 
+#include <chrono>
 #include <map>
+#include <memory>
 #include <string>
 #include <vector>
 
 #include "refhost/media/rgba_image.h"
+#include "support/child_process.h"
+#include "support/temp_paths.h"
 
 namespace mlttest {
 
@@ -29,16 +33,31 @@ struct Clips {
 const Clips& clips();
 
 struct MeltRun {
-  int status = -1;
   std::string log;                         // what melt wrote to standard error
   std::vector<refhost::RgbaImage> frames;  // the raw RGBA it rendered
   // The log lines that mention the bridge's services.
   std::vector<std::string> bridgeLines() const;
 };
 
-// Renders `document` (MLT XML) with melt to raw RGBA at the document's profile size,
-// MLT_REPOSITORY and MLT_DATA pointing at the build tree's module folders; `environment` holds
-// more NAME=value variables for melt.
+// melt rendering `document` (MLT XML) to raw RGBA at the document's profile size, started in
+// the background so that several can run at once, MLT_REPOSITORY and MLT_DATA pointing at the
+// build tree's module folders; `environment` holds more NAME=value variables for melt.
+class MeltJob {
+ public:
+  explicit MeltJob(const std::string& document, const std::vector<std::string>& environment = {});
+
+  // Waits for melt. A run that does not end by itself within two minutes of its start, with
+  // status 0 and every frame written, fails the calling test, with melt's log.
+  MeltRun finish();
+
+ private:
+  using Clock = std::chrono::steady_clock;
+  testsupport::ScratchDirectory folder_;
+  Clock::time_point deadline_;
+  std::unique_ptr<testsupport::ChildProcess> melt_;
+};
+
+// A melt job, waited for.
 MeltRun runMelt(const std::string& document, const std::vector<std::string>& environment = {});
 
 // The scene `veltrane split` makes of `clips` (the first the own source) with `options`
