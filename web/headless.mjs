@@ -59,9 +59,34 @@ export async function openPage({ width = 1400, height = 860, served = [] } = {})
     });
   } catch (error) {
     server.close();
-    rmSync(profile, { recursive: true, force: true });
+    removeProfile(profile);
     throw new Error(`Chromium did not start: ${error.message}`);
   }
+  // Whatever fails from here on closes the browser first, so that the error is the page's and
+  // no Chromium is left running.
+  const close = async () => {
+    await browser.close().catch(() => {});
+    server.close();
+    removeProfile(profile);
+  };
+  try {
+    return await openedPage(browser, server, close, { width, height });
+  } catch (error) {
+    await close();
+    throw error;
+  }
+}
+
+// Chromium's last writes into its profile can come after its process has gone: a few tries.
+function removeProfile(profile) {
+  try {
+    rmSync(profile, { recursive: true, force: true, maxRetries: 5, retryDelay: 100 });
+  } catch {
+    // A profile left in the temporary folder is no reason to fail what ran.
+  }
+}
+
+async function openedPage(browser, server, close, { width, height }) {
   const page = await browser.newPage();
   await page.setViewport({ width, height });
   const problems = [];
@@ -87,10 +112,6 @@ export async function openPage({ width = 1400, height = 860, served = [] } = {})
     origin,
     problems,
     requests,
-    async close() {
-      await browser.close();
-      server.close();
-      rmSync(profile, { recursive: true, force: true });
-    },
+    close,
   };
 }
