@@ -1,6 +1,5 @@
-// Fuzzes the split geometry with arbitrary parameter values (NaN, infinities, huge angles, odd cut
-// counts and frame sizes): parameters -> cut list -> regions -> segments -> input placement. It
-// must neither crash, hang, read out of bounds nor break the bounds of its results.
+// Fuzzes the geometry path with arbitrary parameter values and frame sizes: it must neither crash,
+// hang nor read out of bounds, and its results must keep their bounds.
 #include <fuzzer/FuzzedDataProvider.h>
 
 #include <cstdint>

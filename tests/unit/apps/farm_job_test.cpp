@@ -1,8 +1,5 @@
-// A job divided into chunks and joined again: chunks rendered apart and assembled equal a single
-// render of the job (frame for frame with FFV1, within the codec's loss with H.264 and H.265;
-// timestamps and sound alike), with time shifts and a layer that cross the chunks' boundaries
-// and a chunk of one frame; a chunk that does not fit is refused in one line with nothing
-// written, and rendering it again gives the clean result.
+// A job divided into chunks and assembled equals a single render of it; a chunk that does not fit
+// is refused in one line with nothing written, and rendering it again gives the clean result.
 #include <gtest/gtest.h>
 #include <signal.h>
 

@@ -1,7 +1,5 @@
-// How `veltrane render` writes its outputs: each codec in the containers that hold it, at the
-// depth asked, converted with the scene's colour and tagged with it (read back by ffprobe and
-// decoded by ffmpeg), deep stills; and the settings it refuses, in one line and before
-// anything is written.
+// How `veltrane render` writes its outputs: each codec at the depth asked, converted and tagged
+// with the scene's colour; and the settings it refuses, in one line before anything is written.
 #include <gtest/gtest.h>
 
 #include <cmath>

@@ -1,7 +1,5 @@
-// `veltrane split` end to end: the frames a split renders are the frames `render` makes of the
-// scene it saves, clips of other proportions keep theirs, a layout with more regions than clips
-// says so, clips are read as FFmpeg reads them (rates, photos, damage), and bad input is one
-// line with status 2 and nothing written.
+// `veltrane split` end to end: what it renders is what `render` makes of the scene it saves; clips
+// are read as FFmpeg reads them; bad input is one line with status 2 and nothing written.
 #include <gtest/gtest.h>
 
 #include <filesystem>

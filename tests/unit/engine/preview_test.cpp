@@ -1,6 +1,5 @@
-// Previews: the frame rendered at half its size, with every value in frame pixels scaled to
-// match, shows the full render scaled down: scaled back up it matches the full render but for
-// the pixels along the borders' edges, which half as many pixels draw more coarsely.
+// A preview rendered at half size with every pixel value scaled to match, scaled back up, matches
+// the full render but along the edges, which half as many pixels draw more coarsely.
 #include <gtest/gtest.h>
 
 #include <algorithm>

@@ -1,6 +1,5 @@
-// The render loop through the engine: pictures reach the sink in order as single renders give
-// them, the texture pool stops growing, decoding ahead gives the wrapped source's frames in any
-// order of asking, and a failure anywhere stops the run with its own message, leaving nothing.
+// The render loop through the engine: pictures reach the sink in order, decoding ahead gives the
+// source's frames in any order, and a failure anywhere stops the run leaving nothing.
 #include "refhost/engine/render_loop.h"
 
 #include <gtest/gtest.h>

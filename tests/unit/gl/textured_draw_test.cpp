@@ -1,6 +1,5 @@
-// Textured draws on Mesa through the reference host: the frame quad through the copy program,
-// and the split-screen sample stage compared, pixel by pixel, with a CPU model of its formula
-// (the border combine is checked through the whole render).
+// Textured draws on Mesa: the frame quad through the copy program, and the split-screen sample
+// stage compared pixel by pixel with a CPU model of its formula.
 #include <gtest/gtest.h>
 
 #include <cmath>

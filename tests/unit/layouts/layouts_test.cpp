@@ -1,6 +1,5 @@
-// The split layouts: every layout's pictures land on the regions the module reports for it, the
-// framing is the smallest that covers each region, and the choices people make of layouts are
-// checked.
+// The split layouts: each layout's pictures land on the regions the module reports, framed at
+// the smallest scale that covers them, and the names people give are understood.
 #include "layouts/layouts.h"
 
 #include <gtest/gtest.h>

@@ -1,6 +1,5 @@
-// Host resources with a real GL context: textures, buffers and the vertex array handed to the
-// plug-in and their accounting, the texture pool; frame fetches, layer states and timing, with
-// refusals. (That a render gives everything back is checked through the module.)
+// Host resources with a real GL context: textures, buffers and the vertex array and their
+// accounting, the texture pool, frame fetches and layer queries, with refusals.
 #include <GL/glew.h>
 #include <gtest/gtest.h>
 

@@ -1,6 +1,5 @@
-// Generated pictures keep the promises the tests that use them rely on, at every size, and the
-// counter's code block reads back its frame; frame sources hand GL its rows bottom first (a
-// moving source's upright frames are read back through the render context).
+// Generated pictures keep the promises the tests rely on at every size, the counter's code reads
+// back its frame, and frame sources hand GL the bottom row first.
 #include "refhost/media/test_patterns.h"
 
 #include <gtest/gtest.h>
