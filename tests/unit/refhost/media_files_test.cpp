@@ -1,12 +1,9 @@
-// Media on disk: stills written and read back exactly or within their depth's precision,
-// videos of odd sizes written and read back, deep pictures keeping more than 8 bits through a
-// 10-bit video, and the kinds of output their names choose. (What appears on disk, and when, is
-// checked through the command line.)
+// Media on disk: stills and videos written and read back within their depth's precision, odd
+// sizes padded, and the kinds of output their names choose.
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cmath>
-#include <cstdio>
 #include <cstring>
 #include <fstream>
 #include <set>
@@ -17,11 +14,13 @@
 #include "refhost/media/video_reader.h"
 #include "refhost/pipeline/frame_output.h"
 #include "refhost/pipeline/video_writer.h"
+#include "support/files.h"
 #include "support/temp_paths.h"
 
 namespace refhost {
 namespace {
 
+using testsupport::commandOutput;
 using testsupport::ScratchDirectory;
 
 // Counter frames first .. first + frames - 1 at 25 fps, handed over as `pictures` and encoded
@@ -34,17 +33,6 @@ void writeCounterVideo(const std::string& path, VideoContainer container, int32_
   for (int32_t i = first; i < first + frames; ++i)
     writer.write(converted(generatePattern(Pattern::Counter, i, width, height), pictures));
   writer.finish();
-}
-
-// What a command prints on stdout, as bytes.
-std::string commandOutput(const std::string& command) {
-  std::string bytes;
-  if (FILE* pipe = popen(command.c_str(), "r")) {
-    char buffer[65536];
-    for (std::size_t n; (n = fread(buffer, 1, sizeof buffer, pipe)) > 0;) bytes.append(buffer, n);
-    pclose(pipe);
-  }
-  return bytes;
 }
 
 // Grey rising from black to white over `width` columns in steps a half float keeps apart,
