@@ -27,22 +27,14 @@ class ViewerGestures : public LoadedPlugin {
     host().setValue("cutType", ParamValue::ofInt(1));
     host().setValue("numberOfCuts", ParamValue::ofInt(cuts));
   }
-  std::vector<refhost::ParamState> snapshot() {
-    std::vector<refhost::ParamState> states;
-    for (const refhost::Param& param : host().panel().params()) states.push_back(param.state);
-    return states;
-  }
-  CursorShape lastCursor() {
-    return static_cast<CursorShape>(host().cursorShapes().empty() ? -1
-                                                                  : host().cursorShapes().back());
-  }
+  CursorShape lastCursor() { return static_cast<CursorShape>(host().lastCursor()); }
 
   std::unique_ptr<ViewerEvents> viewer_;
 };
 
 TEST_F(ViewerGestures, DraggingACutLineMovesItParallelToItself) {
   setCut(0, 0.0f, 0.0f, 0.0f);  // vertical line through the centre, corner x = 80
-  const auto before = snapshot();
+  const auto before = host().paramStates();
   ASSERT_EQ(viewer().press(80, 70), 1);
   EXPECT_EQ(number("cutPosition_0")[1], 25.0f) << "the position jumps onto the pressed point";
   viewer().move(95, 65, true);
@@ -53,7 +45,7 @@ TEST_F(ViewerGestures, DraggingACutLineMovesItParallelToItself) {
   EXPECT_TRUE(host().callsTo("SetAngleParam").empty()) << "the direction is left alone";
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Split Screen Cut 1 Position"}));
   ASSERT_TRUE(host().undo());
-  EXPECT_EQ(snapshot(), before);
+  EXPECT_EQ(host().paramStates(), before);
 }
 
 TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
@@ -154,7 +146,7 @@ TEST_F(ViewerGestures, DraggingARegionMovesItsInput) {
 TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
   setCut(0, -70.0f, 0.0f, 0.0f);  // the line at corner x = 10, out of the way
   host().setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
-  const auto initial = snapshot();
+  const auto initial = host().paramStates();
   viewer().press(150, 5);  // select input 0 (a zero-length move)
   viewer().release(150, 5);
   // Rectangle (40, 22.5)-(120, 67.5); drag its (x1, y1) corner out to (140, 77.5).
@@ -198,7 +190,7 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
   // The host-side edits between gestures were not undo steps; put them back to compare.
   host().setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
   host().setValue("inputFrameTranslation0", ParamValue::ofPoint(0.0f, 0.0f));
-  EXPECT_EQ(snapshot(), initial);
+  EXPECT_EQ(host().paramStates(), initial);
 }
 
 TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
