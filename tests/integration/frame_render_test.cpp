@@ -10,10 +10,6 @@ namespace {
 
 using refhost::ParamValue;
 
-const Rgba kRed{255, 0, 0, 255};
-const Rgba kGreen{0, 255, 0, 255};
-const Rgba kBlue{0, 0, 255, 255};
-const Rgba kClear{0, 0, 0, 0};
 const std::string kLayerGreen = "22222222-0000-4000-8000-000000000002";
 const std::string kLayerBlue = "33333333-0000-4000-8000-000000000003";
 
@@ -126,8 +122,7 @@ TEST(FrameRender, ShiftedInputsShowTheirFrameOrTransparentBlack) {
   setCut(host, 0, 0.0f, 0.0f, 0.0f);
   const refhost::FrameSource counter = [](int32_t frame, int32_t width, int32_t height,
                                           refhost::PixelFormat) {
-    return solidSource({static_cast<uint8_t>(frame), 0, 0, 255})(frame, width, height,
-                                                                 refhost::PixelFormat::Rgba8);
+    return refhost::RgbaImage(width, height, {static_cast<uint8_t>(frame), 0, 0, 255}).pixels;
   };
   host.setValue("inputFrameShift1", ParamValue::ofInt(-3));
   std::vector<uint8_t> pixels = fixture.render(kRed, 10, counter);

@@ -9,9 +9,6 @@ namespace {
 
 using refhost::ParamValue;
 
-const Rgba kRed{255, 0, 0, 255};
-const Rgba kGreen{0, 255, 0, 255};
-const Rgba kClear{0, 0, 0, 0};
 const std::string kLayer = "22222222-0000-4000-8000-000000000002";
 
 // One vertical cut through the centre: input 1 on the left, input 0 on the right.

@@ -5,28 +5,24 @@
 #include <GL/glew.h>
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <array>
 #include <memory>
 #include <string>
 #include <vector>
 
 #include "loaded_plugin.h"
-#include "refhost/core/host.h"
-#include "refhost/core/module.h"
 #include "refhost/engine/render_frame.h"
 #include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
 #include "support/instrumented_host.h"
 
-using Rgba = std::array<uint8_t, 4>;
+using Rgba = refhost::Rgba8;
+constexpr Rgba kRed{255, 0, 0, 255}, kGreen{0, 255, 0, 255}, kBlue{0, 0, 255, 255};
+constexpr Rgba kClear{0, 0, 0, 0};
 
 inline refhost::FrameSource solidSource(Rgba colour) {
   return [colour](int32_t, int32_t width, int32_t height, refhost::PixelFormat) {
-    std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
-    for (size_t i = 0; i < pixels.size(); i += 4)
-      for (size_t c = 0; c < 4; ++c) pixels[i + c] = colour[c];
-    return pixels;
+    return refhost::RgbaImage(width, height, colour).pixels;
   };
 }
 
