@@ -14,17 +14,12 @@
 #include "refhost/engine/render_frame.h"
 #include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
+#include "support/engine_fixture.h"
 #include "support/instrumented_host.h"
 
 using Rgba = refhost::Rgba8;
 constexpr Rgba kRed{255, 0, 0, 255}, kGreen{0, 255, 0, 255}, kBlue{0, 0, 255, 255};
 constexpr Rgba kClear{0, 0, 0, 0};
-
-inline refhost::FrameSource solidSource(Rgba colour) {
-  return [colour](int32_t, int32_t width, int32_t height, refhost::PixelFormat) {
-    return refhost::RgbaImage(width, height, colour).pixels;
-  };
-}
 
 // The GL state the render and the overlay leave for the host: blending off with GL_FUNC_ADD and
 // GL_ONE/GL_ONE, no program in use, and the clear colour as the host had set it.
@@ -80,14 +75,9 @@ class RenderFixture {
   // Adds a layer the size of the frame, placed like the effect's own layer.
   void addSolidLayer(const std::string& guid, Rgba colour, int32_t firstFrame = 0,
                      int32_t frameCount = 100) {
-    refhost::Layer layer;
-    layer.guid = guid;
-    layer.name = guid.substr(0, 8);
-    layer.width = width_;
-    layer.height = height_;
+    refhost::Layer layer = testsupport::solidLayer(guid, width_, height_, colour);
     layer.firstFrame = firstFrame;
     layer.frameCount = frameCount;
-    layer.source = solidSource(colour);
     host_->addLayer(layer);
   }
 
@@ -96,7 +86,7 @@ class RenderFixture {
   // errors after the message.
   std::vector<uint8_t> render(Rgba sourceColour, int32_t frame = 10,
                               const refhost::FrameSource& sourceFrames = {}) {
-    host_->setSourceFrames(sourceFrames ? sourceFrames : solidSource(sourceColour));
+    host_->setSourceFrames(sourceFrames ? sourceFrames : testsupport::solidSource(sourceColour));
     std::vector<uint8_t> pixels;
     {
       refhost::RenderFrame target(*host_, {width_, height_, 25.0, pixelAspect, 100, kOwnLayer},

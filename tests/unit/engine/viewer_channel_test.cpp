@@ -2,20 +2,14 @@
 // and changed, and the selection learnt as values.
 #include <gtest/gtest.h>
 
-#include "refhost/engine.h"
-#include "refhost/gl/headless_context.h"
+#include "support/engine_fixture.h"
 
 namespace refhost {
 namespace {
 
 TEST(ViewerChannel, DragSelectsAndMovesAnInputAsOneUndoStep) {
-  EngineOptions options;
-  options.makeContext = refhost::makeHeadlessContext;
-  options.modulePath = VELTRANE_MODULE_PATH;
-  Engine engine(std::move(options));
-  engine.setFrameSettings({64, 36, 25.0, 1.0f, 10, ""});
-  engine.start();
-  engine.createInstance();
+  auto started = testsupport::startEngine({64, 36, 25.0, 1.0f, 10, ""});
+  Engine& engine = *started;
   EXPECT_FALSE(engine.viewerState().selectedInput);
 
   // Hovering over a region offers to move its picture.
