@@ -54,8 +54,7 @@ TEST(InputCapture, UndeliverableLayersFallBackAsTheHostAllows) {
   } table[] = {
       {"delivered", kLayer, false, kGreen},
       {"unknown layer: the own source", "99999999-0000-4000-8000-000000000009", false, kRed},
-      {"refused frame: transparent", kLayer, true, kClear},
-  };
+      {"refused frame: transparent", kLayer, true, kClear}};
   for (const auto& row : table) {
     SCOPED_TRACE(row.name);
     host.setValue("inputLayer1", ParamValue::ofLayer(row.guid));

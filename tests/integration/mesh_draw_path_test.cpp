@@ -29,13 +29,11 @@ TEST(MeshDrawPath, RestartFollowsTheExtensionListAndTheChip) {
     Profile profile;
     refhost::GlOverrides overrides;
     size_t expectedElementBuffers;
-  } table[] = {
-      {"compatibility profile lists the extension", Profile::Compatibility, {}, 2},
-      {"Intel HD 4000", Profile::Compatibility, chip("Intel(R) HD Graphics 4000"), 9},
-      {"Intel HD 4600", Profile::Compatibility, chip("Intel(R) HD Graphics 4600"), 2},
-      {"extension hidden", Profile::Compatibility, hidden, 9},
-      {"core profile lacks the extension", Profile::Core, {}, 9},
-  };
+  } table[] = {{"compatibility profile lists the extension", Profile::Compatibility, {}, 2},
+               {"Intel HD 4000", Profile::Compatibility, chip("Intel(R) HD Graphics 4000"), 9},
+               {"Intel HD 4600", Profile::Compatibility, chip("Intel(R) HD Graphics 4600"), 2},
+               {"extension hidden", Profile::Compatibility, hidden, 9},
+               {"core profile lacks the extension", Profile::Core, {}, 9}};
   std::vector<uint8_t> reference;
   for (const auto& row : table) {
     SCOPED_TRACE(row.name);

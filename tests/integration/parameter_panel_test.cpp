@@ -43,8 +43,7 @@ const Rule kRules[] = {
     {Place::PerInput, "inputFrameRotation", ParamKind::Angle, "0", kAnimated | kParamFlagsRotation},
     {Place::Border, "borderWidth", ParamKind::Float, "2", kAnimated, 0, 200},
     {Place::Border, "borderColor", ParamKind::Color, "(0, 0, 0)", kAnimated},
-    {Place::Border, "borderAlpha", ParamKind::Float, "1", kAnimated, 0, 1},
-};
+    {Place::Border, "borderAlpha", ParamKind::Float, "1", kAnimated, 0, 1}};
 
 struct Declared {
   std::string id;

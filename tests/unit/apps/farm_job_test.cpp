@@ -167,8 +167,7 @@ TEST_F(FarmJob, RefusesChunksThatDoNotFitAndTakesThemRenderedAgain) {
                    -1);
          EXPECT_FALSE(fs::exists(chunk(3)));
        },
-       "chunk 3 (", 3},
-  };
+       "chunk 3 (", 3}};
   for (const Case& c : cases) {
     c.damage();
     const CliRun refused = assemble("job.mkv");

@@ -196,11 +196,9 @@ TEST(StopSignals, StopCleanlyWithTheSignalsExitStatus) {
     int signal;
     std::string name, command;
     std::vector<std::string> outputs;
-  } const cases[] = {
-      {SIGINT, "SIGINT", "render", {"-o", "s_%04d.png"}},
-      {SIGTERM, "SIGTERM", "render", {"-o", "v.mp4"}},
-      {SIGHUP, "SIGHUP", "interact", {"-o", "r.json", "--overlay", "ov"}},
-  };
+  } const cases[] = {{SIGINT, "SIGINT", "render", {"-o", "s_%04d.png"}},
+                     {SIGTERM, "SIGTERM", "render", {"-o", "v.mp4"}},
+                     {SIGHUP, "SIGHUP", "interact", {"-o", "r.json", "--overlay", "ov"}}};
   for (const Case& c : cases) {
     ScratchDirectory folder;
     for (const char* name : {"s_0001.png", "v.mp4", "r.json"}) writeText(folder.file(name), "old");

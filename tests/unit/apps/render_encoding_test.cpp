@@ -155,8 +155,7 @@ TEST(RenderEncoding, RefusesSettingsTheOutputCannotTakeInOneLine) {
        "option '--audio-from': a .png output has no sound; it applies to .mp4, .mov, .mkv and "
        ".webm outputs"},
       {{"-o", mp4, "--audio-from", folder.file("sound.wav"), "--no-audio"},
-       "give --audio-from or --no-audio, not both"},
-  };
+       "give --audio-from or --no-audio, not both"}};
   for (const auto& c : cases) {
     const std::vector<std::string> before = folder.entries();
     std::vector<std::string> args{"render", path};

@@ -212,8 +212,7 @@ TEST(SplitCommand, RefusesBadInputWithOneLineAndWritesNothing) {
       refused({a, a, "--gap", "20"},
               "option '--gap': the cuts of diagonal-2 do not run side by side"),
       refused({a, "--border", "4,mauve"}, "option '--border' expects a colour as RRGGBB or a name"),
-      {{"split", a}, "needs -o OUT (or --save-scene FILE.json alone)"},
-  };
+      {{"split", a}, "needs -o OUT (or --save-scene FILE.json alone)"}};
   for (const Case& c : cases) {
     CliRun run = runCli(c.args);
     EXPECT_EQ(run.status, 2) << c.line << "\n" << run.err;

@@ -49,8 +49,7 @@ const Treatment kTreatments[] = {
     {"bench/melt_job\\.sh", Treatment::UntilFirstResult, "^== run 1 of"},
     {"kubectl ", Treatment::Skipped, "needs a Kubernetes cluster"},
     {"examples/farm/submit-slurm\\.sh|.* /shared/", Treatment::Skipped,
-     "needs a Slurm cluster and its shared folder (tests/farm/slurm_cluster.sh starts one)"},
-};
+     "needs a Slurm cluster and its shared folder (tests/farm/slurm_cluster.sh starts one)"}};
 
 // Clips the commands name as the reader's own (README.md makes its own): 8 s at 25 fps, with
 // sound, small.

@@ -37,8 +37,7 @@ TEST(ModuleLoading, ErrorsNameThePathAndTheFault) {
       {copy, patched(4, 1), "library (it is a 32-bit ELF file"},
       {copy, patched(5, 2), "library (its byte order"},
       {copy, patched(16, 2), "library (it is an ELF file of type 2, not a shared object"},
-      {copy, patched(18, 40), "library (it is built for ELF machine 40"},
-  };
+      {copy, patched(18, 40), "library (it is built for ELF machine 40"}};
   for (const Case& c : cases) {
     if (c.bytes) testsupport::writeText(c.path, *c.bytes);
     std::string message;

@@ -75,11 +75,9 @@ TEST(TestPatterns, CounterShowsItsFrameInCodeAndDigits) {
   const struct {
     int32_t frame, width, height;
     std::optional<uint16_t> expected;
-  } cases[] = {
-      {0, 64, 36, 0},         {1, 64, 36, 1},         {255, 64, 36, 255},
-      {1234, 320, 180, 1234}, {65535, 64, 36, 65535}, {65536 + 7, 64, 36, 7},
-      {-1, 64, 36, 65535},    {42, 1920, 1080, 42},   {9, 15, 15, std::nullopt},
-  };
+  } cases[] = {{0, 64, 36, 0},         {1, 64, 36, 1},         {255, 64, 36, 255},
+               {1234, 320, 180, 1234}, {65535, 64, 36, 65535}, {65536 + 7, 64, 36, 7},
+               {-1, 64, 36, 65535},    {42, 1920, 1080, 42},   {9, 15, 15, std::nullopt}};
   for (const auto& c : cases) {
     EXPECT_EQ(readCounterCode(generatePattern(Pattern::Counter, c.frame, c.width, c.height)),
               c.expected)

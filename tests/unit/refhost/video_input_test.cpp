@@ -163,14 +163,12 @@ TEST(VideoInput, TurnedPicturesShowUpright) {
     const char* rotate;  // the muxer's tag, or the matrix below patched in
     int a, b, c, d;
     int32_t width, height;
-  } clips[] = {
-      {"rotate90.mp4", "90", 0, 0, 0, 0, 180, 320},
-      {"rotate180.mp4", "180", 0, 0, 0, 0, 320, 180},
-      {"rotate270.mp4", "270", 0, 0, 0, 0, 180, 320},
-      {"mirrored.mp4", nullptr, -1, 0, 0, 1, 320, 180},
-      {"upside-down.mp4", nullptr, 1, 0, 0, -1, 320, 180},
-      {"transposed.mp4", nullptr, 0, 1, 1, 0, 180, 320},
-  };
+  } clips[] = {{"rotate90.mp4", "90", 0, 0, 0, 0, 180, 320},
+               {"rotate180.mp4", "180", 0, 0, 0, 0, 320, 180},
+               {"rotate270.mp4", "270", 0, 0, 0, 0, 180, 320},
+               {"mirrored.mp4", nullptr, -1, 0, 0, 1, 320, 180},
+               {"upside-down.mp4", nullptr, 1, 0, 0, -1, 320, 180},
+               {"transposed.mp4", nullptr, 0, 1, 1, 0, 180, 320}};
   for (const auto& clip : clips) {
     const std::string path = folder.file(clip.name);
     if (clip.rotate) {
@@ -217,6 +215,10 @@ int32_t frameShown(const RgbaImage& picture) {
 // presented at or before t, the first before it, the last after it.
 TEST(VideoInput, FramesAreChosenByPresentationTime) {
   ScratchDirectory folder;
+  // A variable rate: steady at first, then a pause, three short frames and a long gap.
+  const char* variable =
+      "if(lt(N,3),N*40,if(lt(N,5),200+(N-3)*40,if(lt(N,8),257+(N-5)*17,800+(N-8)*40)))";
+  const std::vector<double> shown{0, 40, 80, 200, 240, 257, 274, 291, 800, 840, 880, 920};
   const struct {
     const char* name;
     int rate;
@@ -224,17 +226,9 @@ TEST(VideoInput, FramesAreChosenByPresentationTime) {
     int32_t compositionFrames;      // at 25 fps
     const char* times;              // a setpts expression in milliseconds for a variable rate
     std::vector<double> presented;  // its frames' times in milliseconds
-  } clips[] = {
-      {"25.mp4", 25, 0.48, 12, nullptr, {}},
-      {"60.mp4", 60, 0.2, 5, nullptr, {}},
-      // Steady at first, then a pause, three short frames and a long gap.
-      {"variable.mp4",
-       25,
-       0,
-       0,
-       "if(lt(N,3),N*40,if(lt(N,5),200+(N-3)*40,if(lt(N,8),257+(N-5)*17,800+(N-8)*40)))",
-       {0, 40, 80, 200, 240, 257, 274, 291, 800, 840, 880, 920}},
-  };
+  } clips[] = {{"25.mp4", 25, 0.48, 12, nullptr, {}},
+               {"60.mp4", 60, 0.2, 5, nullptr, {}},
+               {"variable.mp4", 25, 0, 0, variable, shown}};
   for (const auto& clip : clips) {
     const std::string path = folder.file(clip.name);
     std::string filter = "color=black:s=64x32:r=" + std::to_string(clip.rate) +
@@ -335,22 +329,20 @@ TEST(VideoInput, FilesAreReadByWhatTheyHold) {
     int32_t frames;   // at that rate
     int32_t damaged;  // frames the decoder found damaged, read through once
     bool sound;
-  } files[] = {
-      {"phone.3gp", 160, 96, {25, 1}, 10, 0, false},
-      {"camera.mts", 160, 96, {25, 1}, 10, 0, true},
-      {"animated.gif", 64, 36, {10, 1}, 5, 0, false},
-      {"animated.webp", 64, 36, {10, 1}, 5, 0, false},
-      {"one.gif", 64, 36, {}, 0, 0, false},
-      {"dropped.mp4", 64, 36, {30, 1}, 119, 0, false},
-      {"slowed.mp4", 64, 36, {30, 1}, 120, 0, false},
-      {"cut.mp4", 160, 96, {25, 1}, 30, 1, false},
-      {"overwritten.mp4", 160, 96, {25, 1}, 30, 1, false},
-      {"photo1.jpg", 64, 48, {}, 0, 0, false},
-      {"photo3.jpg", 64, 48, {}, 0, 0, false},
-      {"photo6.jpg", 64, 48, {}, 0, 0, false},
-      {"photo8.jpg", 64, 48, {}, 0, 0, false},
-      {"half.jpg", 160, 96, {}, 0, 1, false},
-  };
+  } files[] = {{"phone.3gp", 160, 96, {25, 1}, 10, 0, false},
+               {"camera.mts", 160, 96, {25, 1}, 10, 0, true},
+               {"animated.gif", 64, 36, {10, 1}, 5, 0, false},
+               {"animated.webp", 64, 36, {10, 1}, 5, 0, false},
+               {"one.gif", 64, 36, {}, 0, 0, false},
+               {"dropped.mp4", 64, 36, {30, 1}, 119, 0, false},
+               {"slowed.mp4", 64, 36, {30, 1}, 120, 0, false},
+               {"cut.mp4", 160, 96, {25, 1}, 30, 1, false},
+               {"overwritten.mp4", 160, 96, {25, 1}, 30, 1, false},
+               {"photo1.jpg", 64, 48, {}, 0, 0, false},
+               {"photo3.jpg", 64, 48, {}, 0, 0, false},
+               {"photo6.jpg", 64, 48, {}, 0, 0, false},
+               {"photo8.jpg", 64, 48, {}, 0, 0, false},
+               {"half.jpg", 160, 96, {}, 0, 1, false}};
   for (const auto& file : files) {
     SCOPED_TRACE(file.name);
     MediaSpec spec = MediaSpec::ofFile(folder.file(file.name));
@@ -386,8 +378,7 @@ TEST(VideoInput, FilesAreReadByWhatTheyHold) {
        "host: it renders in SDR BT.709/BT.601; convert it first (for example with ffmpeg's "
        "zscale and tonemap filters)"},
       {"hlg.mp4", "HDR video (transfer arib-std-b67, primaries bt2020"},
-      {"wide.mp4", "wide-gamut video (primaries bt2020, matrix bt2020nc)"},
-  };
+      {"wide.mp4", "wide-gamut video (primaries bt2020, matrix bt2020nc)"}};
   for (const auto& [name, line] : refused) {
     const std::string path = folder.file(name);
     try {
