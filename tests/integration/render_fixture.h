@@ -137,3 +137,6 @@ class RenderFixture {
   int32_t height_;
   std::unique_ptr<testsupport::InstrumentedHost> host_;
 };
+
+// The fixture of the core profile and the small frame, as a googletest fixture.
+class RenderTest : public ::testing::Test, public RenderFixture {};
