@@ -2,7 +2,6 @@
 // with the scene's colour; and the settings it refuses, in one line before anything is written.
 #include <gtest/gtest.h>
 
-#include <cmath>
 #include <nlohmann/json.hpp>
 #include <sstream>
 

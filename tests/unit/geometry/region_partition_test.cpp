@@ -4,8 +4,6 @@
 
 #include <gtest/gtest.h>
 
-#include <vector>
-
 #include "common/param_ids.h"
 #include "make_cut.h"
 
