@@ -27,6 +27,13 @@ class ViewerGestures : public LoadedPlugin {
     host().setValue("cutType", ParamValue::ofInt(1));
     host().setValue("numberOfCuts", ParamValue::ofInt(cuts));
   }
+  // An HD frame split by two rays from its centre, at 0 and 90 degrees.
+  void twoRaysInHd() {
+    resize(1920, 1080);
+    setRadial(2);
+    setCut(0, 0.0f, 0.0f, 0.0f);
+    setCut(1, 0.0f, 0.0f, 90.0f);
+  }
   CursorShape lastCursor() { return static_cast<CursorShape>(host().lastCursor()); }
 
   std::unique_ptr<ViewerEvents> viewer_;
@@ -65,10 +72,7 @@ TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
 }
 
 TEST_F(ViewerGestures, PressedDirectionHandleKeepsTheDragOverAnotherHandle) {
-  resize(1920, 1080);
-  setRadial(2);  // rays at 0 and 90 degrees from the frame centre
-  setCut(0, 0.0f, 0.0f, 0.0f);
-  setCut(1, 0.0f, 0.0f, 90.0f);
+  twoRaysInHd();
   ASSERT_EQ(viewer().press(960, 740), 1);
   host().clearCallLog();
   EXPECT_EQ(viewer().move(1160, 540, true), 1);  // onto cut 2's handle
@@ -115,10 +119,7 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
 }
 
 TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
-  resize(1920, 1080);
-  setRadial(2);
-  setCut(0, 0.0f, 0.0f, 0.0f);
-  setCut(1, 0.0f, 0.0f, 90.0f);
+  twoRaysInHd();
   viewer().key(kMessageKeyDown, kKeyLeftShift);
   ASSERT_EQ(viewer().press(960 - 300, 540 - 300), 1);  // down and left of the centre
   EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 3);
@@ -195,12 +196,12 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
 
 TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
   setCut(0, 0.0f, 0.0f, 0.0f);
-  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape),
-            0);  // nothing selected: the key is not taken
+  // Nothing selected: the key is not taken.
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 0);
   viewer().press(120, 20);
   viewer().release(120, 20);
-  EXPECT_EQ(host().send(kMessagePointerOverSelection),
-            1);  // pointer over the selected input's region
+  // The pointer is over the selected input's region.
+  EXPECT_EQ(host().send(kMessagePointerOverSelection), 1);
   EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 1);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 1);  // key down changes nothing
   EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyEscape), 1);

@@ -113,9 +113,8 @@ TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
   }
 }
 
-// Outputs refused before anything is read or written: an input named as the output (through a
-// link, a hard link, a frame pattern), a folder under the output's name, a place that takes no
-// files, and a file already there unless -y replaces it.
+// Refused before anything is read or written: an input named as the output (through a link, a
+// hard link, a pattern), a folder, a place that takes no files, a file there unless -y.
 TEST(OutputWrites, RefusedOutputsAreOneLineAndWriteNothing) {
   ScratchDirectory folder;
   const std::string a = folder.file("a.mp4");

@@ -73,11 +73,8 @@ TEST(SplitCommand, RendersWhatTheSceneItSavesRenders) {
   EXPECT_TRUE(portraitFramed) << params;
 }
 
-// A layout with more regions than clips saying so; the first video's nominal rate (a
-// variable-rate clip's steady 30), a still first clip saying which rate it took (and shown
-// upright), --fps as a fraction or a drop-frame decimal, damage concealed with a warning or
-// refused with --strict, a damaged still refused: every message one line of our own, whatever
-// the libraries would have printed.
+// Layouts filled again, the first video's nominal rate or a still's note, --fps, damage concealed
+// or refused: every message one line of our own, whatever the libraries would have printed.
 TEST(SplitCommand, ReadsClipsAsFfmpegDoes) {
   ScratchDirectory folder;
   const std::string a = clip(folder, "a.mp4", "160x90"),

@@ -48,9 +48,8 @@ TEST(PrefetchingSource, GivesTheWrappedSourcesFramesWhateverTheOrder) {
   EXPECT_EQ(ahead.glRows(8, 2, 2, PixelFormat::Rgba8), direct.glRows(8, 2, 2, PixelFormat::Rgba8));
 }
 
-// Sources sharing a budget for frames decoded ahead: frames ahead take room in it while they
-// wait and give it back when handed over or dropped, frames asked for go ahead without room,
-// and nothing stays taken once the sources are gone.
+// Frames decoded ahead take room in a shared budget until handed over or dropped; frames asked
+// for go ahead without room; nothing stays taken once the sources are gone.
 TEST(PrefetchingSource, FramesAheadShareOneBudget) {
   constexpr std::size_t kFrame = 4 * 2 * 4;  // 4x2 pixels in 8 bits
   auto budget = std::make_shared<DecodeAheadBudget>(2 * kFrame);

@@ -53,8 +53,7 @@ TEST_F(HostResources, TexturesAreCountedAndLeaveBindingsAlone) {
 }
 
 // The texture pool: textures given back are handed out again for the same size and format, as
-// new ones would be. (That the host's own frame textures come from the pool, uploads intact,
-// shows in the render loop's test.)
+// new ones would be.
 TEST_F(HostResources, GivenBackTexturesAreReusedBySizeAndFormatWithFreshSampling) {
   auto allocate = [&](int32_t width, uint32_t format) {
     int32_t w = 0, h = 0;

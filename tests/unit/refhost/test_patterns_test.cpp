@@ -16,10 +16,8 @@
 namespace refhost {
 namespace {
 
-// At every size: every pattern opaque; the bars seven distinct colours in full-height columns
-// of even width, so a region showing them can be told by its colour; the checker two greys
-// alternating square by square from a light corner; the gradient red rising to the right and
-// green upwards, never falling back, over the whole range, blue holding.
+// At every size, opaque: seven distinct full-height bars of even width; two greys alternating
+// square by square from a light corner; red rising to the right and green upwards, blue held.
 TEST(TestPatterns, PicturesKeepTheirShapeAtEverySize) {
   for (const auto& [width, height] : {std::pair{1, 1}, {7, 3}, {64, 36}, {71, 40}, {320, 180}}) {
     SCOPED_TRACE(std::to_string(width) + "x" + std::to_string(height));

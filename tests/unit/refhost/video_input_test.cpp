@@ -283,9 +283,7 @@ void makePhoto(const ScratchDirectory& folder, const std::string& name, int orie
 }
 
 // Every kind of file FFmpeg decodes, read by what it holds whatever its name: its size upright,
-// whether it moves, its nominal rate and length at that rate, the frames its decoder found
-// damaged (concealed, not fatal), or the one line that refuses it (damage beyond use, no
-// picture, colours the host cannot show).
+// nominal rate, length, sound and the frames found damaged (concealed), or the line refusing it.
 TEST(VideoInput, FilesAreReadByWhatTheyHold) {
   ScratchDirectory folder;
   const std::string testPicture = "testsrc2=size=160x96:rate=25";
