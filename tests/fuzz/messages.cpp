@@ -47,7 +47,8 @@ bool answerAllowed(int32_t message, int32_t result) {
   return result >= 0 && result < 32 && (allowedAnswers(message) >> result & 1) != 0;
 }
 
-[[noreturn]] void fail(const testsupport::InstrumentedHost& host, int32_t message, const std::string& what) {
+[[noreturn]] void fail(const testsupport::InstrumentedHost& host, int32_t message,
+                       const std::string& what) {
   std::fprintf(stderr, "%s: %s; its host calls:\n", wispMessageText(message).c_str(), what.c_str());
   for (const std::string& call : host.callLog()) std::fprintf(stderr, "  %s\n", call.c_str());
   std::abort();

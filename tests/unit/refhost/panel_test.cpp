@@ -150,7 +150,8 @@ TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   EXPECT_TRUE(host.immediateEdits().empty());
   for (int step = 2; step > 0; --step) {
     ASSERT_TRUE(host.undo());
-    EXPECT_EQ(host.paramStates(), history[static_cast<std::size_t>(step - 1)]) << "undoing " << step;
+    EXPECT_EQ(host.paramStates(), history[static_cast<std::size_t>(step - 1)])
+        << "undoing " << step;
   }
   EXPECT_FALSE(host.undo());
   for (std::size_t step = 1; step <= 2; ++step) {

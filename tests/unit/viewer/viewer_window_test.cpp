@@ -120,7 +120,7 @@ TEST_F(ViewerWindow, GesturesEditTheSceneAndCtrlSSavesItWithItsUndoHistory) {
       "cutPosition_1": [-80, 60], "cutDirection_1": -90,
       "inputLayer0": "d3e00000-0000-4000-8000-000000000001"})"));
   EXPECT_NE(slurp(out_).find("undo history: \"Split Screen Cut 1 Position\", \"Inserting Cut\"; "
-                            "undone: \"Moved Split Screen Input 0\""),
+                             "undone: \"Moved Split Screen Input 0\""),
             std::string::npos)
       << slurp(out_);
 }
