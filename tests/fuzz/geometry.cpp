@@ -115,7 +115,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, std::size_t size) {
   // One host for every input, as a host keeps its values: what an input leaves unwritten keeps
   // an earlier input's value.
   static testsupport::InMemoryHost host;
-  host.setCallLogging(false);
+  host.clearCallLog();  // the calls of one input at most
   fillParameters(data, host);
   runEvent(data, host);
   runSplit(data);
