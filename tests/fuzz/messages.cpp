@@ -1,9 +1,5 @@
-// Fuzzes the message boundary as a hostile host would drive it: the reference host loads the
-// module and sends every number of the protocol's two message ranges, named or not, in any
-// order, with zero-size and odd frames, NaN, infinite and huge numbers in its records and
-// parameters, null events and failing host operations. Any crash, escaping exception, GL error,
-// answer outside the message's set or texture or buffer left with the plug-in after a message stops
-// the run.
+// Fuzzes the message boundary as a hostile host: any number, order, record and failing host call;
+// a crash, escaping exception, GL error, stray answer or resource left behind stops the run.
 #include <fuzzer/FuzzedDataProvider.h>
 
 #include <algorithm>
@@ -51,7 +47,8 @@ bool answerAllowed(int32_t message, int32_t result) {
   return result >= 0 && result < 32 && (allowedAnswers(message) >> result & 1) != 0;
 }
 
-[[noreturn]] void fail(const testsupport::InstrumentedHost& host, int32_t message, const std::string& what) {
+[[noreturn]] void fail(const testsupport::InstrumentedHost& host, int32_t message,
+                       const std::string& what) {
   std::fprintf(stderr, "%s: %s; its host calls:\n", wispMessageText(message).c_str(), what.c_str());
   for (const std::string& call : host.callLog()) std::fprintf(stderr, "  %s\n", call.c_str());
   std::abort();

@@ -70,14 +70,12 @@ TEST_F(LayerPicker, EffectLayersBeforeTheOwnLayerAreNotOffered) {
   EXPECT_EQ(host().popupMenus().back(), "Own");
 }
 
-TEST_F(LayerPicker, DeclinesWithoutASelectionUnderThePointer) {
-  host().addLayer(layer(kOwn, "Own", kLayerTypeFootage));
+// Without a selection under the pointer the pick is declined; with one, an empty composition
+// shows an empty menu and stores nothing.
+TEST_F(LayerPicker, DeclinesWithoutASelectionAndOffersNothingInAnEmptyComposition) {
   EXPECT_EQ(pick(0), 0);
   EXPECT_TRUE(host().popupMenus().empty());
   EXPECT_TRUE(host().callsTo("GetLayerCount").empty());
-}
-
-TEST_F(LayerPicker, EmptyCompositionShowsAnEmptyMenuAndStoresNothing) {
   selectInputOne();
   EXPECT_EQ(pick(0), 1);
   EXPECT_EQ(host().popupMenus().back(), "");

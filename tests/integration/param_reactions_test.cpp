@@ -71,13 +71,11 @@ TEST_F(LoadedPlugin, FrameRequestsNameTheCurrentFrameOfEveryLayerInUse) {
     bool radial;
     std::vector<std::string> layers;  // inputLayer0.. values; missing ones stay unset
     std::vector<std::string> requested;
-  } table[] = {
-      {"one local cut, input 0 set", 1, false, {kLayerA}, {kLayerA}},
-      {"radial skips input 0", 2, true, {kLayerA, kLayerB, kLayerA}, {kLayerB, kLayerA}},
-      {"same layer twice", 2, false, {kLayerA, kLayerA}, {kLayerA, kLayerA}},
-      {"inputs past the cut count", 1, false, {"", "", kLayerB}, {}},
-      {"nothing set", 8, false, {}, {}},
-  };
+  } table[] = {{"one local cut, input 0 set", 1, false, {kLayerA}, {kLayerA}},
+               {"radial skips input 0", 2, true, {kLayerA, kLayerB, kLayerA}, {kLayerB, kLayerA}},
+               {"same layer twice", 2, false, {kLayerA, kLayerA}, {kLayerA, kLayerA}},
+               {"inputs past the cut count", 1, false, {"", "", kLayerB}, {}},
+               {"nothing set", 8, false, {}, {}}};
   for (const auto& row : table) {
     SCOPED_TRACE(row.name);
     host().setValue("numberOfCuts", ParamValue::ofInt(row.cuts));

@@ -1,32 +1,19 @@
 // The module as a host sees it: its exports, its registration and the result of every message.
 #include <climits>
-#include <cstdio>
 #include <cwchar>
-#include <set>
 #include <vector>
 
 #include "loaded_plugin.h"
+#include "support/files.h"
 
 namespace {
 
 // The Windows build reads its DLL's export table on the build machine instead.
 #ifndef _WIN32
-std::set<std::string> exportedSymbols(const std::string& path) {
-  std::set<std::string> names;
-  const std::string command = "nm -D --defined-only '" + path + "'";
-  FILE* pipe = popen(command.c_str(), "r");
-  if (!pipe) return names;
-  char line[512];
-  while (std::fgets(line, sizeof line, pipe)) {
-    char address[64], type[8], name[400];
-    if (std::sscanf(line, "%63s %7s %399s", address, type, name) == 3) names.insert(name);
-  }
-  pclose(pipe);
-  return names;
-}
-
 TEST(ModuleExports, ExportsExactlyPluginInfoAndNotify) {
-  EXPECT_EQ(exportedSymbols(VELTRANE_MODULE_PATH), (std::set<std::string>{"Notify", "PluginInfo"}));
+  EXPECT_EQ(testsupport::commandOutput("nm -D --defined-only --format=just-symbols '" +
+                                       std::string(VELTRANE_MODULE_PATH) + "'"),
+            "Notify\nPluginInfo\n");
 }
 #endif
 
@@ -66,22 +53,15 @@ TEST(Registration, FieldsAreWrittenAgainAlikeAndANullIdentifierIsSkipped) {
 TEST_F(LoadedPlugin, MessageResultTable) {
   WispRenderContext renderContext{};
   host().setRenderContext(&renderContext);
-  const struct {
-    int32_t message;
-    int32_t expected;
-  } table[] = {
-      {kMessageRequestFrames, kResultDone},
-      {kMessageViewerOpened, kResultDone},
-      {kMessageViewerClosed, kResultDone},
-      {kMessagePointerEntered, kResultNotDone},
-      {kMessagePointerLeft, kResultNotDone},
-      {kMessageDoubleClick, kResultNotDone},
-      {kMessagePointerPress, kResultNotDone},  // no pointer event to read
-      {kMessagePointerOverSelection, kResultNotDone},
-  };
-  for (const auto& row : table) {
-    EXPECT_EQ(host().send(row.message), row.expected) << wispMessageText(row.message);
-    EXPECT_EQ(host().messageHistory().back().result, row.expected) << "as the host recorded";
+  // A press without a pointer event has nothing to read.
+  const std::pair<int32_t, int32_t> table[] = {
+      {kMessageRequestFrames, kResultDone},   {kMessageViewerOpened, kResultDone},
+      {kMessageViewerClosed, kResultDone},    {kMessagePointerEntered, kResultNotDone},
+      {kMessagePointerLeft, kResultNotDone},  {kMessageDoubleClick, kResultNotDone},
+      {kMessagePointerPress, kResultNotDone}, {kMessagePointerOverSelection, kResultNotDone}};
+  for (const auto& [message, expected] : table) {
+    EXPECT_EQ(host().send(message), expected) << wispMessageText(message);
+    EXPECT_EQ(host().messageHistory().back().result, expected) << "as the host recorded";
   }
   EXPECT_EQ(sendParamEvent(kMessageParameterChanged, "borderWidth"), 1);
   EXPECT_EQ(sendParamEvent(kMessageParameterEditBegan, "borderWidth"), 1);

@@ -5,30 +5,21 @@
 #include <GL/glew.h>
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <array>
 #include <memory>
 #include <string>
 #include <vector>
 
 #include "loaded_plugin.h"
-#include "refhost/core/host.h"
-#include "refhost/core/module.h"
 #include "refhost/engine/render_frame.h"
 #include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
+#include "support/engine_fixture.h"
 #include "support/instrumented_host.h"
 
-using Rgba = std::array<uint8_t, 4>;
-
-inline refhost::FrameSource solidSource(Rgba colour) {
-  return [colour](int32_t, int32_t width, int32_t height, refhost::PixelFormat) {
-    std::vector<uint8_t> pixels(static_cast<size_t>(width) * static_cast<size_t>(height) * 4);
-    for (size_t i = 0; i < pixels.size(); i += 4)
-      for (size_t c = 0; c < 4; ++c) pixels[i + c] = colour[c];
-    return pixels;
-  };
-}
+using Rgba = refhost::Rgba8;
+constexpr Rgba kRed{255, 0, 0, 255}, kGreen{0, 255, 0, 255}, kBlue{0, 0, 255, 255};
+constexpr Rgba kClear{0, 0, 0, 0};
 
 // The GL state the render and the overlay leave for the host: blending off with GL_FUNC_ADD and
 // GL_ONE/GL_ONE, no program in use, and the clear colour as the host had set it.
@@ -84,14 +75,9 @@ class RenderFixture {
   // Adds a layer the size of the frame, placed like the effect's own layer.
   void addSolidLayer(const std::string& guid, Rgba colour, int32_t firstFrame = 0,
                      int32_t frameCount = 100) {
-    refhost::Layer layer;
-    layer.guid = guid;
-    layer.name = guid.substr(0, 8);
-    layer.width = width_;
-    layer.height = height_;
+    refhost::Layer layer = testsupport::solidLayer(guid, width_, height_, colour);
     layer.firstFrame = firstFrame;
     layer.frameCount = frameCount;
-    layer.source = solidSource(colour);
     host_->addLayer(layer);
   }
 
@@ -100,7 +86,7 @@ class RenderFixture {
   // errors after the message.
   std::vector<uint8_t> render(Rgba sourceColour, int32_t frame = 10,
                               const refhost::FrameSource& sourceFrames = {}) {
-    host_->setSourceFrames(sourceFrames ? sourceFrames : solidSource(sourceColour));
+    host_->setSourceFrames(sourceFrames ? sourceFrames : testsupport::solidSource(sourceColour));
     std::vector<uint8_t> pixels;
     {
       refhost::RenderFrame target(*host_, {width_, height_, 25.0, pixelAspect, 100, kOwnLayer},
@@ -151,3 +137,6 @@ class RenderFixture {
   int32_t height_;
   std::unique_ptr<testsupport::InstrumentedHost> host_;
 };
+
+// The fixture of the core profile and the small frame, as a googletest fixture.
+class RenderTest : public ::testing::Test, public RenderFixture {};

@@ -6,7 +6,6 @@
 
 #include <algorithm>
 #include <cmath>
-#include <iterator>
 
 #include "refhost/core/host.h"
 #include "refhost/engine/render_frame.h"

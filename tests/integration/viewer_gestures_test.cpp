@@ -27,22 +27,21 @@ class ViewerGestures : public LoadedPlugin {
     host().setValue("cutType", ParamValue::ofInt(1));
     host().setValue("numberOfCuts", ParamValue::ofInt(cuts));
   }
-  std::vector<refhost::ParamState> snapshot() {
-    std::vector<refhost::ParamState> states;
-    for (const refhost::Param& param : host().panel().params()) states.push_back(param.state);
-    return states;
+  // An HD frame split by two rays from its centre, at 0 and 90 degrees.
+  void twoRaysInHd() {
+    resize(1920, 1080);
+    setRadial(2);
+    setCut(0, 0.0f, 0.0f, 0.0f);
+    setCut(1, 0.0f, 0.0f, 90.0f);
   }
-  CursorShape lastCursor() {
-    return static_cast<CursorShape>(host().cursorShapes().empty() ? -1
-                                                                  : host().cursorShapes().back());
-  }
+  CursorShape lastCursor() { return static_cast<CursorShape>(host().lastCursor()); }
 
   std::unique_ptr<ViewerEvents> viewer_;
 };
 
 TEST_F(ViewerGestures, DraggingACutLineMovesItParallelToItself) {
   setCut(0, 0.0f, 0.0f, 0.0f);  // vertical line through the centre, corner x = 80
-  const auto before = snapshot();
+  const auto before = host().paramStates();
   ASSERT_EQ(viewer().press(80, 70), 1);
   EXPECT_EQ(number("cutPosition_0")[1], 25.0f) << "the position jumps onto the pressed point";
   viewer().move(95, 65, true);
@@ -53,7 +52,7 @@ TEST_F(ViewerGestures, DraggingACutLineMovesItParallelToItself) {
   EXPECT_TRUE(host().callsTo("SetAngleParam").empty()) << "the direction is left alone";
   EXPECT_EQ(host().undoStepNames(), (std::vector<std::string>{"Split Screen Cut 1 Position"}));
   ASSERT_TRUE(host().undo());
-  EXPECT_EQ(snapshot(), before);
+  EXPECT_EQ(host().paramStates(), before);
 }
 
 TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
@@ -73,10 +72,7 @@ TEST_F(ViewerGestures, DirectionHandleTurnsContinuouslyThroughTwoFullTurns) {
 }
 
 TEST_F(ViewerGestures, PressedDirectionHandleKeepsTheDragOverAnotherHandle) {
-  resize(1920, 1080);
-  setRadial(2);  // rays at 0 and 90 degrees from the frame centre
-  setCut(0, 0.0f, 0.0f, 0.0f);
-  setCut(1, 0.0f, 0.0f, 90.0f);
+  twoRaysInHd();
   ASSERT_EQ(viewer().press(960, 740), 1);
   host().clearCallLog();
   EXPECT_EQ(viewer().move(1160, 540, true), 1);  // onto cut 2's handle
@@ -123,10 +119,7 @@ TEST_F(ViewerGestures, ShiftPressInsertsACutUpToEight) {
 }
 
 TEST_F(ViewerGestures, ShiftPressAimsANewRadialCutAtThePointerAtOnce) {
-  resize(1920, 1080);
-  setRadial(2);
-  setCut(0, 0.0f, 0.0f, 0.0f);
-  setCut(1, 0.0f, 0.0f, 90.0f);
+  twoRaysInHd();
   viewer().key(kMessageKeyDown, kKeyLeftShift);
   ASSERT_EQ(viewer().press(960 - 300, 540 - 300), 1);  // down and left of the centre
   EXPECT_EQ(host().valueAt("numberOfCuts", 0).integer, 3);
@@ -154,7 +147,7 @@ TEST_F(ViewerGestures, DraggingARegionMovesItsInput) {
 TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
   setCut(0, -70.0f, 0.0f, 0.0f);  // the line at corner x = 10, out of the way
   host().setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
-  const auto initial = snapshot();
+  const auto initial = host().paramStates();
   viewer().press(150, 5);  // select input 0 (a zero-length move)
   viewer().release(150, 5);
   // Rectangle (40, 22.5)-(120, 67.5); drag its (x1, y1) corner out to (140, 77.5).
@@ -198,17 +191,17 @@ TEST_F(ViewerGestures, SelectedInputScalesFromTheOppositeCornerAndRotates) {
   // The host-side edits between gestures were not undo steps; put them back to compare.
   host().setValue("inputFrameScale0", ParamValue::ofFloat(50.0f));
   host().setValue("inputFrameTranslation0", ParamValue::ofPoint(0.0f, 0.0f));
-  EXPECT_EQ(snapshot(), initial);
+  EXPECT_EQ(host().paramStates(), initial);
 }
 
 TEST_F(ViewerGestures, EscapeDeselectsAndTheQueryFollowsTheSelection) {
   setCut(0, 0.0f, 0.0f, 0.0f);
-  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape),
-            0);  // nothing selected: the key is not taken
+  // Nothing selected: the key is not taken.
+  EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 0);
   viewer().press(120, 20);
   viewer().release(120, 20);
-  EXPECT_EQ(host().send(kMessagePointerOverSelection),
-            1);  // pointer over the selected input's region
+  // The pointer is over the selected input's region.
+  EXPECT_EQ(host().send(kMessagePointerOverSelection), 1);
   EXPECT_EQ(viewer().key(kMessageKeyDown, kKeyEscape), 1);
   EXPECT_EQ(host().send(kMessagePointerOverSelection), 1);  // key down changes nothing
   EXPECT_EQ(viewer().key(kMessageKeyUp, kKeyEscape), 1);

@@ -5,6 +5,7 @@
 #include <spawn.h>
 #include <sys/wait.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstring>
 #include <stdexcept>
@@ -56,6 +57,16 @@ int ChildProcess::wait(double seconds) {
   if (!waitUntil([&] { return waitpid(pid_, &status, WNOHANG) == pid_; }, seconds)) return -1;
   pid_ = -1;
   return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+std::vector<std::string> environmentWithout(std::initializer_list<std::string> names) {
+  std::vector<std::string> kept;
+  for (char** entry = environ; *entry; ++entry) {
+    const std::string text = *entry;
+    if (std::find(names.begin(), names.end(), text.substr(0, text.find('='))) == names.end())
+      kept.push_back(text);
+  }
+  return kept;
 }
 
 bool waitUntil(const std::function<bool()>& condition, double seconds) {

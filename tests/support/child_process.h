@@ -4,6 +4,7 @@
 #include <sys/types.h>
 
 #include <functional>
+#include <initializer_list>
 #include <string>
 #include <vector>
 
@@ -28,6 +29,9 @@ class ChildProcess {
  private:
   pid_t pid_ = -1;
 };
+
+// This process's environment ("NAME=value") without the variables named.
+std::vector<std::string> environmentWithout(std::initializer_list<std::string> names);
 
 // Polls until the condition holds; false after `seconds`.
 bool waitUntil(const std::function<bool()>& condition, double seconds);

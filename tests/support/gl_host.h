@@ -1,6 +1,5 @@
-// The GL host of the unit tests: the reference host (no module) with a headless context, its
-// framebuffer bound and a render context of a small frame. A test fails (never skips) without a
-// context, and fails on any GL error, host problem or texture or buffer not given back.
+// The GL host of the unit tests: the reference host with a headless context and a small frame;
+// a test fails without a context, and on any GL error, host problem or resource not given back.
 #pragma once
 
 #include <gtest/gtest.h>

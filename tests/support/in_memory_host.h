@@ -1,6 +1,5 @@
-// The in-memory host of the unit tests: the reference host with no module and no GL, its panel
-// declared by the effect's own declaration, so every parameter reads and writes (and is logged)
-// exactly as a real host serves it.
+// The in-memory host of the unit tests: no module and no GL, its panel declared by the effect's
+// own declaration, so every parameter reads and writes exactly as a real host serves it.
 #pragma once
 
 #include <string>

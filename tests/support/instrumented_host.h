@@ -20,6 +20,14 @@ class InstrumentedHost : public refhost::Host {
     return calls_.callsTo(operation);
   }
   void clearCallLog() { calls_.clear(); }
+  // Every parameter's state in declaration order, to compare before and after bit for bit.
+  std::vector<refhost::ParamState> paramStates() const {
+    std::vector<refhost::ParamState> states;
+    for (const refhost::Param& param : panel().params()) states.push_back(param.state);
+    return states;
+  }
+  // The cursor shape asked for last; -1 when none was.
+  int32_t lastCursor() const { return cursorShapes().empty() ? -1 : cursorShapes().back(); }
 
   // The k-th declaration call from now on, counted from 1, is refused; 0 refuses none.
   void failDeclarationCall(int k) {

@@ -2,43 +2,23 @@
 #include "support/spoiled_media.h"
 
 #include <cstdint>
-#include <cstdio>
-#include <fstream>
-#include <iterator>
 #include <sstream>
 #include <stdexcept>
 
+#include "support/files.h"
+
 namespace testsupport {
-namespace {
-
-std::string fileBytes(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  return std::string(std::istreambuf_iterator<char>(in), {});
-}
-
-void writeBytes(const std::string& path, const std::string& bytes) {
-  std::ofstream(path, std::ios::binary | std::ios::trunc) << bytes;
-}
-
-}  // namespace
 
 void spoilPacket(const std::string& path, int packet, Spoiling how) {
-  const std::string command =
-      "ffprobe -v error -select_streams v -show_entries packet=pos,size "
-      "-of csv=p=0 '" +
-      path + "'";
-  std::string listing;
-  if (FILE* pipe = popen(command.c_str(), "r")) {
-    for (int c; (c = std::fgetc(pipe)) != EOF;) listing += static_cast<char>(c);
-    pclose(pipe);
-  }
-  std::istringstream lines(listing);
+  std::istringstream lines(commandOutput(
+      "ffprobe -v error -select_streams v -show_entries packet=pos,size -of csv=p=0 '" + path +
+      "'"));
   std::string line;
   for (int i = 0; i <= packet; ++i)
     if (!std::getline(lines, line)) throw std::runtime_error(path + ": too few packets");
   // ffprobe lists size first, then position.
   const std::size_t size = std::stoul(line), at = std::stoul(line.substr(line.find(',') + 1));
-  std::string bytes = fileBytes(path);
+  std::string bytes = slurp(path);
   if (how == Spoiling::CutInHalf) {
     for (std::size_t i = at + size / 2; i < at + size; ++i) bytes[i] = '\0';
   } else {
@@ -48,7 +28,7 @@ void spoilPacket(const std::string& path, int packet, Spoiling how) {
       bytes[at + size / 3 + i] = static_cast<char>(noise >> 16);
     }
   }
-  writeBytes(path, bytes);
+  writeText(path, bytes);
 }
 
 void tagExifOrientation(const std::string& jpeg, int orientation) {
@@ -58,8 +38,8 @@ void tagExifOrientation(const std::string& jpeg, int orientation) {
       'M',  'M',  0, 42, 0,   0,   0,   8,   0, 1,
       0x01, 0x12, 0, 3,  0,   0,   0,   1,   0, static_cast<unsigned char>(orientation),
       0,    0,    0, 0,  0,   0};
-  const std::string bytes = fileBytes(jpeg);
-  writeBytes(jpeg, bytes.substr(0, 2) + std::string(block, block + sizeof block) + bytes.substr(2));
+  const std::string bytes = slurp(jpeg);
+  writeText(jpeg, bytes.substr(0, 2) + std::string(block, block + sizeof block) + bytes.substr(2));
 }
 
 }  // namespace testsupport

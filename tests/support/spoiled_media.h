@@ -1,6 +1,5 @@
-// Media files spoiled as real ones are: a video packet cut in half or overwritten in the
-// middle, and photos carrying an EXIF orientation tag (written here byte by byte, so that no
-// tool's idea of the tag stands between the test and the file).
+// Media spoiled as real files are: a video packet cut in half or overwritten, and photos with an
+// EXIF orientation tag written byte by byte, so that no tool's idea of the tag stands between.
 #pragma once
 
 #include <string>

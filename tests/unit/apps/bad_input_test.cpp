@@ -1,6 +1,5 @@
-// Bad input to every command, from a wrong option to a hostile file: one line on stderr naming
-// the file, the field where there is one and what was expected, a failing status, nothing on
-// stdout and nothing left on disk; never a crash.
+// Bad input to every command, from a wrong option to a hostile file: one line naming the file,
+// the field and what was expected, a failing status, nothing on stdout or disk; never a crash.
 #include <dlfcn.h>
 #include <gtest/gtest.h>
 #include <link.h>
@@ -55,39 +54,40 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
     std::string badText = "";  // written to bad.json first, when not empty
     const char* plugin = VELTRANE_MODULE_PATH;
   };
+  // The line names the command first.
+  auto refused = [&](const std::vector<std::string>& args, int status, const std::string& expected,
+                     const std::string& badText = "", const char* plugin = VELTRANE_MODULE_PATH) {
+    return Case{args, status, "veltrane " + args[0] + ": " + expected, badText, plugin};
+  };
   auto badScene = [&](const std::string& text, const std::string& expected) {
-    return Case{{"render", bad, "-o", out}, 1, "veltrane render: " + bad + ": " + expected, text};
+    return refused({"render", bad, "-o", out}, 1, bad + ": " + expected, text);
   };
   auto badScript = [&](const std::string& text, const std::string& expected) {
-    return Case{{"interact", scene, "--events", bad, "-o", folder.file("r.json")},
-                1,
-                "veltrane interact: " + bad + ": " + expected,
-                text};
+    return refused({"interact", scene, "--events", bad, "-o", folder.file("r.json")}, 1,
+                   bad + ": " + expected, text);
   };
   auto badRender = [&](const std::vector<std::string>& options, const std::string& expected) {
     std::vector<std::string> args{"render", scene};
     args.insert(args.end(), options.begin(), options.end());
-    return Case{args, 2, "veltrane render: " + expected};
+    return refused(args, 2, expected);
   };
-  const std::string unloadable = "veltrane info: cannot load plug-in module '";
+  const std::string unloadable = "cannot load plug-in module '";
+  const std::string patterns = R"(expected one of "bars", "checker", "gradient", "counter")";
   const Case cases[] = {
-      {{"info", "--plugin", "/nonexistent/veltrane.so"},
-       1,
-       unloadable + "/nonexistent/veltrane.so': No such file or directory"},
-      {{"info", "--plugin", notALibrary}, 1, unloadable + notALibrary + "': not a loadable"},
-      {{"info", "--plugin", mathLibraryPath()},
-       1,
-       unloadable + mathLibraryPath() + "': it does not export PluginInfo"},
-      {{"info"}, 1, unloadable + "/nonexistent/from-env.so'", "", "/nonexistent/from-env.so"},
-      {{"info", "--frobnicate"}, 2, "veltrane info: unknown option '--frobnicate'"},
-      {{"info", "--host-id", "12x"},
-       2,
-       "veltrane info: option '--host-id' expects a whole number (32-bit), got '12x'"},
-      {{"info", "--host-id", "4294967296"},
-       2,
-       "veltrane info: option '--host-id' expects a whole number (32-bit), got '4294967296'"},
-      {{"info", "--host-id"}, 2, "veltrane info: option '--host-id' needs a value"},
-      {{"info", "stray"}, 2, "veltrane info: unexpected argument 'stray'"},
+      refused({"info", "--plugin", "/nonexistent/veltrane.so"}, 1,
+              unloadable + "/nonexistent/veltrane.so': No such file or directory"),
+      refused({"info", "--plugin", notALibrary}, 1, unloadable + notALibrary + "': not a loadable"),
+      refused({"info", "--plugin", mathLibraryPath()}, 1,
+              unloadable + mathLibraryPath() + "': it does not export PluginInfo"),
+      refused({"info"}, 1, unloadable + "/nonexistent/from-env.so'", "",
+              "/nonexistent/from-env.so"),
+      refused({"info", "--frobnicate"}, 2, "unknown option '--frobnicate'"),
+      refused({"info", "--host-id", "12x"}, 2,
+              "option '--host-id' expects a whole number (32-bit), got '12x'"),
+      refused({"info", "--host-id", "4294967296"}, 2,
+              "option '--host-id' expects a whole number (32-bit), got '4294967296'"),
+      refused({"info", "--host-id"}, 2, "option '--host-id' needs a value"),
+      refused({"info", "stray"}, 2, "unexpected argument 'stray'"),
       {{"render-everything"}, 2, "veltrane: unknown command 'render-everything'"},
       badRender({}, "needs -o OUT"),
       badRender({"-o", folder.file("x.jpg")},
@@ -101,11 +101,11 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
                 "give --frame, --frames or --from/--to, not more than one"),
       badRender({"-o", out, "--profile", "es"},
                 "option '--profile' expects core or compat, got 'es'"),
-      {{"interact", scene, "--events", folder.file("events.json"), "-o", folder.file("r.json"),
-        "--overlay", folder.file("f")},
-       2,
-       "veltrane interact: option '--overlay' expects a folder, '" + folder.file("f") +
-           "' is a file (see 'veltrane interact --help')"},
+      refused({"interact", scene, "--events", folder.file("events.json"), "-o",
+               folder.file("r.json"), "--overlay", folder.file("f")},
+              2,
+              "option '--overlay' expects a folder, '" + folder.file("f") +
+                  "' is a file (see 'veltrane interact --help')"),
       badScene(spoiled(",\"width\":64", ""),
                "width: expected a whole number from 1 to 16384 (missing)"),
       badScene(spoiled("\"height\":36", "\"height\":\"36\""),
@@ -115,8 +115,7 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
       badScene(spoiled("\"fps\":25", "\"fps\":0"),
                "fps: expected a number from 0.001 to 1000, got 0"),
       badScene(spoiled("\"fps\":25", "\"fps\":25,\"colour\":1"), "colour: expected no such field"),
-      badScene(spoiled("bars", "zebra"),
-               "source.pattern: expected one of \"bars\", \"checker\", \"gradient\", \"counter\""),
+      badScene(spoiled("bars", "zebra"), "source.pattern: " + patterns),
       badScene(spoiled("{\"pattern\":\"bars\"}", "{\"color\":[1,0,0,2]}"),
                "source.color[3]: expected a number from 0 to 1, got 2"),
       badScene(spoiled("{\"pattern\":\"bars\"}", "{\"file\":\"missing.png\"}"),
@@ -161,13 +160,10 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
       badScene("{\"width\": 64,", "not valid JSON"),
       badScene(smallScene("bars").dump() + std::string(std::size_t{16} << 20, ' '),
                "is larger than 16 MiB"),
-      {{"render", folder.file("media"), "-o", out},
-       1,
-       "veltrane render: " + folder.file("media") + ": is a directory; expected a JSON file"},
-      {{"render", folder.file("a.json"), "-o", out},
-       1,
-       "veltrane render: " + folder.file("a.json") +
-           ": cannot be read (Too many levels of symbolic links)"},
+      refused({"render", folder.file("media"), "-o", out}, 1,
+              folder.file("media") + ": is a directory; expected a JSON file"),
+      refused({"render", folder.file("a.json"), "-o", out}, 1,
+              folder.file("a.json") + ": cannot be read (Too many levels of symbolic links)"),
       badScript(R"({"events": [{"poke": [1, 2]}]})", "events[0]: expected one event"),
       badScript(R"({"events": [{"press": [1.5, 3]}]})",
                 "events[0].press[0]: expected a whole number"),
@@ -176,15 +172,10 @@ TEST(CommandLine, RefusesBadInputWithOneLineAndWritesNothing) {
       badScript(R"({"viewScale": [1], "events": []})", "viewScale: expected [sx, sy]"),
       badScript(R"({"view": 1, "events": []})", "view: expected no such field"),
       // The viewer reads its scene as render does, before it looks for a display.
-      {{"view", bad},
-       1,
-       "veltrane view: " + bad +
-           ": source.pattern: expected one of \"bars\", \"checker\", \"gradient\", \"counter\"",
-       spoiled("bars", "zebra")},
-      {{"view", scene},
-       1,
-       "veltrane view: cannot open a window: no display (DISPLAY is not set); run it under a "
-       "virtual X server, e.g. xvfb-run -a veltrane view SCENE.json\n"},
+      refused({"view", bad}, 1, bad + ": source.pattern: " + patterns, spoiled("bars", "zebra")),
+      refused({"view", scene}, 1,
+              "cannot open a window: no display (DISPLAY is not set); run it under a virtual X "
+              "server, e.g. xvfb-run -a veltrane view SCENE.json\n"),
   };
   for (const Case& c : cases) {
     if (!c.badText.empty()) writeText(bad, c.badText);

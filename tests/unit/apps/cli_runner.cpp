@@ -3,43 +3,12 @@
 
 #include <unistd.h>
 
-#include <cstdio>
-#include <fstream>
-#include <iterator>
-
 #include "support/child_process.h"
-#include "support/temp_paths.h"
-
-extern char** environ;
-
-std::string slurp(const std::string& path) {
-  std::ifstream file(path);
-  return std::string(std::istreambuf_iterator<char>(file), {});
-}
-
-std::string commandOutput(const std::string& command) {
-  std::string text;
-  if (FILE* pipe = popen(command.c_str(), "r")) {
-    char buffer[4096];
-    for (std::size_t n; (n = fread(buffer, 1, sizeof buffer, pipe)) > 0;) text.append(buffer, n);
-    pclose(pipe);
-  }
-  return text;
-}
-
-void writeText(const std::string& path, const std::string& text) {
-  std::ofstream file(path);
-  file << text;
-}
 
 CliRun runCli(const std::vector<std::string>& args, const char* plugin,
               const std::function<void(int)>& whileRunning) {
-  std::vector<std::string> environment;
-  for (char** entry = environ; *entry; ++entry) {
-    const std::string name = std::string(*entry).substr(0, std::string(*entry).find('='));
-    if (name != "VELTRANE_PLUGIN" && name != "DISPLAY" && name != "WAYLAND_DISPLAY")
-      environment.push_back(*entry);
-  }
+  std::vector<std::string> environment =
+      testsupport::environmentWithout({"VELTRANE_PLUGIN", "DISPLAY", "WAYLAND_DISPLAY"});
   environment.push_back(std::string("VELTRANE_PLUGIN=") + plugin);
   std::vector<std::string> argv{VELTRANE_CLI_PATH};
   argv.insert(argv.end(), args.begin(), args.end());

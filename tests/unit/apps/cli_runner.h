@@ -7,9 +7,13 @@
 #include <string>
 #include <vector>
 
+#include "support/files.h"
 #include "support/temp_paths.h"
 
+using testsupport::commandOutput;
 using testsupport::ScratchDirectory;
+using testsupport::slurp;
+using testsupport::writeText;
 
 struct CliRun {
   int status = -1;  // exit status; -1 when the process did not exit normally
@@ -22,11 +26,6 @@ struct CliRun {
 // before the wait.
 CliRun runCli(const std::vector<std::string>& args, const char* plugin = VELTRANE_MODULE_PATH,
               const std::function<void(int)>& whileRunning = nullptr);
-
-std::string slurp(const std::string& path);
-// What a shell command (ffprobe, ffmpeg) prints on stdout.
-std::string commandOutput(const std::string& command);
-void writeText(const std::string& path, const std::string& text);
 
 extern const char kLayerA[];
 // 64x36 at 25 fps with one layer (A), showing the pattern: one vertical Local cut near the right

@@ -1,6 +1,5 @@
-// The examples the documentation shows are what the commands give: the event script's result in
-// docs/events-format.md and the file scripts/examples writes for it, and every layout's scene
-// in docs/examples/presets/.
+// The examples the documentation shows are what the commands give: the event script's result and
+// every layout's preset scene.
 #include <gtest/gtest.h>
 
 #include <algorithm>

@@ -1,8 +1,5 @@
-// A job divided into chunks and joined again: chunks rendered apart and assembled equal a single
-// render of the job (frame for frame with FFV1, within the codec's loss with H.264 and H.265;
-// timestamps and sound alike), with time shifts and a layer that cross the chunks' boundaries
-// and a chunk of one frame; a chunk that does not fit is refused in one line with nothing
-// written, and rendering it again gives the clean result.
+// A job divided into chunks and assembled equals a single render of it; a chunk that does not fit
+// is refused in one line with nothing written, and rendering it again gives the clean result.
 #include <gtest/gtest.h>
 #include <signal.h>
 
@@ -22,19 +19,14 @@ namespace fs = std::filesystem;
 class FarmJob : public ::testing::Test {
  protected:
   void SetUp() override {
-    const std::string make = "ffmpeg -v error -y -f lavfi -i ";
-    ASSERT_EQ(std::system((make +
-                           "gradients=size=320x180:rate=25:duration=4:speed=0.02 -f lavfi "
-                           "-i sine=frequency=440:duration=4 -c:v libx264 -g 30 -c:a aac " +
-                           folder.file("a.mp4"))
-                              .c_str()),
-              0);
-    ASSERT_EQ(std::system((make +
-                           "gradients=size=320x180:rate=25:duration=4:speed=0.05:seed=3:n=5 "
-                           "-c:v libx264 -g 30 " +
-                           folder.file("b.mp4"))
-                              .c_str()),
-              0);
+    auto make = [&](const std::string& options, const char* name) {
+      return std::system(
+          ("ffmpeg -v error -y -f lavfi -i gradients=size=320x180:rate=25:duration=4:" + options +
+           " -c:v libx264 -g 30 " + folder.file(name))
+              .c_str());
+    };
+    ASSERT_EQ(make("speed=0.02 -f lavfi -i sine=frequency=440:duration=4 -c:a aac", "a.mp4"), 0);
+    ASSERT_EQ(make("speed=0.05:seed=3:n=5", "b.mp4"), 0);
     writeText(scene, scene_text());
   }
 
@@ -154,22 +146,16 @@ TEST_F(FarmJob, RefusesChunksThatDoNotFitAndTakesThemRenderedAgain) {
     const char* says;
     int redo;  // the chunk rendered again afterwards; -1: none
   };
+  auto replaceWith = [&](const std::string& other, int i) {
+    return [&, other, i] {
+      fs::copy_file(folder.file(other), chunk(i), fs::copy_options::overwrite_existing);
+    };
+  };
   const Case cases[] = {
       {"missing", [&] { fs::remove(chunk(2)); }, "chunk 2 (", 2},
-      {"another scene",
-       [&] {
-         fs::copy_file(folder.file("edited.chunk001.mkv"), chunk(1),
-                       fs::copy_options::overwrite_existing);
-       },
-       "another version of the scene", 1},
-      {"other settings",
-       [&] {
-         fs::copy_file(folder.file("gop.chunk002.mkv"), chunk(2),
-                       fs::copy_options::overwrite_existing);
-       },
-       "other settings", 2},
-      {"out of order",
-       [&] { fs::copy_file(chunk(0), chunk(3), fs::copy_options::overwrite_existing); },
+      {"another scene", replaceWith("edited.chunk001.mkv", 1), "another version of the scene", 1},
+      {"other settings", replaceWith("gop.chunk002.mkv", 2), "other settings", 2},
+      {"out of order", replaceWith("job.chunk000.mkv", 3),
        "holds chunk 0, frames 0-14, not chunk 3", 3},
       {"cut short", [&] { fs::resize_file(chunk(1), fs::file_size(chunk(1)) / 2); }, "chunk 1", 1},
       {"killed while rendered",
@@ -181,8 +167,7 @@ TEST_F(FarmJob, RefusesChunksThatDoNotFitAndTakesThemRenderedAgain) {
                    -1);
          EXPECT_FALSE(fs::exists(chunk(3)));
        },
-       "chunk 3 (", 3},
-  };
+       "chunk 3 (", 3}};
   for (const Case& c : cases) {
     c.damage();
     const CliRun refused = assemble("job.mkv");

@@ -113,9 +113,8 @@ TEST(OutputWrites, AFailedWriteIsOneLineAndLeavesWhatWasThere) {
   }
 }
 
-// Outputs refused before anything is read or written: an input named as the output (through a
-// link, a hard link, a frame pattern), a folder under the output's name, a place that takes no
-// files, and a file already there unless -y replaces it.
+// Refused before anything is read or written: an input named as the output (through a link, a
+// hard link, a pattern), a folder, a place that takes no files, a file there unless -y.
 TEST(OutputWrites, RefusedOutputsAreOneLineAndWriteNothing) {
   ScratchDirectory folder;
   const std::string a = folder.file("a.mp4");
@@ -131,54 +130,47 @@ TEST(OutputWrites, RefusedOutputsAreOneLineAndWriteNothing) {
   writeText(folder.file("there.png"), "old");
   writeText(folder.file("events.json"), R"({"events": []})");
   SmallFileSystem readOnly(16, MS_RDONLY);
+  const std::string link = folder.file("link.mp4"), there = folder.file("there.png"),
+                    events = folder.file("events.json"), blocked = readOnly.file("new/out.mp4");
   struct Case {
     std::vector<std::string> args;
     int status;
-    std::string line;  // the one line on stderr, from its start
-  } const cases[] = {
-      {{"split", a, "pattern:bars", "-o", folder.file("link.mp4")},
-       2,
-       "veltrane split: option '-o': " + folder.file("link.mp4") + " is the input " + a},
-      {{"split", a, "pattern:bars", "-o", folder.file("o.png"), "--save-scene", a},
-       2,
-       "veltrane split: option '--save-scene': " + a + " is the input " + a},
-      {{"render", scenePath, "-o", folder.file("f%04d.png")},
-       2,
-       "veltrane render: option '-o': " + folder.file("f%04d.png") + " is the input " +
-           folder.file("layer.png")},
-      {{"interact", scenePath, "--events", folder.file("events.json"), "-o",
-        folder.file("events.json")},
-       2,
-       "veltrane interact: option '-o': " + folder.file("events.json") + " is the input"},
-      {{"split", a, "-o", folder.file("folder.png")},
-       1,
-       "veltrane split: " + folder.file("folder.png") + ": is a folder; -o names a file"},
-      {{"split", a, "-o", readOnly.file("new/out.mp4")},
-       1,
-       "veltrane split: " + readOnly.file("new/out.mp4") + ": cannot write in " + readOnly.path() +
-           ": Read-only file system"},
-      {{"split", a, "-o", folder.file("there.png")},
-       2,
-       "veltrane split: " + folder.file("there.png") + " exists; give -y to replace or -n"},
-      {{"split", a, "-o", folder.file("there.png"), "-n"},
-       1,
-       "veltrane split: " + folder.file("there.png") + " exists; kept as -n asks"},
-      {{"split", a, "-o", folder.file("there.png"), "-y", "-n"},
-       2,
-       "veltrane split: give -y (replace outputs) or -n (keep them), not both"},
+    std::string line;  // the one line on stderr after the command's name, from its start
+  };
+  auto refused = [](std::vector<std::string> args, int status, std::string line) {
+    return Case{std::move(args), status, std::move(line)};
+  };
+  const Case cases[] = {
+      refused({"split", a, "pattern:bars", "-o", link}, 2,
+              "option '-o': " + link + " is the input " + a),
+      refused({"split", a, "pattern:bars", "-o", folder.file("o.png"), "--save-scene", a}, 2,
+              "option '--save-scene': " + a + " is the input " + a),
+      refused(
+          {"render", scenePath, "-o", folder.file("f%04d.png")}, 2,
+          "option '-o': " + folder.file("f%04d.png") + " is the input " + folder.file("layer.png")),
+      refused({"interact", scenePath, "--events", events, "-o", events}, 2,
+              "option '-o': " + events + " is the input"),
+      refused({"split", a, "-o", folder.file("folder.png")}, 1,
+              folder.file("folder.png") + ": is a folder; -o names a file"),
+      refused({"split", a, "-o", blocked}, 1,
+              blocked + ": cannot write in " + readOnly.path() + ": Read-only file system"),
+      refused({"split", a, "-o", there}, 2, there + " exists; give -y to replace or -n"),
+      refused({"split", a, "-o", there, "-n"}, 1, there + " exists; kept as -n asks"),
+      refused({"split", a, "-o", there, "-y", "-n"}, 2,
+              "give -y (replace outputs) or -n (keep them), not both"),
   };
   const std::map<std::string, std::string> before = snapshot(folder.path());
   for (const Case& c : cases) {
     CliRun run = runCli(c.args);
     EXPECT_EQ(run.status, c.status) << c.line;
-    EXPECT_EQ(run.err.rfind(c.line, 0), 0u) << run.err;
+    EXPECT_EQ(run.err.rfind("veltrane " + c.args[0] + ": " + c.line, 0), 0u) << run.err;
     EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << run.err;
     EXPECT_EQ(snapshot(folder.path()), before) << c.line;
     EXPECT_TRUE(fs::is_empty(readOnly.path()));
   }
-  CliRun replaced = runCli({"split", a, "-o", folder.file("there.png"), "-y"});
+  CliRun replaced = runCli({"split", a, "-o", there, "-y"});
   EXPECT_EQ(replaced.status, 0) << replaced.err;
-  EXPECT_NE(slurp(folder.file("there.png")), "old");
+  EXPECT_NE(slurp(there), "old");
 }
 
 // Sends the signal once the command has written into a temporary, and had a moment more.
@@ -203,11 +195,9 @@ TEST(StopSignals, StopCleanlyWithTheSignalsExitStatus) {
     int signal;
     std::string name, command;
     std::vector<std::string> outputs;
-  } const cases[] = {
-      {SIGINT, "SIGINT", "render", {"-o", "s_%04d.png"}},
-      {SIGTERM, "SIGTERM", "render", {"-o", "v.mp4"}},
-      {SIGHUP, "SIGHUP", "interact", {"-o", "r.json", "--overlay", "ov"}},
-  };
+  } const cases[] = {{SIGINT, "SIGINT", "render", {"-o", "s_%04d.png"}},
+                     {SIGTERM, "SIGTERM", "render", {"-o", "v.mp4"}},
+                     {SIGHUP, "SIGHUP", "interact", {"-o", "r.json", "--overlay", "ov"}}};
   for (const Case& c : cases) {
     ScratchDirectory folder;
     for (const char* name : {"s_0001.png", "v.mp4", "r.json"}) writeText(folder.file(name), "old");

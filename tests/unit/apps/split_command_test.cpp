@@ -1,7 +1,5 @@
-// `veltrane split` end to end: the frames a split renders are the frames `render` makes of the
-// scene it saves, clips of other proportions keep theirs, a layout with more regions than clips
-// says so, clips are read as FFmpeg reads them (rates, photos, damage), and bad input is one
-// line with status 2 and nothing written.
+// `veltrane split` end to end: what it renders is what `render` makes of the scene it saves; clips
+// are read as FFmpeg reads them; bad input is one line with status 2 and nothing written.
 #include <gtest/gtest.h>
 
 #include <filesystem>
@@ -75,11 +73,8 @@ TEST(SplitCommand, RendersWhatTheSceneItSavesRenders) {
   EXPECT_TRUE(portraitFramed) << params;
 }
 
-// A layout with more regions than clips saying so; the first video's nominal rate (a
-// variable-rate clip's steady 30), a still first clip saying which rate it took (and shown
-// upright), --fps as a fraction or a drop-frame decimal, damage concealed with a warning or
-// refused with --strict, a damaged still refused: every message one line of our own, whatever
-// the libraries would have printed.
+// Layouts filled again, the first video's nominal rate or a still's note, --fps, damage concealed
+// or refused: every message one line of our own, whatever the libraries would have printed.
 TEST(SplitCommand, ReadsClipsAsFfmpegDoes) {
   ScratchDirectory folder;
   const std::string a = clip(folder, "a.mp4", "160x90"),
@@ -98,41 +93,37 @@ TEST(SplitCommand, ReadsClipsAsFfmpegDoes) {
   writeText(spoilt, png.substr(0, png.size() / 2) + std::string(64, '\0') +
                         png.substr(png.size() / 2 + 64));
   const std::string out = folder.file("out.mp4");
-  const struct {
+  struct Case {
     std::vector<std::string> args;
     int status;
-    std::string line;   // one of the lines on stderr starts with it
+    std::string line;   // one of the lines on stderr starts with it, after the command's name
     const char* shown;  // width, height and rate of the video written
-  } cases[] = {
-      {{a, "pattern:checker", "--layout", "grid"},
-       0,
-       "veltrane split: note: grid-2x2 shows 4 pictures; the 2 clips given fill them again in "
-       "order",
-       "160,90,25/1"},
-      {{dropped}, 0, "", "64,36,30/1"},
-      {{photo, a},
-       0,
-       "veltrane split: note: clip 1 (photo.jpg) is a still: the frames run at 25 fps, the rate "
-       "of clip 2 (a.mp4); --fps R sets another rate",
-       "90,160,25/1"},
-      {{a, "--fps", "29.97"}, 0, "", "160,90,30000/1001"},
-      {{a, "--fps", "30000/1001"}, 0, "", "160,90,30000/1001"},
-      {{damaged},
-       0,
-       "veltrane split: warning: damaged frames were shown as the decoder concealed them: clip 1 "
-       "(bad.mp4): frame ",
-       "160,90,25/1"},
-      {{damaged, "--strict"}, 1, "veltrane split: clip 1 (bad.mp4): frame ", nullptr},
-      {{spoilt},
-       2,
-       "veltrane split: argument '" + spoilt +
-           "': expected a video or image file that shows a picture (cannot read image: its data "
-           "is damaged (",
-       nullptr},
-      {{a, "--fps", "30/0"},
-       2,
-       "veltrane split: option '--fps' expects a rate from 0.001 to 1000",
-       nullptr},
+  };
+  auto split = [](std::vector<std::string> args, int status, std::string line, const char* shown) {
+    return Case{std::move(args), status, std::move(line), shown};
+  };
+  const Case cases[] = {
+      split({a, "pattern:checker", "--layout", "grid"}, 0,
+            "note: grid-2x2 shows 4 pictures; the 2 clips given fill them again in order",
+            "160,90,25/1"),
+      split({dropped}, 0, "", "64,36,30/1"),
+      split({photo, a}, 0,
+            "note: clip 1 (photo.jpg) is a still: the frames run at 25 fps, the rate of clip 2 "
+            "(a.mp4); --fps R sets another rate",
+            "90,160,25/1"),
+      split({a, "--fps", "29.97"}, 0, "", "160,90,30000/1001"),
+      split({a, "--fps", "30000/1001"}, 0, "", "160,90,30000/1001"),
+      split({damaged}, 0,
+            "warning: damaged frames were shown as the decoder concealed them: clip 1 (bad.mp4): "
+            "frame ",
+            "160,90,25/1"),
+      split({damaged, "--strict"}, 1, "clip 1 (bad.mp4): frame ", nullptr),
+      split({spoilt}, 2,
+            "argument '" + spoilt +
+                "': expected a video or image file that shows a picture (cannot read image: its "
+                "data is damaged (",
+            nullptr),
+      split({a, "--fps", "30/0"}, 2, "option '--fps' expects a rate from 0.001 to 1000", nullptr),
   };
   for (const auto& c : cases) {
     std::vector<std::string> args{"split"};
@@ -146,7 +137,7 @@ TEST(SplitCommand, ReadsClipsAsFfmpegDoes) {
     bool found = c.line.empty();
     for (std::string line; std::getline(lines, line);) {
       EXPECT_EQ(line.rfind("veltrane split: ", 0), 0u) << line;
-      found = found || line.rfind(c.line, 0) == 0;
+      found = found || line.rfind("veltrane split: " + c.line, 0) == 0;
     }
     EXPECT_TRUE(found);
     EXPECT_EQ(std::filesystem::exists(out), c.shown != nullptr);
@@ -183,52 +174,46 @@ TEST(SplitCommand, RefusesBadInputWithOneLineAndWritesNothing) {
   commandOutput("ffmpeg -v error -y -f lavfi -i sine=frequency=440 -t 0.5 " +
                 folder.file("sound.mp4"));
   const std::string out = folder.file("out.png");
-  const std::vector<std::string> tenClips(10, a);
   struct Case {
     std::vector<std::string> args;
-    std::string line;  // how the one line on stderr starts
+    std::string line;  // in the one line on stderr, after the command's name
   };
-  std::vector<std::string> tooMany{"split"};
-  tooMany.insert(tooMany.end(), tenClips.begin(), tenClips.end());
-  tooMany.insert(tooMany.end(), {"-o", out});
+  auto refused = [&](std::vector<std::string> args, const std::string& line) {
+    args.insert(args.begin(), "split");
+    args.insert(args.end(), {"-o", out});
+    return Case{args, line};
+  };
+  const std::string shows = "': expected a video or image file that shows a picture";
   const Case cases[] = {
-      {{"split", a, folder.file("missing.mp4"), "-o", out},
-       "veltrane split: argument '" + folder.file("missing.mp4") +
-           "': expected a video or image file, and there is no such file"},
-      {{"split", folder.file("text.mp4"), "-o", out},
-       "veltrane split: argument '" + folder.file("text.mp4") +
-           "': expected a video or image file that shows a picture"},
-      {{"split", a, folder.file("sound.mp4"), "-o", out},
-       "veltrane split: argument '" + folder.file("sound.mp4") +
-           "': expected a video or image file that shows a picture"},
-      {tooMany, "veltrane split: expects 1 to 9 clips, got 10"},
-      {{"split", a, a, a, "--layout", "diagonal-2", "-o", out},
-       "veltrane split: option '--layout': diagonal-2 shows 2 pictures, fewer than the 3 clips"},
-      {{"split", a, "--layout", "zigzag", "-o", out},
-       "veltrane split: option '--layout': expected one of diagonal-2, vertical-2, horizontal-2, "
-       "slanted-2"},
-      {{"split", a, a, "--layout", "diagnal", "-o", out},
-       "got 'diagnal'; did you mean 'diagonal'?"},
-      {{"split", a, a, "--bordr", "4", "-o", out},
-       "veltrane split: unknown option '--bordr'; did you mean '--border'?"},
-      {{"split", a, a, "--nudge", "3:0,0", "-o", out},
-       "veltrane split: option '--nudge': expected a clip number from 1 to 2, got 3"},
-      {{"split", a, a, "--frame", "2:0,40", "-o", out},
-       "veltrane split: option '--frame' takes the frame to render (N, or a time); a clip's "
-       "picture is moved with --nudge 2:0,40"},
-      {{"split", a, "pattern:bars", "--trim", "2:1", "-o", out},
-       "veltrane split: option '--trim': clip 2 (bars) is a still picture"},
-      {{"split", a, "--trim", "1:5", "-o", out},
-       "veltrane split: option '--trim': clip 1 (a) lasts 1 s; a start of 5 s lies past its end"},
-      {{"split", a, a, "--gap", "20", "-o", out},
-       "veltrane split: option '--gap': the cuts of diagonal-2 do not run side by side"},
-      {{"split", a, "--border", "4,mauve", "-o", out},
-       "veltrane split: option '--border' expects a colour as RRGGBB or a name"},
-      {{"split", a}, "veltrane split: needs -o OUT (or --save-scene FILE.json alone)"},
-  };
+      refused({a, folder.file("missing.mp4")},
+              "argument '" + folder.file("missing.mp4") +
+                  "': expected a video or image file, and there is no such file"),
+      refused({folder.file("text.mp4")}, "argument '" + folder.file("text.mp4") + shows),
+      refused({a, folder.file("sound.mp4")}, "argument '" + folder.file("sound.mp4") + shows),
+      refused(std::vector<std::string>(10, a), "expects 1 to 9 clips, got 10"),
+      refused({a, a, a, "--layout", "diagonal-2"},
+              "option '--layout': diagonal-2 shows 2 pictures, fewer than the 3 clips"),
+      refused({a, "--layout", "zigzag"},
+              "option '--layout': expected one of diagonal-2, vertical-2, horizontal-2, slanted-2"),
+      refused({a, a, "--layout", "diagnal"}, "got 'diagnal'; did you mean 'diagonal'?"),
+      refused({a, a, "--bordr", "4"}, "unknown option '--bordr'; did you mean '--border'?"),
+      refused({a, a, "--nudge", "3:0,0"},
+              "option '--nudge': expected a clip number from 1 to 2, got 3"),
+      refused({a, a, "--frame", "2:0,40"},
+              "option '--frame' takes the frame to render (N, or a time); a clip's picture is "
+              "moved with --nudge 2:0,40"),
+      refused({a, "pattern:bars", "--trim", "2:1"},
+              "option '--trim': clip 2 (bars) is a still picture"),
+      refused({a, "--trim", "1:5"},
+              "option '--trim': clip 1 (a) lasts 1 s; a start of 5 s lies past its end"),
+      refused({a, a, "--gap", "20"},
+              "option '--gap': the cuts of diagonal-2 do not run side by side"),
+      refused({a, "--border", "4,mauve"}, "option '--border' expects a colour as RRGGBB or a name"),
+      {{"split", a}, "needs -o OUT (or --save-scene FILE.json alone)"}};
   for (const Case& c : cases) {
     CliRun run = runCli(c.args);
     EXPECT_EQ(run.status, 2) << c.line << "\n" << run.err;
+    EXPECT_EQ(run.err.rfind("veltrane split: ", 0), 0u) << run.err;
     EXPECT_NE(run.err.find(c.line), std::string::npos) << run.err;
     EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << run.err;
     EXPECT_FALSE(std::filesystem::exists(out)) << c.line;

@@ -4,7 +4,6 @@
 
 #include <gtest/gtest.h>
 
-#include <utility>
 #include <vector>
 
 #include "refhost/core/host.h"
@@ -27,6 +26,18 @@ SplitScreenCutPositionControl controlFor(PointParam& param) {
 
 const genVec2 kFrame{1920.0f, 1080.0f};
 
+// Tests the pointer against the segment from a to b; the cursors asked for on the way.
+bool hot(genVec2 a, genVec2 b, genVec2 pointer, float viewScale, std::vector<int32_t>* cursors) {
+  testsupport::InstrumentedHost host;
+  PointParam param;
+  SplitScreenCutPositionControl control = controlFor(param);
+  const bool result = control.test(host.handle(), &host.api(), kFrame, a, b, pointer,
+                                   {viewScale, viewScale}, 0.0f, 0);
+  EXPECT_EQ(control.hot, result ? 1 : 0);
+  *cursors = host.cursorShapes();
+  return result;
+}
+
 TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
   const genVec2 a{100.0f, 100.0f};
   const genVec2 b{100.0f, 300.0f};
@@ -43,35 +54,19 @@ TEST(CutPositionControl, HotOnlyBetweenTheEndsAndWithinReach) {
       {{100.0f, 300.0f}, 1.0f, false, -1},                                       // t = 1
       {{100.0f, 50.0f}, 1.0f, false, -1},  {{100.0f, 301.0f}, 1.0f, false, -1},
   };
+  std::vector<int32_t> cursors;
   for (const auto& c : cases) {
-    testsupport::InstrumentedHost host;
-    PointParam param;
-    SplitScreenCutPositionControl control = controlFor(param);
-    EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, b, c.pointer,
-                           {c.viewScale, c.viewScale}, 0.0f, 0),
-              c.hot)
+    EXPECT_EQ(hot(a, b, c.pointer, c.viewScale, &cursors), c.hot)
         << c.pointer.x << "," << c.pointer.y;
-    EXPECT_EQ(control.hot, c.hot ? 1 : 0);
-    const std::vector<int32_t> cursors =
-        c.cursor < 0 ? std::vector<int32_t>{} : std::vector{c.cursor};
-    EXPECT_EQ(host.cursorShapes(), cursors) << c.pointer.x << "," << c.pointer.y;
+    EXPECT_EQ(cursors, c.cursor < 0 ? std::vector<int32_t>{} : std::vector{c.cursor})
+        << c.pointer.x << "," << c.pointer.y;
   }
   // Across a horizontal segment the reach follows the vertical view scale.
-  for (const auto& [y, hot] : {std::pair{107.0f, true}, std::pair{108.0f, false}}) {
-    testsupport::InstrumentedHost host;
-    PointParam param;
-    SplitScreenCutPositionControl control = controlFor(param);
-    EXPECT_EQ(control.test(host.handle(), &host.api(), kFrame, a, {300.0f, 100.0f}, {200.0f, y},
-                           {2.0f, 2.0f}, 0.0f, 0),
-              hot)
-        << y;
-  }
+  EXPECT_TRUE(hot(a, {300.0f, 100.0f}, {200.0f, 107.0f}, 2.0f, &cursors));
+  EXPECT_FALSE(hot(a, {300.0f, 100.0f}, {200.0f, 108.0f}, 2.0f, &cursors));
   // A zero-length segment has no inside at all.
-  testsupport::InstrumentedHost host;
-  PointParam param;
-  SplitScreenCutPositionControl control = controlFor(param);
-  EXPECT_FALSE(control.test(host.handle(), &host.api(), kFrame, a, a, a, {1, 1}, 0.0f, 0));
-  EXPECT_TRUE(host.cursorShapes().empty());
+  EXPECT_FALSE(hot(a, a, a, 1.0f, &cursors));
+  EXPECT_TRUE(cursors.empty());
 }
 
 }  // namespace

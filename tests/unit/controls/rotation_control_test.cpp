@@ -45,10 +45,6 @@ genVec2 around(float degrees, float distance, float along = 0.0f) {
           kCentre.y + distance * std::cos(a) - along * std::sin(a)};
 }
 
-int lastCursor(const testsupport::InstrumentedHost& host) {
-  return host.cursorShapes().empty() ? -1 : host.cursorShapes().back();
-}
-
 TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
   const struct {
     float degrees;
@@ -62,7 +58,7 @@ TEST(RotationControl, HoverShowsTheRotateCursorOfTheHandlesOctant) {
                              kUnitScale, 1.0f, 0.0f, 0))
         << c.degrees;
     EXPECT_EQ(control.hot, 1);
-    EXPECT_EQ(lastCursor(host), c.cursor) << c.degrees;
+    EXPECT_EQ(host.lastCursor(), c.cursor) << c.degrees;
   }
 }
 

@@ -1,27 +1,24 @@
-// Every command a reader would type from README.md and docs/*.md (their ```sh blocks) runs as
-// printed, in order, in a fresh folder holding the checkout and its build, as on a fresh
-// checkout after scripts/demo. Commands that take minutes run until their first result; only
-// those that open a window or need root are left out, each with its reason below.
+// Every command of README.md's and docs/*.md's shell blocks runs as printed, in order, in a copy of
+// the checkout and its build; long ones until their first result, a few left out with a reason.
 #include <gtest/gtest.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
 #include <regex>
 #include <sstream>
 
 #include "support/child_process.h"
+#include "support/files.h"
 #include "support/temp_paths.h"
-
-extern char** environ;
 
 namespace {
 
 namespace fs = std::filesystem;
 using testsupport::ChildProcess;
 using testsupport::ScratchDirectory;
+using testsupport::slurp;
 
 const fs::path kSource = VELTRANE_SOURCE_DIR;
 const fs::path kBuild = fs::path(VELTRANE_CLI_PATH).parent_path().parent_path();
@@ -51,8 +48,7 @@ const Treatment kTreatments[] = {
     {"bench/melt_job\\.sh", Treatment::UntilFirstResult, "^== run 1 of"},
     {"kubectl ", Treatment::Skipped, "needs a Kubernetes cluster"},
     {"examples/farm/submit-slurm\\.sh|.* /shared/", Treatment::Skipped,
-     "needs a Slurm cluster and its shared folder (tests/farm/slurm_cluster.sh starts one)"},
-};
+     "needs a Slurm cluster and its shared folder (tests/farm/slurm_cluster.sh starts one)"}};
 
 // Clips the commands name as the reader's own (README.md makes its own): 8 s at 25 fps, with
 // sound, small.
@@ -60,11 +56,6 @@ const char* const kReadersClips[] = {"lower.mp4",   "upper.mp4",   "clip.mp4",  
                                      "in1.mp4",     "uhd10-0.mp4", "uhd10-1.mp4", "uhd10-2.mp4",
                                      "uhd10-3.mp4", "uhd10-4.mp4", "uhd10-5.mp4", "uhd10-6.mp4",
                                      "uhd10-7.mp4", "uhd10-8.mp4"};
-
-std::string slurp(const fs::path& path) {
-  std::ifstream in(path);
-  return std::string(std::istreambuf_iterator<char>(in), {});
-}
 
 struct Command {
   int line = 0;  // in its document
@@ -194,15 +185,9 @@ TEST_P(DocumentedCommands, RunAsPrinted) {
   ScratchDirectory folder;
   layOutCheckout(folder.path(), clips_->path());
   std::ofstream(folder.file("commands.sh")) << scriptFor(commands, folder.path());
-  std::vector<std::string> environment;
-  for (char** entry = environ; *entry; ++entry) {
-    const std::string text = *entry;
-    const std::string name = text.substr(0, text.find('='));
-    // As a reader's shell: no module named, no display to open windows on.
-    if (name != "VELTRANE_PLUGIN" && name != "DISPLAY" && name != "WAYLAND_DISPLAY" &&
-        name != "BUILD_DIR")
-      environment.push_back(text);
-  }
+  // As a reader's shell: no module named, no display to open windows on.
+  std::vector<std::string> environment = testsupport::environmentWithout(
+      {"VELTRANE_PLUGIN", "DISPLAY", "WAYLAND_DISPLAY", "BUILD_DIR"});
   // The scripts build where the tests' build is, as a reader building elsewhere tells them.
   environment.push_back("BUILD_DIR=" + kBuild.string());
   ChildProcess shell({"bash", folder.file("commands.sh")}, folder.file("shell.out"),

@@ -1,15 +1,13 @@
-// Previews: the frame rendered at half its size, with every value in frame pixels scaled to
-// match, shows the full render scaled down: scaled back up it matches the full render but for
-// the pixels along the borders' edges, which half as many pixels draw more coarsely.
+// A preview rendered at half size with every pixel value scaled to match, scaled back up, matches
+// the full render but along the edges, which half as many pixels draw more coarsely.
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cmath>
 
-#include "refhost/engine.h"
 #include "refhost/engine/composition.h"
-#include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
+#include "support/engine_fixture.h"
 
 namespace refhost {
 namespace {
@@ -18,25 +16,15 @@ constexpr int32_t kWidth = 320;
 constexpr int32_t kHeight = 180;
 
 TEST(Preview, HalfSizeScaledUpMatchesTheFullRenderEdgesAside) {
-  EngineOptions options;
-  options.makeContext = refhost::makeHeadlessContext;
-  options.modulePath = VELTRANE_MODULE_PATH;
-  Engine engine(std::move(options));
-  engine.setFrameSettings({kWidth, kHeight, 25.0, 1.0f, 10, ""});
-  // Smooth pictures, so that what differs is where the edges are.
-  engine.setSourceFrames(
-      frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient), {25, 1})));
-  Layer other;
-  other.guid = "0e000000-0000-4000-8000-00000000000b";
-  other.name = "Teal";
-  other.width = kWidth;
-  other.height = kHeight;
-  other.frameCount = 10;
-  other.source =
-      frameSourceOf(openMediaSource(MediaSpec::ofColour({0.1f, 0.6f, 0.6f, 1}), {25, 1}));
-  engine.addLayer(other);
-  engine.start();
-  engine.createInstance();
+  const Layer teal = testsupport::solidLayer("0e000000-0000-4000-8000-00000000000b", kWidth,
+                                             kHeight, {26, 153, 153, 255});
+  auto started = testsupport::startEngine({kWidth, kHeight, 25.0, 1.0f, 10, ""}, [&](auto& e) {
+    // Smooth pictures, so that what differs is where the edges are.
+    e.setSourceFrames(
+        frameSourceOf(openMediaSource(MediaSpec::ofPattern(Pattern::Gradient), {25, 1})));
+    e.addLayer(teal);
+  });
+  Engine& engine = *started;
   // Two cuts off the centre, a wide border, and pictures moved and scaled in pixels.
   engine.setParam("numberOfCuts", ParamValue::ofInt(2));
   engine.setParam("cutPosition_0", ParamValue::ofPoint(-40, 10));
@@ -45,7 +33,7 @@ TEST(Preview, HalfSizeScaledUpMatchesTheFullRenderEdgesAside) {
   engine.setParam("cutDirection_1", ParamValue::ofFloat(100));
   engine.setParam("borderWidth", ParamValue::ofFloat(8));
   engine.setParam("borderColor", ParamValue::ofColor(1, 0.8f, 0.1f));
-  engine.setParam("inputLayer1", ParamValue::ofLayer(other.guid));
+  engine.setParam("inputLayer1", ParamValue::ofLayer(teal.guid));
   engine.setParam("inputFrameTranslation0", ParamValue::ofPoint(40, -25));
   engine.setParam("inputFrameScale0", ParamValue::ofFloat(140));
   engine.setParam("inputFrameTranslation2", ParamValue::ofPoint(-30, 20));

@@ -1,6 +1,5 @@
-// The render loop through the engine: pictures reach the sink in order as single renders give
-// them, the texture pool stops growing, decoding ahead gives the wrapped source's frames in any
-// order of asking, and a failure anywhere stops the run with its own message, leaving nothing.
+// The render loop through the engine: pictures reach the sink in order, decoding ahead gives the
+// source's frames in any order, and a failure anywhere stops the run leaving nothing.
 #include "refhost/engine/render_loop.h"
 
 #include <gtest/gtest.h>
@@ -10,10 +9,10 @@
 #include <thread>
 
 #include "refhost/engine/composition.h"
-#include "refhost/gl/headless_context.h"
 #include "refhost/media/image_files.h"
 #include "refhost/pipeline/async_frame_sink.h"
 #include "refhost/pipeline/frame_prefetch.h"
+#include "support/engine_fixture.h"
 #include "support/temp_paths.h"
 
 namespace refhost {
@@ -49,9 +48,8 @@ TEST(PrefetchingSource, GivesTheWrappedSourcesFramesWhateverTheOrder) {
   EXPECT_EQ(ahead.glRows(8, 2, 2, PixelFormat::Rgba8), direct.glRows(8, 2, 2, PixelFormat::Rgba8));
 }
 
-// Sources sharing a budget for frames decoded ahead: frames ahead take room in it while they
-// wait and give it back when handed over or dropped, frames asked for go ahead without room,
-// and nothing stays taken once the sources are gone.
+// Frames decoded ahead take room in a shared budget until handed over or dropped; frames asked
+// for go ahead without room; nothing stays taken once the sources are gone.
 TEST(PrefetchingSource, FramesAheadShareOneBudget) {
   constexpr std::size_t kFrame = 4 * 2 * 4;  // 4x2 pixels in 8 bits
   auto budget = std::make_shared<DecodeAheadBudget>(2 * kFrame);
@@ -81,27 +79,17 @@ TEST(PrefetchingSource, FramesAheadShareOneBudget) {
   EXPECT_EQ(budget->inUse(), 0u);
 }
 
-std::unique_ptr<Engine> engineOver(std::shared_ptr<MediaSource> source) {
-  EngineOptions options;
-  options.makeContext = refhost::makeHeadlessContext;
-  options.modulePath = VELTRANE_MODULE_PATH;
-  auto engine = std::make_unique<Engine>(std::move(options));
-  engine->setFrameSettings({32, 18, 25.0, 1.0f, 12, ""});
-  engine->setSourceFrames(frameSourceOf(std::move(source)));
-  engine->start();
-  engine->createInstance();
-  // No border: every picture is its own source frame.
-  engine->setParam("borderWidth", ParamValue::ofFloat(0));
-  return engine;
-}
-
 // A failed write stops the run the same way; the command line's tests fill a disk to show it.
 TEST(RenderLoop, PicturesComeInOrderAndAFailureAnywhereStopsTheRunLeavingNothing) {
   enum class Stage { None, Decoding, Stopping };
   for (Stage stage : {Stage::None, Stage::Decoding, Stage::Stopping}) {
     const std::string folder = testsupport::makeTempDirectory("loop");
-    std::unique_ptr<Engine> engine = engineOver(std::make_shared<PrefetchingSource>(
-        std::make_shared<NumberedSource>(stage == Stage::Decoding ? 5 : -1), 3));
+    std::unique_ptr<Engine> engine =
+        testsupport::startEngine({32, 18, 25.0, 1.0f, 12, ""}, [&](Engine& e) {
+          e.setSourceFrames(frameSourceOf(std::make_shared<PrefetchingSource>(
+              std::make_shared<NumberedSource>(stage == Stage::Decoding ? 5 : -1), 3)));
+        });
+    engine->setParam("borderWidth", ParamValue::ofFloat(0));  // every picture its source frame
     auto sink = std::make_unique<AsyncFrameSink>(
         openFrameSink(parseOutputTarget(folder + "/out_%04d.png"), 32, 18, {25, 1}), 2, 3);
     RenderRun run = framesFromTo(0, 11);
@@ -153,14 +141,10 @@ struct ReaderLog {
 
 TEST(RenderLoop, ATimeShiftedCopyReadsOnInOrderWithAReaderOfItsOwn) {
   ReaderLog log;
-  EngineOptions options;
-  options.makeContext = refhost::makeHeadlessContext;
-  options.modulePath = VELTRANE_MODULE_PATH;
-  Engine engine(std::move(options));
-  engine.setFrameSettings({32, 18, 25.0, 1.0f, 40, ""});
-  engine.setSourceFrames(log.open(), [&] { return log.open(); });
-  engine.start();
-  engine.createInstance();
+  auto started = testsupport::startEngine({32, 18, 25.0, 1.0f, 40, ""}, [&](Engine& e) {
+    e.setSourceFrames(log.open(), [&] { return log.open(); });
+  });
+  Engine& engine = *started;
   engine.setParam("inputFrameShift1", ParamValue::ofInt(5));
   class Dropping : public FrameSink {
     void write(int32_t, const RgbaImage&) override {}

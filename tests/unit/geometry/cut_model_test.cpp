@@ -63,11 +63,9 @@ TEST_F(CutModel, ClampsPositionOnePixelInsideTheFrame) {
 TEST_F(CutModel, WrapsDirectionIntoHalfTurnEitherWay) {
   const struct {
     float degrees, angle, directionX, directionY;
-  } cases[] = {
-      {0, 0, 0, 1},        {90, kHalfPi, 1, 0},
-      {540, kPi, 0, -1},   {-190, 170 * kPi / 180, 0.17364818f, -0.98480775f},
-      {-180, -kPi, 0, -1}, {3 * 360 + 45, 45 * kPi / 180, 0.70710677f, 0.70710677f},
-  };
+  } cases[] = {{0, 0, 0, 1},        {90, kHalfPi, 1, 0},
+               {540, kPi, 0, -1},   {-190, 170 * kPi / 180, 0.17364818f, -0.98480775f},
+               {-180, -kPi, 0, -1}, {3 * 360 + 45, 45 * kPi / 180, 0.70710677f, 0.70710677f}};
   for (const auto& c : cases) {
     addCut(0, 0, 0, c.degrees);
     const Cut cut = read(0);
@@ -133,8 +131,7 @@ TEST_F(CutModel, ListKeepsAtMostEightCutsAndDropsRepeatsThatSortTogether) {
       {"local, equal angle, adjacent repeat", false, {5, 5, 9}, {10, 10, 10}, {1, 3}},
       {"local, repeat brought together by angle", false, {5, 9, 5}, {10, 20, 10}, {1, 2}},
       {"radial, same direction", true, {0, 0, 0}, {30, 30, -60}, {1, 3}},
-      {"NaN never repeats", false, {5, 5, 5}, {kNaN, kNaN, kNaN}, {1, 2, 3}},
-  };
+      {"NaN never repeats", false, {5, 5, 5}, {kNaN, kNaN, kNaN}, {1, 2, 3}}};
   for (const auto& c : cases) {
     host.setInt(param::kCutType, c.radial ? kCutTypeRadial : 0);
     for (int i = 0; i < 3; ++i) addCut(i, c.x[i], 0, c.degrees[i]);

@@ -1,11 +1,8 @@
 // Region partition: which region a cut's ray reaches, and the empty first region of a radial
-// layout. Which input shows where is checked in the rendered frames and the layout presets,
-// tiling and orientation over random layouts.
+// layout. (Which input shows where shows in the renders and the random layouts.)
 #include "geometry/region_partition.h"
 
 #include <gtest/gtest.h>
-
-#include <vector>
 
 #include "common/param_ids.h"
 #include "make_cut.h"

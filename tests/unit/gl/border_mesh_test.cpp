@@ -91,8 +91,7 @@ TEST(PrimitiveRestartDecision, IntelHd4000IsRecognisedFromVendorOrRenderer) {
       {"Intel", nullptr, false},
       {"NVIDIA Corporation", "GeForce 4000", false},
       {"Mesa", "llvmpipe (LLVM 15.0.6, 256 bits)", false},
-      {nullptr, nullptr, false},
-  };
+      {nullptr, nullptr, false}};
   for (const auto& c : cases) {
     EXPECT_EQ(isIntelHd4000(c.vendor, c.renderer), c.hd4000)
         << (c.vendor ? c.vendor : "(none)") << " / " << (c.renderer ? c.renderer : "(none)");
@@ -109,16 +108,14 @@ TEST(ExtensionList, VersionDecidesWhichListIsSearched) {
     const char* spaceSeparated;
     const char* name;
     bool found;
-  } cases[] = {
-      {"2.1 Mesa", 0, joined, "GL_NV_primitive_restart", true},
-      {"2.1", 0, joined, "GL_NV_primitive", false},
-      {"2.1", 0, nullptr, "GL_ARB_one", false},
-      {nullptr, 0, joined, "GL_ARB_one", true},
-      {"4.1 Core", 3, joined, "GL_NV_primitive_restart", false},
-      {"4.1 Core", 3, joined, "GL_ARB_two", true},
-      {"4.1 Core", 0, joined, "GL_ARB_one", false},
-      {"3.0", 2, joined, "GL_ARB_two", false},
-  };
+  } cases[] = {{"2.1 Mesa", 0, joined, "GL_NV_primitive_restart", true},
+               {"2.1", 0, joined, "GL_NV_primitive", false},
+               {"2.1", 0, nullptr, "GL_ARB_one", false},
+               {nullptr, 0, joined, "GL_ARB_one", true},
+               {"4.1 Core", 3, joined, "GL_NV_primitive_restart", false},
+               {"4.1 Core", 3, joined, "GL_ARB_two", true},
+               {"4.1 Core", 0, joined, "GL_ARB_one", false},
+               {"3.0", 2, joined, "GL_ARB_two", false}};
   for (const auto& c : cases) {
     bool joinedRead = false;
     ExtensionQueries queries;

@@ -1,13 +1,9 @@
-// GL start-up builds every program the render and the overlay select, each linked and found
-// by name; a stage the driver will not compile leaves by the compile exception, which Notify
-// answers as such; and every stage is valid GLSL 4.10 for the reference compiler as well.
+// GL start-up builds every program the draws select, a stage the driver refuses leaves by the
+// compile exception, and every stage is valid GLSL 4.10 for the reference compiler.
 #include "render/gl_startup.h"
 
 #include <gtest/gtest.h>
-#include <sys/wait.h>
 
-#include <cstdio>
-#include <fstream>
 #include <string>
 
 #include "common/glsl_exception.h"
@@ -15,6 +11,7 @@
 #include "refhost/gl/gl_overrides.h"
 #include "shaders/program_names.h"
 #include "shaders/shader_identifiers.h"
+#include "support/files.h"
 #include "support/gl_host.h"
 #include "support/temp_paths.h"
 
@@ -24,24 +21,16 @@ namespace programs = veltrane::programs;
 
 using GlStartup = testsupport::GlHostTest;
 
-// Every program a draw selects by name.
-const char* const kDrawnPrograms[] = {
-    programs::kSplitScreen,          programs::kCombineBorder, programs::kDistanceField,
-    programs::kLayerAlignment,       programs::kClear,         programs::kCopy,
-    programs::kCutPositionControl,   programs::kCutMoveHandle, programs::kRotationControl,
-    programs::kMoveHandle,           programs::kCutHandle,     programs::kQuadControl,
-    programs::kDirectionScaleControl};
-
-TEST_F(GlStartup, BuildsEveryDrawnProgramLinkedAndFoundByName) {
+// Every program built, the ones the draws select among them, is linked and found by its name.
+TEST_F(GlStartup, BuildsEveryProgramLinkedAndFoundByName) {
   testing::internal::CaptureStdout();
   buildPrograms();
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "") << "silent unless verbose";
   EXPECT_TRUE(veltrane::programsBuilt(registry_.get()));
-  for (const char* name : kDrawnPrograms) {
-    const int index = registry_->programIndex(name);
-    ASSERT_GE(index, 0) << name;
-    EXPECT_TRUE(registry_->program(index).linked) << name;
-    EXPECT_EQ(registry_->programId(name), static_cast<int32_t>(registry_->program(index).id));
+  for (const veltrane::ProgramName& named : registry_->programNames()) {
+    const auto& program = registry_->program(named.index);
+    EXPECT_TRUE(program.linked) << named.name;
+    EXPECT_EQ(registry_->programId(named.name), static_cast<int32_t>(program.id)) << named.name;
   }
   // The source copy selects its program by index rather than by name.
   EXPECT_EQ(registry_->programIndex(programs::kSplitScreen), programs::kSplitScreenIndex);
@@ -74,20 +63,12 @@ TEST_F(GlStartup, AShaderTheDriverRefusesLeavesByTheCompileException) {
   EXPECT_EQ(veltrane::dispatchMessage(handle(), api(), kMessagePrepareGl), kResultException);
 }
 
-// Runs glslangValidator on `path`; returns its exit status and collects its output.
-int validate(const std::string& path, std::string* output) {
-  FILE* pipe = popen(("glslangValidator " + path + " 2>&1").c_str(), "r");
-  if (pipe == nullptr) return -1;
-  char buffer[512];
-  while (fgets(buffer, sizeof buffer, pipe) != nullptr) *output += buffer;
-  const int status = pclose(pipe);
-  return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-}
-
-// The stages are read back from the built programs, so that none is left out.
+// The stages are read back from the built programs, so that none is left out; the validator
+// takes each stage from its file's suffix.
 TEST_F(GlStartup, EveryStageIsValidGlsl410ForTheReferenceCompiler) {
   buildPrograms();
   testsupport::ScratchDirectory folder;
+  std::string files;
   for (int index = 0; index < registry_->programCount(); ++index) {
     GLuint stages[3] = {};
     GLsizei count = 0;
@@ -101,14 +82,15 @@ TEST_F(GlStartup, EveryStageIsValidGlsl410ForTheReferenceCompiler) {
       glGetShaderSource(stages[k], length, nullptr, text.data());
       text.pop_back();  // the terminator
       EXPECT_EQ(text.rfind("#version 410\n", 0), 0u) << index;
-      // The validator takes the stage from the file suffix.
       const std::string path = folder.file(std::to_string(index) + "_" + std::to_string(k) +
                                            (type == GL_VERTEX_SHADER ? ".vert" : ".frag"));
-      std::ofstream(path) << text;
-      std::string output;
-      EXPECT_EQ(validate(path, &output), 0) << path << ":\n" << output << text;
+      testsupport::writeText(path, text);
+      files += " " + path;
     }
   }
+  const std::string output =
+      testsupport::commandOutput("glslangValidator" + files + " 2>&1 || echo INVALID");
+  EXPECT_EQ(output.find("INVALID"), std::string::npos) << output;
 }
 
 }  // namespace

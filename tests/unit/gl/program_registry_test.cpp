@@ -66,8 +66,7 @@ TEST_F(ProgramRegistry, BuildsPrintLogsWhenVerboseAndThrowTheFailuresType) {
       {kWarningVertex, kBrokenFragment, true, warning + "\n" + broken, GLSLErrorType_ShaderCompile,
        "GLSLErrorType_ShaderCompile - The Shader failed to compile."},
       {kVertex, kUnresolvedFragment, true, "", GLSLErrorType_ShaderLink,
-       "GLSLErrorType_ShaderLink - The shader program failed to link."},
-  };
+       "GLSLErrorType_ShaderLink - The shader program failed to link."}};
   for (const auto& c : cases) {
     EffectData registry;
     registry.addProgram(kVertex, kFragment, false, "kept", true, true);

@@ -33,8 +33,7 @@ TEST_F(RenderTargets, TemplateFollowsTheTextureFormatMode) {
       {0, true, GL_RGBA16F, GL_UNSIGNED_BYTE, 64, 36, 2, "64 36 0x881A 0x1908 0x1401 null"},
       {2, true, GL_RGBA8, GL_UNSIGNED_SHORT, 40, 20, 0, "40 20 0x8058 0x1908 0x1401 null"},
       {1, false, GL_RGBA, GL_FLOAT, 0, 0, 1, "0 0 0x1908 0x1908 0x1401 null"},
-      {7, true, GL_RGBA16F, GL_FLOAT, 0, 0, 1, "0 0 0x881A 0x1908 0x1401 null"},
-  };
+      {7, true, GL_RGBA16F, GL_FLOAT, 0, 0, 1, "0 0 0x881A 0x1908 0x1401 null"}};
   for (const auto& c : cases) {
     SCOPED_TRACE(testing::Message() << "mode " << c.mode << " float " << c.floatFormat);
     host_->clearCallLog();

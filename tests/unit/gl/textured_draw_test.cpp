@@ -1,6 +1,5 @@
-// Textured draws on Mesa through the reference host: the frame quad through the copy program,
-// and the split-screen sample stage compared, pixel by pixel, with a CPU model of its formula
-// (the border combine is checked through the whole render).
+// Textured draws on Mesa: the frame quad through the copy program, and the split-screen sample
+// stage compared pixel by pixel with a CPU model of its formula.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -83,13 +82,11 @@ TEST_F(TexturedDraw, SplitScreenSampleMatchesTheModel) {
   const struct {
     const char* label;
     float offsetX, offsetY, rotation, inverseScale, aspect, tint[3];
-  } cases[] = {
-      {"identity", 0, 0, 0, 1, 1, {1, 1, 1}},
-      {"half size", 0, 0, 0, 2, 1, {1, 1, 1}},
-      {"moved and tinted", 0.1f, -0.05f, 0, 1, 1, {0.5f, 1, 0.25f}},
-      {"turned and enlarged", 0, 0, 0.7f, 0.8f, aspect, {1, 1, 1}},
-      {"quarter turn", 0.05f, 0, -1.5707964f, 1.25f, aspect, {1, 1, 1}},
-  };
+  } cases[] = {{"identity", 0, 0, 0, 1, 1, {1, 1, 1}},
+               {"half size", 0, 0, 0, 2, 1, {1, 1, 1}},
+               {"moved and tinted", 0.1f, -0.05f, 0, 1, 1, {0.5f, 1, 0.25f}},
+               {"turned and enlarged", 0, 0, 0.7f, 0.8f, aspect, {1, 1, 1}},
+               {"quarter turn", 0.05f, 0, -1.5707964f, 1.25f, aspect, {1, 1, 1}}};
   for (const auto& c : cases) {
     SCOPED_TRACE(c.label);
     select("splitScreen");

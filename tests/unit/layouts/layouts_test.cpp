@@ -1,6 +1,5 @@
-// The split layouts: every layout's pictures land on the regions the module reports for it, the
-// framing is the smallest that covers each region, and the choices people make of layouts are
-// checked.
+// The split layouts: each layout's pictures land on the regions the module reports, framed at
+// the smallest scale that covers them, and the names people give are understood.
 #include "layouts/layouts.h"
 
 #include <gtest/gtest.h>
@@ -8,11 +7,10 @@
 #include <map>
 #include <tuple>
 
-#include "refhost/engine.h"
-#include "refhost/gl/headless_context.h"
 #include "refhost/pipeline/frame_readback.h"
 #include "scene/scene_document.h"
 #include "scene/scene_engine.h"
+#include "support/engine_fixture.h"
 
 namespace veltrane_cli {
 namespace {
@@ -29,29 +27,11 @@ uint8_t redOf(int input) { return static_cast<uint8_t>(20 * (input + 1)); }
 
 // The module with nine solid layers, one per input, and no border.
 std::unique_ptr<refhost::Engine> solidLayers() {
-  refhost::EngineOptions options;
-  options.makeContext = refhost::makeHeadlessContext;
-  options.modulePath = VELTRANE_MODULE_PATH;
-  auto engine = std::make_unique<refhost::Engine>(std::move(options));
-  engine->setFrameSettings({kWidth, kHeight, 25.0, 1.0f, 1, ""});
-  for (int j = 0; j < 9; ++j) {
-    refhost::Layer layer;
-    layer.guid = layerGuid(j);
-    layer.name = "Input " + std::to_string(j);
-    layer.width = kWidth;
-    layer.height = kHeight;
-    layer.source = [j](int32_t, int32_t width, int32_t height, refhost::PixelFormat) {
-      std::vector<uint8_t> rows(static_cast<std::size_t>(width) * height * 4, 0);
-      for (std::size_t i = 0; i < rows.size(); i += 4) {
-        rows[i] = redOf(j);
-        rows[i + 3] = 255;
-      }
-      return rows;
-    };
-    engine->addLayer(layer);
-  }
-  engine->start();
-  engine->createInstance();
+  auto engine = testsupport::startEngine({kWidth, kHeight, 25.0, 1.0f, 1, ""}, [](auto& engine) {
+    for (int j = 0; j < 9; ++j)
+      engine.addLayer(
+          testsupport::solidLayer(layerGuid(j), kWidth, kHeight, {redOf(j), 0, 0, 255}));
+  });
   engine->setParam("borderWidth", refhost::ParamValue::ofFloat(0));
   return engine;
 }

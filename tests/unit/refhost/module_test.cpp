@@ -1,23 +1,19 @@
-// Loading plug-in modules: one clear error, naming the path and the fault, for paths that are
-// no file and for damaged copies of the built module, refused before the system loader could
-// fault on them. (Missing files, other files and libraries without the entry points are
-// reported through the command line's info command.)
+// Loading plug-in modules: one clear error naming the path and the fault, for paths that are no
+// file and for damaged copies of the built module, before the system loader could fault.
 #include "refhost/core/module.h"
 
 #include <gtest/gtest.h>
 
-#include <fstream>
-#include <iterator>
 #include <optional>
 
+#include "support/files.h"
 #include "support/temp_paths.h"
 
 namespace refhost {
 namespace {
 
 TEST(ModuleLoading, ErrorsNameThePathAndTheFault) {
-  std::ifstream in(VELTRANE_MODULE_PATH, std::ios::binary);
-  const std::string module(std::istreambuf_iterator<char>(in), {});
+  const std::string module = testsupport::slurp(VELTRANE_MODULE_PATH);
   auto patched = [&](std::size_t offset, char value) {
     return module.substr(0, offset) + value + module.substr(offset + 1);
   };
@@ -41,10 +37,9 @@ TEST(ModuleLoading, ErrorsNameThePathAndTheFault) {
       {copy, patched(4, 1), "library (it is a 32-bit ELF file"},
       {copy, patched(5, 2), "library (its byte order"},
       {copy, patched(16, 2), "library (it is an ELF file of type 2, not a shared object"},
-      {copy, patched(18, 40), "library (it is built for ELF machine 40"},
-  };
+      {copy, patched(18, 40), "library (it is built for ELF machine 40"}};
   for (const Case& c : cases) {
-    if (c.bytes) std::ofstream(c.path, std::ios::binary | std::ios::trunc) << *c.bytes;
+    if (c.bytes) testsupport::writeText(c.path, *c.bytes);
     std::string message;
     try {
       Module loaded(c.path);

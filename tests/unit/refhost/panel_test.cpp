@@ -1,6 +1,5 @@
 // The host's parameter panel as the plug-in's calls build and use it: refused declarations,
-// keyframed values, misuse and undo steps. (What the module declares, nesting and flags included,
-// is checked against its own table.)
+// keyframed values, misuse and undo steps.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -39,11 +38,6 @@ class HostPanel : public ::testing::Test {
   // The value at the time as the panel formats it (the plug-in's getters read the same value).
   std::string read(const std::string& id, int32_t time) const {
     return formatValue(host.param(id).kind, host.valueAt(id, time));
-  }
-  std::vector<ParamState> snapshot() const {
-    std::vector<ParamState> states;
-    for (const Param& param : host.panel().params()) states.push_back(param.state);
-    return states;
   }
 
   testsupport::InstrumentedHost host;
@@ -128,7 +122,7 @@ TEST_F(HostPanel, StoresWhatItIsGivenAndReportsMisuse) {
 TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   host.setKeyframe("a", 0, ParamValue::ofFloat(0));
   host.setKeyframe("a", 100, ParamValue::ofFloat(90));
-  std::vector<std::vector<ParamState>> history{snapshot()};
+  std::vector<std::vector<ParamState>> history{host.paramStates()};
 
   // Step 1: two edits of the same point and a width: one step, the first state kept.
   const float x1 = 10, y1 = 20, x2 = -0.0f, y2 = NAN;
@@ -137,7 +131,7 @@ TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   api.SetPointParam(h, "p", 0, &x2, &y2, 0);
   api.SetFloatParam(h, "f", 0, 7.25f, 0);
   api.EndUndo(h);
-  history.push_back(snapshot());
+  history.push_back(host.paramStates());
   // Step 2: a nested bracket joins the outer step; the animated angle gains a keyframe.
   api.BeginUndo(h, "Rotate Cut");
   api.SetAngleParam(h, "a", 50, 1e30f, 0);
@@ -145,7 +139,7 @@ TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   api.SetLayerParam(h, "l", 0, kLayerA, 0);
   api.EndUndo(h);
   api.EndUndo(h);
-  history.push_back(snapshot());
+  history.push_back(host.paramStates());
   // A bracket that changes nothing (an edit to the value already there) is no step.
   const float same = 7.25f;
   api.BeginUndo(h, "Select");
@@ -156,12 +150,13 @@ TEST_F(HostPanel, UndoStepsRestoreExactStatesAndANewStepDropsRedo) {
   EXPECT_TRUE(host.immediateEdits().empty());
   for (int step = 2; step > 0; --step) {
     ASSERT_TRUE(host.undo());
-    EXPECT_EQ(snapshot(), history[static_cast<std::size_t>(step - 1)]) << "undoing " << step;
+    EXPECT_EQ(host.paramStates(), history[static_cast<std::size_t>(step - 1)])
+        << "undoing " << step;
   }
   EXPECT_FALSE(host.undo());
   for (std::size_t step = 1; step <= 2; ++step) {
     ASSERT_TRUE(host.redo());
-    EXPECT_EQ(snapshot(), history[step]) << "redoing " << step;
+    EXPECT_EQ(host.paramStates(), history[step]) << "redoing " << step;
   }
   EXPECT_FALSE(host.redo());
   EXPECT_TRUE(std::isnan(host.valueAt("p", 0).number[1]));

@@ -1,6 +1,5 @@
-// Host resources with a real GL context: textures, buffers and the vertex array handed to the
-// plug-in and their accounting, the texture pool; frame fetches, layer states and timing, with
-// refusals. (That a render gives everything back is checked through the module.)
+// Host resources with a real GL context: textures, buffers and the vertex array and their
+// accounting, the texture pool, frame fetches and layer queries, with refusals.
 #include <GL/glew.h>
 #include <gtest/gtest.h>
 
@@ -54,8 +53,7 @@ TEST_F(HostResources, TexturesAreCountedAndLeaveBindingsAlone) {
 }
 
 // The texture pool: textures given back are handed out again for the same size and format, as
-// new ones would be. (That the host's own frame textures come from the pool, uploads intact,
-// shows in the render loop's test.)
+// new ones would be.
 TEST_F(HostResources, GivenBackTexturesAreReusedBySizeAndFormatWithFreshSampling) {
   auto allocate = [&](int32_t width, uint32_t format) {
     int32_t w = 0, h = 0;

@@ -1,6 +1,5 @@
-// Generated pictures keep the promises the tests that use them rely on, at every size, and the
-// counter's code block reads back its frame; frame sources hand GL its rows bottom first (a
-// moving source's upright frames are read back through the render context).
+// Generated pictures keep the promises the tests rely on at every size, the counter's code reads
+// back its frame, and frame sources hand GL the bottom row first.
 #include "refhost/media/test_patterns.h"
 
 #include <gtest/gtest.h>
@@ -17,10 +16,8 @@
 namespace refhost {
 namespace {
 
-// At every size: every pattern opaque; the bars seven distinct colours in full-height columns
-// of even width, so a region showing them can be told by its colour; the checker two greys
-// alternating square by square from a light corner; the gradient red rising to the right and
-// green upwards, never falling back, over the whole range, blue holding.
+// At every size, opaque: seven distinct full-height bars of even width; two greys alternating
+// square by square from a light corner; red rising to the right and green upwards, blue held.
 TEST(TestPatterns, PicturesKeepTheirShapeAtEverySize) {
   for (const auto& [width, height] : {std::pair{1, 1}, {7, 3}, {64, 36}, {71, 40}, {320, 180}}) {
     SCOPED_TRACE(std::to_string(width) + "x" + std::to_string(height));
@@ -76,11 +73,9 @@ TEST(TestPatterns, CounterShowsItsFrameInCodeAndDigits) {
   const struct {
     int32_t frame, width, height;
     std::optional<uint16_t> expected;
-  } cases[] = {
-      {0, 64, 36, 0},         {1, 64, 36, 1},         {255, 64, 36, 255},
-      {1234, 320, 180, 1234}, {65535, 64, 36, 65535}, {65536 + 7, 64, 36, 7},
-      {-1, 64, 36, 65535},    {42, 1920, 1080, 42},   {9, 15, 15, std::nullopt},
-  };
+  } cases[] = {{0, 64, 36, 0},         {1, 64, 36, 1},         {255, 64, 36, 255},
+               {1234, 320, 180, 1234}, {65535, 64, 36, 65535}, {65536 + 7, 64, 36, 7},
+               {-1, 64, 36, 65535},    {42, 1920, 1080, 42},   {9, 15, 15, std::nullopt}};
   for (const auto& c : cases) {
     EXPECT_EQ(readCounterCode(generatePattern(Pattern::Counter, c.frame, c.width, c.height)),
               c.expected)

@@ -1,13 +1,9 @@
-// Video files read as players show them: small clips made by the ffmpeg command line, each
-// picture compared with what ffmpeg itself decodes for the same frame (colours by the stream's
-// own matrix and range, 10 bits kept, turned upright, at square pixels), frames chosen by
-// presentation time at constant and variable rates; and every kind of file read by what it
-// holds, photos upright, damage concealed and counted, HDR refused.
+// Video files read as players show them, against what ffmpeg itself decodes: colours, depth,
+// turns, pixel shapes, frames by presentation time; and every kind of file read by what it holds.
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cmath>
-#include <fstream>
 #include <random>
 #include <set>
 #include <sstream>
@@ -15,6 +11,7 @@
 #include "refhost/media/media_source.h"
 #include "refhost/media/video_reader.h"
 #include "support/child_process.h"
+#include "support/files.h"
 #include "support/spoiled_media.h"
 #include "support/temp_paths.h"
 
@@ -23,24 +20,19 @@ namespace {
 
 using testsupport::ChildProcess;
 using testsupport::ScratchDirectory;
+using testsupport::slurp;
 using testsupport::Spoiling;
-
-std::string readFile(const std::string& path) {
-  std::ostringstream bytes;
-  bytes << std::ifstream(path, std::ios::binary).rdbuf();
-  return bytes.str();
-}
+using testsupport::writeText;
 
 // Runs the ffmpeg command line quietly; its own messages are the failure when it fails.
 void ffmpeg(const ScratchDirectory& folder, std::vector<std::string> arguments) {
   arguments.insert(arguments.begin(), {"ffmpeg", "-nostdin", "-v", "error", "-y"});
   const std::string log = folder.file("ffmpeg.log");
   ChildProcess process(arguments, "/dev/null", log);
-  ASSERT_EQ(process.wait(120), 0) << readFile(log);
+  ASSERT_EQ(process.wait(120), 0) << slurp(log);
 }
 
-// `frames` of FFmpeg's moving test picture at 25 fps, encoded with the options (separated by
-// spaces).
+// `frames` of FFmpeg's moving test picture at 25 fps, encoded with the space-separated options.
 void makeClip(const ScratchDirectory& folder, const std::string& name, const std::string& size,
               const std::string& options, int frames = 4) {
   std::vector<std::string> arguments = {
@@ -51,11 +43,9 @@ void makeClip(const ScratchDirectory& folder, const std::string& name, const std
   ffmpeg(folder, arguments);
 }
 
-// Every frame of the clip as the ffmpeg command line shows it, after the filter when one is
-// given: packed RGB of 8 bits, or planar RGB of 16 bits (green, blue, red) for deep pictures.
-// The same kinds of output as ours, with the same bilinear chroma: the scaler interpolates
-// chroma differently by filter and by output, which moves single pixels at the test picture's
-// hard colour edges by up to 180 levels and would hide what is compared here.
+// Every frame of the clip as ffmpeg shows it (after the filter when given): packed RGB of 8 bits,
+// or planar RGB of 16 bits (green, blue, red). Bilinear chroma as ours: the scaler's other
+// interpolations move single pixels at the picture's hard colour edges by up to 180 levels.
 std::string shownByFfmpeg(const ScratchDirectory& folder, const std::string& path,
                           const char* filter, PixelFormat format) {
   std::vector<std::string> arguments = {"-i", path};
@@ -65,21 +55,13 @@ std::string shownByFfmpeg(const ScratchDirectory& folder, const std::string& pat
                    {"-sws_flags", "bilinear", "-fps_mode", "passthrough", "-pix_fmt",
                     format == PixelFormat::Rgba8 ? "rgb24" : "gbrp16le", "-f", "rawvideo", raw});
   ffmpeg(folder, arguments);
-  return readFile(raw);
+  return slurp(raw);
 }
 
-// How far our pictures may be from ffmpeg's, in levels of 255, on average and at worst. Both
-// convert with the same library and tables, so 8 bits agree exactly (a level is left for
-// rounding); half floats put white at 1 where ffmpeg's 16 bits leave it up to 0.4% short, half a
-// level on average and one at white. A wrong matrix or range is off by several levels on
-// average, a wrong turn by tens.
-struct Tolerance {
-  double mean, max;
-};
-constexpr Tolerance kEightBits{0.25, 1.0};
-constexpr Tolerance kHalfFloats{1.0, 2.0};
-
-// Our frame `frame` (at 25 fps) against ffmpeg's, as 8 bits or half floats, in levels of 255.
+// Our frame `frame` (at 25 fps) against ffmpeg's, in levels of 255 on average and at worst. Both
+// convert with the same tables, so 8 bits agree but for rounding; half floats put white at 1
+// where ffmpeg's 16 bits leave it up to 0.4% short. A wrong matrix or range is off by several
+// levels on average, a wrong turn by tens.
 void expectShownAlike(VideoReader& reader, const std::string& theirs, int frame, PixelFormat format,
                       const std::string& name) {
   const RgbaImage ours =
@@ -101,11 +83,8 @@ void expectShownAlike(VideoReader& reader, const std::string& theirs, int frame,
       max = std::max(max, gap);
     }
   }
-  const std::string label =
-      name + " frame " + std::to_string(frame) + (deep ? " in half floats" : " in 8 bits");
-  const Tolerance tolerance = deep ? kHalfFloats : kEightBits;
-  EXPECT_LE(mean, tolerance.mean) << label;
-  EXPECT_LE(max, tolerance.max) << label;
+  EXPECT_LE(mean, deep ? 1.0 : 0.25) << name << " frame " << frame << (deep ? " deep" : "");
+  EXPECT_LE(max, deep ? 2.0 : 1.0) << name << " frame " << frame << (deep ? " deep" : "");
 }
 
 // Frames 0 and 3 of clips of each colour description, depth and pixel shape.
@@ -159,7 +138,7 @@ TEST(VideoInput, PicturesMatchWhatFfmpegShows) {
 // A copy of an MP4 whose track's display matrix is a, b, c, d (16.16 fixed point in the file).
 void writeWithDisplayMatrix(const std::string& from, const std::string& to, int a, int b, int c,
                             int d) {
-  std::string bytes = readFile(from);
+  std::string bytes = slurp(from);
   const std::size_t box = bytes.find("tkhd");
   ASSERT_NE(box, std::string::npos);
   // After the version, flags, two times, the track id, a reserved word, the duration (32 or 64
@@ -171,7 +150,7 @@ void writeWithDisplayMatrix(const std::string& from, const std::string& to, int 
     for (int shift = 24; shift >= 0; shift -= 8)
       bytes[at++] = static_cast<char>(static_cast<uint32_t>(value) >> shift & 0xFF);
   }
-  std::ofstream(to, std::ios::binary) << bytes;
+  writeText(to, bytes);
 }
 
 TEST(VideoInput, TurnedPicturesShowUpright) {
@@ -184,14 +163,12 @@ TEST(VideoInput, TurnedPicturesShowUpright) {
     const char* rotate;  // the muxer's tag, or the matrix below patched in
     int a, b, c, d;
     int32_t width, height;
-  } clips[] = {
-      {"rotate90.mp4", "90", 0, 0, 0, 0, 180, 320},
-      {"rotate180.mp4", "180", 0, 0, 0, 0, 320, 180},
-      {"rotate270.mp4", "270", 0, 0, 0, 0, 180, 320},
-      {"mirrored.mp4", nullptr, -1, 0, 0, 1, 320, 180},
-      {"upside-down.mp4", nullptr, 1, 0, 0, -1, 320, 180},
-      {"transposed.mp4", nullptr, 0, 1, 1, 0, 180, 320},
-  };
+  } clips[] = {{"rotate90.mp4", "90", 0, 0, 0, 0, 180, 320},
+               {"rotate180.mp4", "180", 0, 0, 0, 0, 320, 180},
+               {"rotate270.mp4", "270", 0, 0, 0, 0, 180, 320},
+               {"mirrored.mp4", nullptr, -1, 0, 0, 1, 320, 180},
+               {"upside-down.mp4", nullptr, 1, 0, 0, -1, 320, 180},
+               {"transposed.mp4", nullptr, 0, 1, 1, 0, 180, 320}};
   for (const auto& clip : clips) {
     const std::string path = folder.file(clip.name);
     if (clip.rotate) {
@@ -238,6 +215,10 @@ int32_t frameShown(const RgbaImage& picture) {
 // presented at or before t, the first before it, the last after it.
 TEST(VideoInput, FramesAreChosenByPresentationTime) {
   ScratchDirectory folder;
+  // A variable rate: steady at first, then a pause, three short frames and a long gap.
+  const char* variable =
+      "if(lt(N,3),N*40,if(lt(N,5),200+(N-3)*40,if(lt(N,8),257+(N-5)*17,800+(N-8)*40)))";
+  const std::vector<double> shown{0, 40, 80, 200, 240, 257, 274, 291, 800, 840, 880, 920};
   const struct {
     const char* name;
     int rate;
@@ -245,17 +226,9 @@ TEST(VideoInput, FramesAreChosenByPresentationTime) {
     int32_t compositionFrames;      // at 25 fps
     const char* times;              // a setpts expression in milliseconds for a variable rate
     std::vector<double> presented;  // its frames' times in milliseconds
-  } clips[] = {
-      {"25.mp4", 25, 0.48, 12, nullptr, {}},
-      {"60.mp4", 60, 0.2, 5, nullptr, {}},
-      // Steady at first, then a pause, three short frames and a long gap.
-      {"variable.mp4",
-       25,
-       0,
-       0,
-       "if(lt(N,3),N*40,if(lt(N,5),200+(N-3)*40,if(lt(N,8),257+(N-5)*17,800+(N-8)*40)))",
-       {0, 40, 80, 200, 240, 257, 274, 291, 800, 840, 880, 920}},
-  };
+  } clips[] = {{"25.mp4", 25, 0.48, 12, nullptr, {}},
+               {"60.mp4", 60, 0.2, 5, nullptr, {}},
+               {"variable.mp4", 25, 0, 0, variable, shown}};
   for (const auto& clip : clips) {
     const std::string path = folder.file(clip.name);
     std::string filter = "color=black:s=64x32:r=" + std::to_string(clip.rate) +
@@ -310,9 +283,7 @@ void makePhoto(const ScratchDirectory& folder, const std::string& name, int orie
 }
 
 // Every kind of file FFmpeg decodes, read by what it holds whatever its name: its size upright,
-// whether it moves, its nominal rate and length at that rate, the frames its decoder found
-// damaged (concealed, not fatal), or the one line that refuses it (damage beyond use, no
-// picture, colours the host cannot show).
+// nominal rate, length, sound and the frames found damaged (concealed), or the line refusing it.
 TEST(VideoInput, FilesAreReadByWhatTheyHold) {
   ScratchDirectory folder;
   const std::string testPicture = "testsrc2=size=160x96:rate=25";
@@ -339,11 +310,10 @@ TEST(VideoInput, FilesAreReadByWhatTheyHold) {
     makePhoto(folder, "photo" + std::to_string(orientation) + ".jpg", orientation);
   makeClip(folder, "whole.jpg", "160x96", "", 1);
   makeClip(folder, "whole.png", "160x96", "", 1);
-  const std::string jpeg = readFile(folder.file("whole.jpg")),
-                    png = readFile(folder.file("whole.png"));
-  std::ofstream(folder.file("half.jpg"), std::ios::binary) << jpeg.substr(0, jpeg.size() / 2);
-  std::ofstream(folder.file("spoilt.png"), std::ios::binary)
-      << png.substr(0, png.size() / 2) + std::string(64, '\0') + png.substr(png.size() / 2 + 64);
+  const std::string jpeg = slurp(folder.file("whole.jpg")), png = slurp(folder.file("whole.png"));
+  writeText(folder.file("half.jpg"), jpeg.substr(0, jpeg.size() / 2));
+  writeText(folder.file("spoilt.png"), png.substr(0, png.size() / 2) + std::string(64, '\0') +
+                                           png.substr(png.size() / 2 + 64));
   ffmpeg(folder, {"-f", "lavfi", "-i", "sine", "-t", "1", folder.file("sound.mp4")});
   const std::string bt2020 = "-pix_fmt yuv420p10le -color_primaries bt2020 -colorspace bt2020nc";
   makeClip(folder, "pq.mov", "64x36", bt2020 + " -color_trc smpte2084", 1);
@@ -357,51 +327,24 @@ TEST(VideoInput, FilesAreReadByWhatTheyHold) {
     int32_t frames;   // at that rate
     int32_t damaged;  // frames the decoder found damaged, read through once
     bool sound;
-    const char* line;  // the refusal, after the path
-  } files[] = {
-      {"phone.3gp", 160, 96, {25, 1}, 10, 0, false, nullptr},
-      {"camera.mts", 160, 96, {25, 1}, 10, 0, true, nullptr},
-      {"animated.gif", 64, 36, {10, 1}, 5, 0, false, nullptr},
-      {"animated.webp", 64, 36, {10, 1}, 5, 0, false, nullptr},
-      {"one.gif", 64, 36, {}, 0, 0, false, nullptr},
-      {"dropped.mp4", 64, 36, {30, 1}, 119, 0, false, nullptr},
-      {"slowed.mp4", 64, 36, {30, 1}, 120, 0, false, nullptr},
-      {"cut.mp4", 160, 96, {25, 1}, 30, 1, false, nullptr},
-      {"overwritten.mp4", 160, 96, {25, 1}, 30, 1, false, nullptr},
-      {"photo1.jpg", 64, 48, {}, 0, 0, false, nullptr},
-      {"photo3.jpg", 64, 48, {}, 0, 0, false, nullptr},
-      {"photo6.jpg", 64, 48, {}, 0, 0, false, nullptr},
-      {"photo8.jpg", 64, 48, {}, 0, 0, false, nullptr},
-      {"half.jpg", 160, 96, {}, 0, 1, false, nullptr},
-      {"spoilt.png", 0, 0, {}, 0, 0, false, "cannot read image: its data is damaged ("},
-      {"sound.mp4", 0, 0, {}, 0, 0, false, "it holds sound but no picture"},
-      // The host renders SDR BT.709 and BT.601, without tone or gamut mapping.
-      {"pq.mov",
-       0,
-       0,
-       {},
-       0,
-       0,
-       false,
-       "HDR video (transfer smpte2084, primaries bt2020, matrix bt2020nc) is not shown by this "
-       "host: it renders in SDR BT.709/BT.601; convert it first (for example with ffmpeg's "
-       "zscale and tonemap filters)"},
-      {"hlg.mp4", 0, 0, {}, 0, 0, false, "HDR video (transfer arib-std-b67, primaries bt2020"},
-      {"wide.mp4", 0, 0, {}, 0, 0, false, "wide-gamut video (primaries bt2020, matrix bt2020nc)"},
-  };
+  } files[] = {{"phone.3gp", 160, 96, {25, 1}, 10, 0, false},
+               {"camera.mts", 160, 96, {25, 1}, 10, 0, true},
+               {"animated.gif", 64, 36, {10, 1}, 5, 0, false},
+               {"animated.webp", 64, 36, {10, 1}, 5, 0, false},
+               {"one.gif", 64, 36, {}, 0, 0, false},
+               {"dropped.mp4", 64, 36, {30, 1}, 119, 0, false},
+               {"slowed.mp4", 64, 36, {30, 1}, 120, 0, false},
+               {"cut.mp4", 160, 96, {25, 1}, 30, 1, false},
+               {"overwritten.mp4", 160, 96, {25, 1}, 30, 1, false},
+               {"photo1.jpg", 64, 48, {}, 0, 0, false},
+               {"photo3.jpg", 64, 48, {}, 0, 0, false},
+               {"photo6.jpg", 64, 48, {}, 0, 0, false},
+               {"photo8.jpg", 64, 48, {}, 0, 0, false},
+               {"half.jpg", 160, 96, {}, 0, 1, false}};
   for (const auto& file : files) {
     SCOPED_TRACE(file.name);
     MediaSpec spec = MediaSpec::ofFile(folder.file(file.name));
-    std::shared_ptr<MediaSource> source;
-    try {
-      source = openMediaSource(spec, file.rate);
-      EXPECT_FALSE(file.line) << "opened";
-    } catch (const std::runtime_error& error) {
-      const std::string message = error.what();
-      EXPECT_EQ(message.rfind(spec.path + ": " + (file.line ? file.line : "?"), 0), 0u) << message;
-      EXPECT_EQ(message.find('\n'), std::string::npos) << message;
-      continue;
-    }
+    const std::shared_ptr<MediaSource> source = openMediaSource(spec, file.rate);
     const MediaInfo info = source->info();
     EXPECT_EQ(info.width, file.width);
     EXPECT_EQ(info.height, file.height);
@@ -421,6 +364,28 @@ TEST(VideoInput, FilesAreReadByWhatTheyHold) {
               << "quarter " << q;
     }
     EXPECT_EQ(spec.damage->count(), file.damaged);
+  }
+
+  // Refused in one line after the path. The host renders SDR BT.709 and BT.601, without tone or
+  // gamut mapping.
+  const std::pair<const char*, std::string> refused[] = {
+      {"spoilt.png", "cannot read image: its data is damaged ("},
+      {"sound.mp4", "it holds sound but no picture"},
+      {"pq.mov",
+       "HDR video (transfer smpte2084, primaries bt2020, matrix bt2020nc) is not shown by this "
+       "host: it renders in SDR BT.709/BT.601; convert it first (for example with ffmpeg's "
+       "zscale and tonemap filters)"},
+      {"hlg.mp4", "HDR video (transfer arib-std-b67, primaries bt2020"},
+      {"wide.mp4", "wide-gamut video (primaries bt2020, matrix bt2020nc)"}};
+  for (const auto& [name, line] : refused) {
+    const std::string path = folder.file(name);
+    try {
+      openMediaSource(MediaSpec::ofFile(path), {});
+      ADD_FAILURE() << name << " opened";
+    } catch (const std::runtime_error& error) {
+      EXPECT_EQ(std::string(error.what()).rfind(path + ": " + line, 0), 0u) << error.what();
+      EXPECT_EQ(std::string(error.what()).find('\n'), std::string::npos) << error.what();
+    }
   }
 }
 

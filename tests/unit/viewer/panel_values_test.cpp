@@ -30,14 +30,12 @@ TEST(PanelValues, WidgetsFormatsAndRangesFollowTheDeclaration) {
     Widget widget;
     const char* format;
     double low, high;
-  } cases[] = {
-      {declared(ParamKind::Float, 0, 200, "px"), Widget::Slider, "%.1f px", 0, 200},
-      {declared(ParamKind::Float, 1, 1000, "%"), Widget::Slider, "%.1f %%", 1, 1000},
-      {declared(ParamKind::Int, -100000, 10000), Widget::Drag, "%d", -100000, 10000},
-      {declared(ParamKind::Int, 1, 8), Widget::Slider, "%d", 1, 8},
-      {declared(ParamKind::Angle), Widget::Angle, "%.1f\xC2\xB0", -FLT_MAX, FLT_MAX},
-      {declared(ParamKind::Point), Widget::Point, "%.1f", -FLT_MAX, FLT_MAX},
-  };
+  } cases[] = {{declared(ParamKind::Float, 0, 200, "px"), Widget::Slider, "%.1f px", 0, 200},
+               {declared(ParamKind::Float, 1, 1000, "%"), Widget::Slider, "%.1f %%", 1, 1000},
+               {declared(ParamKind::Int, -100000, 10000), Widget::Drag, "%d", -100000, 10000},
+               {declared(ParamKind::Int, 1, 8), Widget::Slider, "%d", 1, 8},
+               {declared(ParamKind::Angle), Widget::Angle, "%.1f\xC2\xB0", -FLT_MAX, FLT_MAX},
+               {declared(ParamKind::Point), Widget::Point, "%.1f", -FLT_MAX, FLT_MAX}};
   for (const Case& c : cases) {
     NumberWidget number = numberWidget(c.param);
     EXPECT_EQ(widgetFor(c.param), c.widget) << c.format;
@@ -72,8 +70,7 @@ TEST(PanelValues, KeyframeToggleAndEditsKeepOrDropAnimation) {
       {"static gets its first key", width, 3, KeyState::Static, {{3, 2}}, 2},
       {"adds the shown value", animated, 5, KeyState::Animated, {{0, 0}, {5, 50}, {10, 100}}, 2},
       {"a key is removed", animated, 10, KeyState::KeyHere, {{0, 0}}, 2},
-      {"the last key leaves its value static", oneKey, 4, KeyState::KeyHere, {}, 7},
-  };
+      {"the last key leaves its value static", oneKey, 4, KeyState::KeyHere, {}, 7}};
   for (const Case& c : cases) {
     EXPECT_EQ(keyState(c.param, c.time), c.before) << c.name;
     refhost::ParamState after = stateAfterKeyToggle(c.param, c.time);

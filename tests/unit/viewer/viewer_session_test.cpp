@@ -1,6 +1,5 @@
 // The viewer's layout presets and "Fit pictures to regions" frame each picture as `veltrane
-// split` does, at the picture's own proportions: a portrait clip among landscape ones is not
-// framed as if it filled the frame.
+// split` does, at the picture's own proportions.
 #include "viewer/viewer_session.h"
 
 #include <gtest/gtest.h>

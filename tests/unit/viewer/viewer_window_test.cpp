@@ -1,17 +1,15 @@
-// `veltrane view` in a real window under Xvfb, driven by real X input through xdotool: the
-// gestures edit the scene as a viewer's would, Ctrl+S saves it, and the window shows the
-// render of what it saves with the handles drawn where they are.
+// `veltrane view` in a real window under Xvfb, driven by xdotool: gestures edit the scene, Ctrl+S
+// saves it, and the window shows the render of what it saves with the handles over it.
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <nlohmann/json.hpp>
 
 #include "refhost/media/image_files.h"
+#include "support/files.h"
 #include "support/temp_paths.h"
 #include "x_session.h"
 
@@ -20,10 +18,8 @@ namespace {
 constexpr int kWidth = 320;
 constexpr int kHeight = 180;
 
-std::string text(const std::string& path) {
-  std::ifstream in(path);
-  return std::string(std::istreambuf_iterator<char>(in), {});
-}
+using testsupport::slurp;
+using testsupport::writeText;
 
 // The gradient makes every frame pixel different, so the frame is found on screen unambiguously.
 const char kScene[] = R"({
@@ -37,7 +33,7 @@ const char kScene[] = R"({
 class ViewerWindow : public ::testing::Test {
  protected:
   void SetUp() override {
-    std::ofstream(scene_) << kScene;
+    writeText(scene_, kScene);
     viewer_ = std::make_unique<ChildProcess>(
         std::vector<std::string>{VELTRANE_CLI_PATH, "view", scene_, "--save-as", saved_, "--plugin",
                                  VELTRANE_MODULE_PATH},
@@ -48,12 +44,12 @@ class ViewerWindow : public ::testing::Test {
     refhost::RgbaImage frame = render(scene_);
     ASSERT_TRUE(
         waitUntil([&] { return findPicture(x_.screenshot(dir_.path()), frame, 12, x0_, y0_); }, 60))
-        << "the frame never showed at one pixel per pixel: " << text(dir_.file("err.txt"));
+        << "the frame never showed at one pixel per pixel: " << slurp(dir_.file("err.txt"));
   }
   void TearDown() override {
     if (!viewer_) return;
     x_.run({"xdotool", "key", "ctrl+q"});
-    EXPECT_EQ(viewer_->wait(30), 0) << text(dir_.file("err.txt"));
+    EXPECT_EQ(viewer_->wait(30), 0) << slurp(dir_.file("err.txt"));
   }
 
   refhost::RgbaImage render(const std::string& scene) {
@@ -79,8 +75,8 @@ class ViewerWindow : public ::testing::Test {
   }
   void saveAndWait() {
     x_.run({"xdotool", "key", "ctrl+s"});
-    ASSERT_TRUE(waitUntil([&] { return text(out_).find("saved") != std::string::npos; }, 30))
-        << text(dir_.file("err.txt"));
+    ASSERT_TRUE(waitUntil([&] { return slurp(out_).find("saved") != std::string::npos; }, 30))
+        << slurp(dir_.file("err.txt"));
   }
   // Whether the window's title is the file's name and, after it, " *" for unsaved changes.
   bool titled(const std::string& file, bool modified) {
@@ -118,15 +114,15 @@ TEST_F(ViewerWindow, GesturesEditTheSceneAndCtrlSSavesItWithItsUndoHistory) {
           "1", "sleep", "0.2", "key", "ctrl+z"});
   saveAndWait();
 
-  nlohmann::json params = nlohmann::json::parse(text(saved_))["params"];
+  nlohmann::json params = nlohmann::json::parse(slurp(saved_))["params"];
   EXPECT_EQ(params, nlohmann::json::parse(R"({
       "numberOfCuts": 2, "cutPosition_0": [40, -30], "cutDirection_0": 0,
       "cutPosition_1": [-80, 60], "cutDirection_1": -90,
       "inputLayer0": "d3e00000-0000-4000-8000-000000000001"})"));
-  EXPECT_NE(text(out_).find("undo history: \"Split Screen Cut 1 Position\", \"Inserting Cut\"; "
-                            "undone: \"Moved Split Screen Input 0\""),
+  EXPECT_NE(slurp(out_).find("undo history: \"Split Screen Cut 1 Position\", \"Inserting Cut\"; "
+                             "undone: \"Moved Split Screen Input 0\""),
             std::string::npos)
-      << text(out_);
+      << slurp(out_);
 }
 
 TEST_F(ViewerWindow, ShowsTheRenderOfWhatItSavesWithTheHandlesOverIt) {
@@ -169,16 +165,16 @@ TEST_F(ViewerWindow, AsksBeforeClosingUnsavedChangesAndSaveAsMovesTheFile) {
   const std::string other = dir_.file("other.json");
   x_.run({"xdotool", "key", "ctrl+shift+s", "sleep", "0.5", "type", other});
   x_.run({"xdotool", "key", "Return"});
-  ASSERT_TRUE(waitUntil([&] { return text(out_).find("saved " + other) == 0; }, 30))
-      << text(out_) << text(dir_.file("err.txt"));
+  ASSERT_TRUE(waitUntil([&] { return slurp(out_).find("saved " + other) == 0; }, 30))
+      << slurp(out_) << slurp(dir_.file("err.txt"));
   EXPECT_TRUE(titled("other.json", false));
   drag({}, 200, 60, 120, 60);
   EXPECT_TRUE(titled("other.json", true)) << "an edit after a save is unsaved again";
   x_.run({"xdotool", "key", "ctrl+q", "sleep", "1", "key", "d"});
-  EXPECT_EQ(viewer_->wait(30), 0) << text(dir_.file("err.txt"));
+  EXPECT_EQ(viewer_->wait(30), 0) << slurp(dir_.file("err.txt"));
   viewer_.reset();
   EXPECT_FALSE(std::filesystem::exists(saved_));
-  EXPECT_EQ(nlohmann::json::parse(text(other))["params"]["cutPosition_0"],
+  EXPECT_EQ(nlohmann::json::parse(slurp(other))["params"]["cutPosition_0"],
             nlohmann::json::parse("[40, -30]"))
       << "the discarded edit is not in the file";
 }
@@ -211,7 +207,7 @@ TEST_F(ViewerWindow, DirectionHandlesCanBeGrabbedAtEveryZoom) {
     handle -= 90;
   }
   saveAndWait();
-  nlohmann::json params = nlohmann::json::parse(text(saved_))["params"];
+  nlohmann::json params = nlohmann::json::parse(slurp(saved_))["params"];
   ASSERT_TRUE(params.contains("cutDirection_0")) << params;
   const double turned =
       std::fmod(std::fmod(params["cutDirection_0"].get<double>(), 360) + 360, 360);
