@@ -45,7 +45,7 @@ const Treatment kTreatments[] = {
     {"build/bin/bench_geometry", Treatment::UntilFirstResult, "[0-9] (ns|us|ms) +[0-9]"},
     {"build/bin/veltrane soak", Treatment::UntilFirstResult, "^ +[0-9]+ +[0-9]+\\.[0-9]$"},
     {"ctest --test-dir build -L", Treatment::UntilFirstResult, "Test +#[0-9]+: .*Passed"},
-    {"bench/melt_job\\.sh", Treatment::UntilFirstResult, "^== run 1 of"},
+    {"bench/melt_job\\.sh", Treatment::UntilFirstResult, "^== (tracks )?run 1 of"},
     {"kubectl ", Treatment::Skipped, "needs a Kubernetes cluster"},
     {"examples/farm/submit-slurm\\.sh|.* /shared/", Treatment::Skipped,
      "needs a Slurm cluster and its shared folder (tests/farm/slurm_cluster.sh starts one)"}};
