@@ -66,7 +66,8 @@ class JoinedFile {
  public:
   JoinedFile(const JoinedVideo& video, const AVCodecParameters& parameters)
       : video_(video),
-        frameRate_(AVRational{video.frameRate.numerator, video.frameRate.denominator}) {
+        frameRate_(AVRational{static_cast<int>(reduced(video.frameRate).numerator),
+                              static_cast<int>(reduced(video.frameRate).denominator)}) {
     AVFormatContext* raw = nullptr;
     int result = avformat_alloc_output_context2(&raw, nullptr, muxerName(video.container),
                                                 video.path.c_str());
