@@ -82,6 +82,19 @@ TEST(BenchCommand, ReportsEveryCase) {
   EXPECT_EQ(rows.back()["inputs"], "layers");
   EXPECT_GT(rows.back()["fetchMs"].get<double>(), 0.0);  // nine layers were fetched
   for (const nlohmann::json& row : rows) EXPECT_GT(row["renderMs"].get<double>(), 0.0) << row;
+
+  // The table's total is the sum of the four parts beside it.
+  run = runCli({"bench", "--sizes", "64x36", "--cuts", "3", "--inputs", "layers", "--repeat", "1",
+                "--warmup", "0"});
+  ASSERT_EQ(run.status, 0) << run.err;
+  double render = 0, fetch = 0, upload = 0, readback = 0, total = 0;
+  const std::size_t row = run.out.find("\n64x36");
+  ASSERT_NE(row, std::string::npos) << run.out;
+  ASSERT_EQ(std::sscanf(run.out.c_str() + row, " 64x36 3 layers %lf %lf %lf %lf %lf", &render,
+                        &fetch, &upload, &readback, &total),
+            5)
+      << run.out;
+  EXPECT_NEAR(total, render + fetch + upload + readback, 0.021) << run.out;
 }
 
 }  // namespace
