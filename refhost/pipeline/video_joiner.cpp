@@ -33,6 +33,12 @@ Input openPiece(const std::string& path) {
   return Input(raw);
 }
 
+// The rate as FFmpeg keeps it: int parts, in lowest terms so that they fit.
+AVRational rationalOf(FrameRate rate) {
+  const FrameRate lowest = reduced(rate);
+  return AVRational{static_cast<int>(lowest.numerator), static_cast<int>(lowest.denominator)};
+}
+
 int videoStreamOf(const AVFormatContext& input, const std::string& path) {
   for (unsigned i = 0; i < input.nb_streams; ++i)
     if (input.streams[i]->codecpar->codec_type == AVMEDIA_TYPE_VIDEO) return static_cast<int>(i);
@@ -65,9 +71,7 @@ struct OutputCloser {
 class JoinedFile {
  public:
   JoinedFile(const JoinedVideo& video, const AVCodecParameters& parameters)
-      : video_(video),
-        frameRate_(AVRational{static_cast<int>(reduced(video.frameRate).numerator),
-                              static_cast<int>(reduced(video.frameRate).denominator)}) {
+      : video_(video), frameRate_(rationalOf(video.frameRate)) {
     AVFormatContext* raw = nullptr;
     int result = avformat_alloc_output_context2(&raw, nullptr, muxerName(video.container),
                                                 video.path.c_str());
